@@ -1,0 +1,46 @@
+# One place for what every target is compiled with.
+
+set(CMAKE_CXX_STANDARD 20)
+set(CMAKE_CXX_STANDARD_REQUIRED ON)
+set(CMAKE_CXX_EXTENSIONS OFF)
+set(CMAKE_C_STANDARD 11)
+set(CMAKE_POSITION_INDEPENDENT_CODE ON)
+set(CMAKE_EXPORT_COMPILE_COMMANDS ON)
+set(CMAKE_RUNTIME_OUTPUT_DIRECTORY "${CMAKE_BINARY_DIR}/bin")
+
+option(PELLIKO_TESTS "Build the tests" OFF)
+option(PELLIKO_COVERAGE "Count covered lines" OFF)
+set(PELLIKO_SANITIZE "" CACHE STRING "Sanitizers to build with, for example address,undefined")
+
+# ccache makes a second build of the same sources cheap; it is used when it is there.
+find_program(PELLIKO_CCACHE ccache)
+if(PELLIKO_CCACHE)
+  set(CMAKE_C_COMPILER_LAUNCHER "${PELLIKO_CCACHE}")
+  set(CMAKE_CXX_COMPILER_LAUNCHER "${PELLIKO_CCACHE}")
+endif()
+
+add_compile_definitions(_FILE_OFFSET_BITS=64 $<$<NOT:$<BOOL:${PELLIKO_SANITIZE}>>:$<$<CONFIG:RelWithDebInfo>:_FORTIFY_SOURCE=2>>)
+
+# The debug build trades debugger detail for build time: two cores build it for every test run.
+set(CMAKE_CXX_FLAGS_DEBUG "-O0 -g1")
+set(CMAKE_C_FLAGS_DEBUG "-O0 -g1")
+set(CMAKE_CXX_FLAGS_RELWITHDEBINFO "-O2 -g1")
+set(CMAKE_C_FLAGS_RELWITHDEBINFO "-O2 -g1")
+
+add_library(pelliko_warnings INTERFACE)
+target_compile_options(pelliko_warnings INTERFACE
+  -Wall -Wextra -Wpedantic -Werror
+  -Wshadow -Wformat=2 -Wnull-dereference -Wundef -Wimplicit-fallthrough
+  $<$<COMPILE_LANGUAGE:CXX>:-Wnon-virtual-dtor -Woverloaded-virtual -Wextra-semi -Wold-style-cast
+    -Wcast-qual -Wsuggest-override>)
+
+add_library(pelliko_options INTERFACE)
+target_link_libraries(pelliko_options INTERFACE pelliko_warnings)
+if(PELLIKO_SANITIZE)
+  add_compile_options(-fsanitize=${PELLIKO_SANITIZE} -fno-omit-frame-pointer -fno-sanitize-recover=undefined)
+  add_link_options(-fsanitize=${PELLIKO_SANITIZE})
+endif()
+if(PELLIKO_COVERAGE)
+  add_compile_options(--coverage)
+  add_link_options(--coverage)
+endif()

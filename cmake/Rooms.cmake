@@ -1,0 +1,69 @@
+# Every folder with a CMakeLists.txt of its own is a room and is found without being listed.
+
+function(pelliko_add_rooms)
+  foreach(room IN LISTS ARGN)
+    if(EXISTS "${CMAKE_CURRENT_SOURCE_DIR}/${room}/CMakeLists.txt")
+      add_subdirectory(${room})
+    endif()
+  endforeach()
+endfunction()
+
+# Adds every direct sub-folder of the current one that is a room.
+function(pelliko_add_sub_rooms)
+  file(GLOB lists CONFIGURE_DEPENDS "${CMAKE_CURRENT_SOURCE_DIR}/*/CMakeLists.txt")
+  foreach(list IN LISTS lists)
+    get_filename_component(room "${list}" DIRECTORY)
+    add_subdirectory("${room}")
+  endforeach()
+endfunction()
+
+# pelliko_library(NAME SOURCES... [PUBLIC libs...] [PRIVATE libs...])
+# A static library with the project's warnings whose own folder is its public include directory,
+# so that callers include a platform header by the platform's own name.
+function(pelliko_library name)
+  cmake_parse_arguments(arg "" "" "SOURCES;PUBLIC;PRIVATE" ${ARGN})
+  add_library(${name} STATIC ${arg_SOURCES})
+  target_include_directories(${name} PUBLIC "${CMAKE_CURRENT_SOURCE_DIR}")
+  target_link_libraries(${name} PUBLIC ${arg_PUBLIC} PRIVATE pelliko_options ${arg_PRIVATE})
+endfunction()
+
+# pelliko_program(NAME SOURCES... [LIBS libs...]): a program that is installed and put into bin/ of the build.
+function(pelliko_program name)
+  cmake_parse_arguments(arg "" "" "SOURCES;LIBS" ${ARGN})
+  add_executable(${name} ${arg_SOURCES})
+  target_link_libraries(${name} PRIVATE pelliko_options ${arg_LIBS})
+  install(TARGETS ${name} RUNTIME DESTINATION ${CMAKE_INSTALL_BINDIR})
+endfunction()
+
+# pelliko_activatable(BUS_NAME PROGRAM): the bus starts PROGRAM when somebody calls BUS_NAME.
+# The build tree's file (for sessions) names the program where it was built, the installed one where it goes.
+function(pelliko_activatable bus_name program)
+  set(EXEC "${CMAKE_RUNTIME_OUTPUT_DIRECTORY}/${program}")
+  set(BUS_NAME "${bus_name}")
+  configure_file("${PROJECT_SOURCE_DIR}/dbus/activation.service.in"
+                 "${CMAKE_BINARY_DIR}/dbus-services/${bus_name}.service" @ONLY)
+  set(EXEC "${CMAKE_INSTALL_FULL_BINDIR}/${program}")
+  configure_file("${PROJECT_SOURCE_DIR}/dbus/activation.service.in"
+                 "${CMAKE_CURRENT_BINARY_DIR}/${bus_name}.service" @ONLY)
+  install(FILES "${CMAKE_CURRENT_BINARY_DIR}/${bus_name}.service"
+          DESTINATION "${CMAKE_INSTALL_DATADIR}/dbus-1/services")
+endfunction()
+
+# pelliko_dbus_interface(TARGET XML PREFIX NAMESPACE): a static library of the code that gdbus-codegen
+# makes from dbus/XML; include it as <XML's base name>.h.
+function(pelliko_dbus_interface target xml prefix namespace)
+  get_filename_component(base "${xml}" NAME_WE)
+  set(dir "${CMAKE_CURRENT_BINARY_DIR}/${target}")
+  file(MAKE_DIRECTORY "${dir}")
+  set(source "${PROJECT_SOURCE_DIR}/dbus/${xml}")
+  add_custom_command(
+    OUTPUT "${dir}/${base}.c" "${dir}/${base}.h"
+    COMMAND ${GDBUS_CODEGEN} --interface-prefix ${prefix} --c-namespace ${namespace}
+            --c-generate-autocleanup all --header --output "${dir}/${base}.h" "${source}"
+    COMMAND ${GDBUS_CODEGEN} --interface-prefix ${prefix} --c-namespace ${namespace}
+            --c-generate-autocleanup all --body --output "${dir}/${base}.c" "${source}"
+    DEPENDS "${source}" VERBATIM)
+  add_library(${target} STATIC "${dir}/${base}.c" "${dir}/${base}.h")
+  target_include_directories(${target} SYSTEM PUBLIC "${dir}")
+  target_link_libraries(${target} PUBLIC PkgConfig::gio)
+endfunction()

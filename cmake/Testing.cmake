@@ -1,0 +1,58 @@
+# Tests run by ctest. A test that needs more than its own files runs in a private world
+# (scripts/session), so that several may run at the same time and nothing is left behind.
+
+if(PELLIKO_TESTS)
+  enable_testing()
+endif()
+
+# How a world is asked for: what scripts/session is to start beside the two buses.
+set(pelliko_session_bus --no-display --no-server)
+set(pelliko_session_display --no-server)
+set(pelliko_session_server --no-display)
+set(pelliko_session_full)
+
+# pelliko_test(NAME SOURCES... [LIBS libs...] [SESSION none|bus|display|server|full] [TIMEOUT seconds])
+# One GoogleTest program; NAME names the module under test.
+function(pelliko_test name)
+  cmake_parse_arguments(arg "" "SESSION;TIMEOUT" "SOURCES;LIBS" ${ARGN})
+  add_executable(${name} ${arg_SOURCES})
+  set_target_properties(${name} PROPERTIES RUNTIME_OUTPUT_DIRECTORY "${CMAKE_BINARY_DIR}/tests")
+  target_link_libraries(${name} PRIVATE pelliko_options ${arg_LIBS} GTest::gmock GTest::gtest_main)
+  target_compile_definitions(${name} PRIVATE PELLIKO_SOURCE_DIR="${PROJECT_SOURCE_DIR}"
+                                             PELLIKO_BUILD_DIR="${CMAKE_BINARY_DIR}")
+  if(NOT arg_SESSION)
+    set(arg_SESSION none)
+  endif()
+  if(arg_SESSION STREQUAL none)
+    add_test(NAME ${name} COMMAND ${name})
+  else()
+    pelliko_session_command(command ${arg_SESSION} $<TARGET_FILE:${name}>)
+    add_test(NAME ${name} COMMAND ${command})
+  endif()
+  pelliko_test_properties(${name} "${arg_TIMEOUT}")
+endfunction()
+
+# pelliko_script_test(NAME COMMAND words... [SESSION ...] [TIMEOUT seconds]): a test that is a script.
+function(pelliko_script_test name)
+  cmake_parse_arguments(arg "" "SESSION;TIMEOUT" "COMMAND" ${ARGN})
+  if(NOT arg_SESSION OR arg_SESSION STREQUAL none)
+    set(command ${arg_COMMAND})
+  else()
+    pelliko_session_command(command ${arg_SESSION} ${arg_COMMAND})
+  endif()
+  add_test(NAME ${name} COMMAND ${command})
+  pelliko_test_properties(${name} "${arg_TIMEOUT}")
+endfunction()
+
+function(pelliko_session_command out kind)
+  set(${out} "${PROJECT_SOURCE_DIR}/scripts/session" --build "${CMAKE_BINARY_DIR}"
+      ${pelliko_session_${kind}} -- ${ARGN} PARENT_SCOPE)
+endfunction()
+
+function(pelliko_test_properties name timeout)
+  if(NOT timeout)
+    set(timeout 120)
+  endif()
+  set_tests_properties(${name} PROPERTIES TIMEOUT ${timeout} ENVIRONMENT
+    "ASAN_OPTIONS=detect_leaks=0:abort_on_error=0;UBSAN_OPTIONS=print_stacktrace=1")
+endfunction()
