@@ -1,6 +1,6 @@
 // The numbers behind the views' property names: view number (bits 20 and up), type nibble (1 bool,
-// 2 int, 4 text), 1 in the next nibble for read-only, index. Joined views reuse the ids of the views
-// that they join.
+// 2 int, 4 text), 1 in the next nibble for read-only, index. Joined views reuse the ids of the
+// views that they join.
 #include "contacts_ex.h"
 
 extern "C" {

@@ -113,8 +113,8 @@ int contacts_db_get_record(const char *view_uri, int record_id, contacts_record_
 int contacts_db_get_all_records(const char *view_uri, int offset, int limit,
                                 contacts_list_h *record_list);
 
-/* As contacts_db_get_all_records, but only the records that the query's filter lets through. No match
- * is success with an empty list. */
+/* As contacts_db_get_all_records, but only the records that the query's filter lets through. No
+ * match is success with an empty list. */
 int contacts_db_get_records_with_query(contacts_query_h query, int offset, int limit,
                                        contacts_list_h *record_list);
 
@@ -129,8 +129,8 @@ int contacts_filter_add_int(contacts_filter_h filter, unsigned int property_id,
 int contacts_filter_add_operator(contacts_filter_h filter,
                                  contacts_filter_operator_e operator_type);
 
-/* set_filter copies the filter as it stands, so both may be destroyed in any order. Filter and query
- * must be of the same view. */
+/* set_filter copies the filter as it stands, so both may be destroyed in any order. Filter and
+ * query must be of the same view. */
 int contacts_query_create(const char *view_uri, contacts_query_h *query);
 int contacts_query_destroy(contacts_query_h query);
 int contacts_query_set_filter(contacts_query_h query, contacts_filter_h filter);
@@ -141,7 +141,8 @@ int contacts_list_get_count(contacts_list_h contacts_list, int *count);
 int contacts_list_first(contacts_list_h contacts_list);
 int contacts_list_next(contacts_list_h contacts_list);
 
-/* *record stays the list's. On an empty list or past the end: CONTACTS_ERROR_NO_DATA, *record NULL. */
+/* *record stays the list's. On an empty list or past the end: CONTACTS_ERROR_NO_DATA, *record NULL.
+ */
 int contacts_list_get_current_record_p(contacts_list_h contacts_list, contacts_record_h *record);
 
 /* With delete_child false the records live on and the caller destroys each of them. */
@@ -154,7 +155,8 @@ int contacts_record_destroy(contacts_record_h record, bool delete_child);
 int contacts_record_get_int(contacts_record_h record, unsigned int property_id, int *value);
 /* The caller releases *value with free(). */
 int contacts_record_get_str(contacts_record_h record, unsigned int property_id, char **value);
-/* *value points into the record and lives as long as it; the caller neither changes nor frees it. */
+/* *value points into the record and lives as long as it; the caller neither changes nor frees it.
+ */
 int contacts_record_get_str_p(contacts_record_h record, unsigned int property_id, char **value);
 
 #ifdef __cplusplus
