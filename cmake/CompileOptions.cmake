@@ -19,7 +19,10 @@ if(PELLIKO_CCACHE)
   set(CMAKE_CXX_COMPILER_LAUNCHER "${PELLIKO_CCACHE}")
 endif()
 
-add_compile_definitions(_FILE_OFFSET_BITS=64 $<$<NOT:$<BOOL:${PELLIKO_SANITIZE}>>:$<$<CONFIG:RelWithDebInfo>:_FORTIFY_SOURCE=2>>)
+add_compile_definitions(_FILE_OFFSET_BITS=64)
+if(NOT PELLIKO_SANITIZE)
+  add_compile_definitions($<$<CONFIG:RelWithDebInfo>:_FORTIFY_SOURCE=2>)
+endif()
 
 # The debug build trades debugger detail for build time: two cores build it for every test run.
 set(CMAKE_CXX_FLAGS_DEBUG "-O0 -g1")

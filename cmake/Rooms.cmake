@@ -52,7 +52,7 @@ endfunction()
 # pelliko_dbus_interface(TARGET XML PREFIX NAMESPACE): a static library of the code that gdbus-codegen
 # makes from dbus/XML; include it as <XML's base name>.h.
 function(pelliko_dbus_interface target xml prefix namespace)
-  get_filename_component(base "${xml}" NAME_WE)
+  get_filename_component(base "${xml}" NAME_WLE)
   set(dir "${CMAKE_CURRENT_BINARY_DIR}/${target}")
   file(MAKE_DIRECTORY "${dir}")
   set(source "${PROJECT_SOURCE_DIR}/dbus/${xml}")
