@@ -4,8 +4,8 @@
 /**
  * The upload client: hands shares to the background service and reports how they go.
  *
- * All functions belong to the thread of the main loop (GLib's default main context). Each returns 0 or
- * a negative error code; on an error the out-parameters are left untouched.
+ * All functions belong to the thread of the main loop (GLib's default main context). Each returns 0
+ * or a negative error code; on an error the out-parameters are left untouched.
  */
 
 #include <stdint.h>
@@ -49,8 +49,8 @@ typedef struct {
  * A status report. It arrives on the main loop, never from inside one of the calls below.
  *
  * @param status           a PellikoUploadStatus
- * @param input_param      borrowed, may be NULL; at PELLIKO_UPLOAD_STATUS_SHARE_FINISHED the temporary file
- *                         that the caller may now remove
+ * @param input_param      borrowed, may be NULL; at PELLIKO_UPLOAD_STATUS_SHARE_FINISHED the
+ * temporary file that the caller may now remove
  * @param progress_percent 0 to 100, meaningful for PELLIKO_UPLOAD_STATUS_PROGRESSING
  * @param expired_time     the end of the share in seconds since the epoch, 0 while unknown
  * @param unused           always 0
@@ -58,8 +58,8 @@ typedef struct {
  * @param request_id       the request that is reported
  * @param user_data        as given with the callback
  *
- * After PELLIKO_UPLOAD_STATUS_CANCELLED, PELLIKO_UPLOAD_STATUS_SHARE_FINISHED or an error nothing more is
- * reported for the request.
+ * After PELLIKO_UPLOAD_STATUS_CANCELLED, PELLIKO_UPLOAD_STATUS_SHARE_FINISHED or an error nothing
+ * more is reported for the request.
  */
 typedef void (*pelliko_upload_status_cb)(int status, const char *input_param, int progress_percent,
                                          int64_t expired_time, int unused, int error_code,
@@ -68,7 +68,8 @@ typedef void (*pelliko_upload_status_cb)(int status, const char *input_param, in
 /**
  * Asks for an upload of files to recipients. The request is on disk when the call returns 0.
  *
- * Options, arrays, records and texts stay the caller's. Null entries at the tail of the recipients are skipped.
+ * Options, arrays, records and texts stay the caller's. Null entries at the tail of the recipients
+ * are skipped.
  *
  * @param wifi_only  1: never send over a metered network, 0: send over any
  * @param request_id receives the id, positive and never used again
@@ -79,7 +80,8 @@ int pelliko_request_upload(const pelliko_upload_options_s *options,
                            void *user_data, int32_t *request_id);
 
 /**
- * Shares the files of an earlier finished request with new recipients, without uploading them again.
+ * Shares the files of an earlier finished request with new recipients, without uploading them
+ * again.
  *
  * @param request_id     the earlier request
  * @param new_request_id receives the id of the new one
@@ -102,16 +104,16 @@ typedef struct pelliko_upload_info_s *pelliko_upload_info_h;
 /**
  * Looks a request up, unfinished or finished.
  *
- * @param info receives the handle; it belongs to the library and stays valid until the next call for
- *             the same request
+ * @param info receives the handle; it belongs to the library and stays valid until the next call
+ * for the same request
  */
 int pelliko_upload_info_get_handle(int32_t request_id, pelliko_upload_info_h *info);
 
 /**
  * Gives the files of a request.
  *
- * @param file_list  receives the paths; array and texts belong to the library and stay valid until the
- *                   next call for the same handle
+ * @param file_list  receives the paths; array and texts belong to the library and stay valid until
+ * the next call for the same handle
  * @param total_size receives the sum of the sizes in bytes
  */
 int pelliko_upload_info_get_file_info(pelliko_upload_info_h info, char ***file_list,
