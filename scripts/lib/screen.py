@@ -1,0 +1,85 @@
+"""What a person does at the screen of a private world: look for a control, press it, take a picture.
+
+Controls are found by their label through the accessibility bus and pressed with a real pointer in the
+middle of their extents, so that a button that cannot be pressed fails here too.
+"""
+
+import subprocess
+
+import pyatspi
+
+from world import LIMIT, WorldError, run, wait_for
+
+_EVENTS = ("object:state-changed:showing", "object:state-changed:visible", "object:children-changed",
+           "object:bounds-changed", "window:create", "window:activate")
+
+
+def _walk(node, depth=0):
+    if node is None or depth > 40:
+        return
+    yield node
+    try:
+        count = node.childCount
+    except Exception:  # the object went away while it was looked at
+        return
+    for index in range(count):
+        try:
+            child = node.getChildAtIndex(index)
+        except Exception:
+            continue
+        yield from _walk(child, depth + 1)
+
+
+def controls():
+    """Every control of every program on the screen that is showing and enabled: (name, role, extents)."""
+    found = []
+    for application in pyatspi.Registry.getDesktop(0):
+        for node in _walk(application):
+            try:
+                states = node.getState()
+                if not states.contains(pyatspi.STATE_SHOWING):
+                    continue
+                extents = node.queryComponent().getExtents(pyatspi.DESKTOP_COORDS)
+                found.append((node.name, node.getRoleName(), extents, states.contains(pyatspi.STATE_ENABLED)))
+            except Exception:
+                continue
+    return found
+
+
+def find(label, role=None):
+    """The extents of the control with this label, or None."""
+    for name, found_role, extents, _enabled in controls():
+        if name == label and (role is None or role in found_role) and extents.width > 1 and extents.height > 1:
+            return extents
+    return None
+
+
+def wait_for_control(label, role=None, limit=LIMIT):
+    """Waits until a control with this label shows and returns its extents."""
+    listener = lambda event: None  # noqa: E731 - its only purpose is to wake the loop
+    for event in _EVENTS:
+        pyatspi.Registry.registerEventListener(listener, event)
+    try:
+        return wait_for(lambda: find(label, role), f"the control “{label}”", limit)
+    finally:
+        for event in _EVENTS:
+            pyatspi.Registry.deregisterEventListener(listener, event)
+
+
+def press(label, role=None, limit=LIMIT):
+    """Waits for a control and presses it with the pointer."""
+    extents = wait_for_control(label, role, limit)
+    x, y = extents.x + extents.width // 2, extents.y + extents.height // 2
+    run("xdotool", "mousemove", "--sync", str(x), str(y), "click", "1")
+
+
+def key(name):
+    run("xdotool", "key", name)
+
+
+def screenshot(path):
+    """Saves the whole screen as a PNG."""
+    done = subprocess.run(["import", "-window", "root", path], capture_output=True, text=True)
+    if done.returncode != 0:
+        raise WorldError(f"no screenshot: {done.stderr.strip()}")
+    return path
