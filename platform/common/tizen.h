@@ -1,0 +1,4 @@
+// Common base of the platform's headers.
+#pragma once
+
+#include "tizen_error.h"
