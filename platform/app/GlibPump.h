@@ -1,5 +1,5 @@
-// Lets the toolkit's main loop drive GLib's default main context as well, so that bus calls, network
-// and modem events arrive on the one loop. Debian builds EFL without that support.
+// Lets the toolkit's main loop drive GLib's default main context as well, so that bus calls,
+// network and modem events arrive on the one loop. Debian builds EFL without that support.
 #pragma once
 
 namespace pelliko::platform

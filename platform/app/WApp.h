@@ -36,8 +36,8 @@ protected:
     /// The last visible window of the application was hidden; the first one became visible.
     virtual void onPause();
     virtual void onResume();
-    /// A launch request, in arrival order. `request` is the frame's and valid during the call; clone
-    /// it for later use. A start without any request brings one with the default operation.
+    /// A launch request, in arrival order. `request` is the frame's and valid during the call;
+    /// clone it for later use. A start without any request brings one with the default operation.
     virtual void onAppControl(app_control_h request, bool firstLaunch);
 
 private:

@@ -1,5 +1,5 @@
-// The frame of an application with a user interface: one instance, one main loop, requests in order.
-// Everything here belongs to the main loop.
+// The frame of an application with a user interface: one instance, one main loop, requests in
+// order. Everything here belongs to the main loop.
 #pragma once
 
 #include "app_common.h"

@@ -50,7 +50,8 @@ typedef enum {
     APP_CONTROL_RESULT_CANCELED = -2 /* ended by the framework: nobody answered */
 } app_control_result_e;
 
-/// Main loop. `request` and `reply` are valid during the call and freed by the framework afterwards.
+/// Main loop. `request` and `reply` are valid during the call and freed by the framework
+/// afterwards.
 typedef void (*app_control_reply_cb)(app_control_h request, app_control_h reply,
                                      app_control_result_e result, void *user_data);
 

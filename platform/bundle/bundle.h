@@ -23,7 +23,8 @@ bundle *bundle_create(void);
 /// Releases the bundle and every text in it.
 int bundle_free(bundle *b);
 
-/// Copies key and text into the bundle. KEY_EXISTS when the key is there already; the old value stays.
+/// Copies key and text into the bundle. KEY_EXISTS when the key is there already; the old value
+/// stays.
 int bundle_add_str(bundle *b, const char *key, const char *str);
 
 /// Lends the value: *str points into the bundle and is valid until the bundle is freed.

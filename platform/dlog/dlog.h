@@ -27,7 +27,8 @@ typedef enum {
 } dlog_error_e;
 
 /// Writes one line. Any thread; takes no lock of the caller's and leaves errno alone.
-/// Returns the number of bytes of the formatted text (0 for DLOG_SILENT) or a negative dlog_error_e.
+/// Returns the number of bytes of the formatted text (0 for DLOG_SILENT) or a negative
+/// dlog_error_e.
 int dlog_print(log_priority prio, const char *tag, const char *fmt, ...)
     __attribute__((format(printf, 3, 4)));
 

@@ -1,6 +1,7 @@
 // The application's own values: kept across runs, each with a type, with a callback per key.
 //
-// Every function may be called on any thread. Callbacks run on the main loop, after the set returned.
+// Every function may be called on any thread. Callbacks run on the main loop, after the set
+// returned.
 #pragma once
 
 #include "tizen.h"
@@ -19,9 +20,9 @@ typedef enum {
 
 typedef void (*preference_changed_cb)(const char *key, void *user_data);
 
-/// Setters return after the value is on stable storage and change the key's type when it had another
-/// one. Getters: NO_KEY for an absent key, INVALID_PARAMETER for a key of another type; the output is
-/// then left alone. Doubles round-trip exactly.
+/// Setters return after the value is on stable storage and change the key's type when it had
+/// another one. Getters: NO_KEY for an absent key, INVALID_PARAMETER for a key of another type; the
+/// output is then left alone. Doubles round-trip exactly.
 int preference_set_int(const char *key, int value);
 int preference_get_int(const char *key, int *value);
 int preference_set_double(const char *key, double value);

@@ -2,7 +2,8 @@
 // stops, keys under "db/" stay.
 //
 // Functions that return int give 0 for success and -1 for an error. Reading and setting may be done
-// on any thread; callbacks are registered on the main loop and come from GLib's default main context.
+// on any thread; callbacks are registered on the main loop and come from GLib's default main
+// context.
 #pragma once
 
 #include "vconf-keys.h"
