@@ -18,8 +18,8 @@ extern int g_has_sms_receiver;
 void _createRecipientToUpload(PellikoAppData *ad);
 
 /// The number without its formatting characters as a new text for g_free; null when it has none of
-/// " ", "/", "-", "(", ")" and is good as it is, or when `number` is null (logged).
-char *_makeNormalizedNumber(const char *number);
+/// " ", "/", "-", "(", ")" and is good as it is, or when `src` is null (logged).
+char *_makeNormalizedNumber(const char *src);
 
 /// Sets *joined to 1 when the number belongs to a user of the sharing service, else leaves it.
 void _getStatusByNumberId(int32_t number_id, uint8_t *joined);

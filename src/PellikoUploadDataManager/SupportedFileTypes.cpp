@@ -1,0 +1,59 @@
+#include "PellikoUploadDataManager/SupportedFileTypes.h"
+
+#include "AppLog/AppLog.h"
+
+#include <cstring>
+#include <strings.h>
+
+namespace pelliko
+{
+
+namespace
+{
+
+// The order is part of the design: the first match wins, and positions stand for kinds of content
+// (0-24 video and subtitles, 25-56 audio and playlists, 57-64 images, 65-76 documents, 77-79 cards
+// and calendars).
+constexpr const char *supported_extensions[] = {
+    "mpeg", "mpg",  "mp4",  "m4v",   "3gp",  "3gpp", "3g2",  "3gpp2", "mkv",  "webm",    //
+    "ts",   "avi",  "ram",  "rm",    "rmvb", "wmv",  "asf",  "divx",  "flv",  "tp",      //
+    "trp",  "m2ts", "mts",  "m2t",   "smi",  "mp3",  "mpga", "m4a",   "wav",  "amr",     //
+    "awb",  "3ga",  "wma",  "qcp",   "evc",  "pva",  "aac",  "pyv",   "dm",   "ogg",     //
+    "oga",  "mka",  "mid",  "midi",  "xmf",  "rtttl", "smf", "imy",   "rtx",  "ota",     //
+    "mxmf", "m3u",  "pls",  "wpl",   "m3u8", "fl",   "flac", "jpeg",  "jpg",  "png",     //
+    "bmp",  "gif",  "agif", "webp",  "wbmp", "ppt",  "pptx", "doc",   "docx", "xls",     //
+    "xlsx", "hwp",  "gul",  "pdf",   "txt",  "html", "htm",  "vcf",   "vcs",  "vts",     //
+    "invalid"};
+constexpr int extensionCount = sizeof(supported_extensions) / sizeof(supported_extensions[0]) - 1;
+constexpr size_t sentinelLength = 7;
+
+} // namespace
+
+int supportedExtensionPosition(const char *path)
+{
+    const char *dot = path ? strrchr(path, '.') : nullptr;
+    if (!dot)
+        return -1;
+    const char *extension = dot + 1;
+    // Only as many characters as the extension has are compared: "mp" is taken for "mpeg".
+    const size_t length = strlen(extension);
+    for (int row = 0; strncmp(supported_extensions[row], "invalid", sentinelLength) != 0; ++row) {
+        if (strncasecmp(extension, supported_extensions[row], length) == 0) {
+            LOG_DEBUG("extension[%s], match[%s]", extension, supported_extensions[row]);
+            return row;
+        }
+    }
+    return -1;
+}
+
+const char *supportedExtensionAt(int position)
+{
+    return position >= 0 && position < extensionCount ? supported_extensions[position] : nullptr;
+}
+
+int isSupportedFileType(const char *path)
+{
+    return supportedExtensionPosition(path) >= 0 ? 1 : 0;
+}
+
+} // namespace pelliko
