@@ -15,8 +15,8 @@ namespace
 // Never destroyed: a detached worker may still read the record when the process ends.
 PellikoAppData *g_app_data = nullptr;
 
-// Makes the record before main() runs, when there is one thread only: that is what makes the accessor
-// safe afterwards.
+// Makes the record before main() runs, when there is one thread only: that is what makes the
+// accessor safe afterwards.
 [[maybe_unused]] const PellikoAppData *const g_created_at_load = getAppData();
 
 } // namespace

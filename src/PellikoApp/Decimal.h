@@ -7,8 +7,8 @@
 namespace pelliko
 {
 
-/// The decimal number at the start of a text, held at the ends of 32 bits as on a 32-bit target; 0 for
-/// a null text or one that does not begin with a number.
+/// The decimal number at the start of a text, held at the ends of 32 bits as on a 32-bit target; 0
+/// for a null text or one that does not begin with a number.
 inline int32_t decimalValue(const char *text)
 {
     if (!text)

@@ -2,6 +2,7 @@
 
 #include "AppLog/AppLog.h"
 #include "PellikoApp/Decimal.h"
+#include "PellikoApp/TextFormat.h"
 #include "PellikoUploadDataManager/SupportedFileTypes.h"
 #include "PellikoUploadManager/ExitPolicy.h"
 
@@ -13,7 +14,6 @@
 #include <ctime>
 #include <fcntl.h>
 #include <glib.h>
-#include <libintl.h>
 #include <notification.h>
 #include <string>
 #include <unistd.h>
@@ -25,10 +25,8 @@ namespace
 {
 
 constexpr const char *memoDirectory = "/opt/usr/apps/com.velmora.pelliko/shared/data/";
-constexpr const char *textDomain = "pelliko";
 constexpr const char *uploadResumeKey = "upload_resume";
-constexpr const char *typeNotSupportedId =
-    "IDS_RSH_TPOP_CANT_SHARE_FILES_FILE_TYPE_NOT_SUPPORTED";
+constexpr const char *typeNotSupportedId = "IDS_RSH_TPOP_CANT_SHARE_FILES_FILE_TYPE_NOT_SUPPORTED";
 constexpr const char *deviceErrorId =
     "IDS_RSH_BODY_UNABLE_TO_UPLOAD_FILES_A_DEVICE_ERROR_HAS_OCCURRED_ABB";
 constexpr size_t toastSize = 512;
@@ -68,12 +66,7 @@ private:
 void _postToast(const char *id)
 {
     char text[toastSize];
-    if (snprintf(text, sizeof(text), "%s", dgettext(textDomain, id)) >= int{toastSize}) {
-        // A character that the cut split must not reach the notification service.
-        const char *end = nullptr;
-        g_utf8_validate(text, -1, &end);
-        text[end - text] = '\0';
-    }
+    copyText(text, sizeof(text), translated(id));
     notification_status_message_post(text);
 }
 
@@ -163,7 +156,10 @@ void _parseFileUri(PellikoAppData *ad, app_control_h, const char *uri)
     RETURN_IF_NULL(uri, "uri is NULL");
     RETURN_IF_NULL(ad->upload_item, "upload_item is NULL !!");
     const char *colon = strchr(uri, ':');
-    RETURN_IF_NULL(colon, "scheme is NULL");
+    if (!colon) {
+        LOG_DEBUG("scheme is NULL");
+        return;
+    }
     const char *rest = colon + 1;
     if (static_cast<int64_t>(strlen(rest)) - schemeSlashes < 1) {
         LOG_DEBUG("len is less than 0 !!");

@@ -18,8 +18,8 @@ int _parseSingleDataPath(const char *uri, PellikoAppData *ad, app_control_h requ
 /// Appends the file of a "file:///path" text to the share in hand, whatever its type.
 void _parseFileUri(PellikoAppData *ad, app_control_h request, const char *uri);
 
-/// Fills the share in hand (made if there is none) from the request's array of paths; 0 or -1. A request
-/// without paths leaves the share as it is and gives 0.
+/// Fills the share in hand (made if there is none) from the request's array of paths; 0 or -1. A
+/// request without paths leaves the share as it is and gives 0.
 int _parseMultipleDataPath(app_control_h request, PellikoAppData *ad);
 
 /// Size in bytes, 0 for a missing file, -1 for a null path.

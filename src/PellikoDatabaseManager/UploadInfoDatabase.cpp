@@ -81,8 +81,8 @@ bool _hasQuote(const char *text)
     return text && strchr(text, '"');
 }
 
-// A text that holds a double quote breaks out of its quotes and could turn the insert into any other
-// statement: it is compiled for its error message and never run.
+// A text that holds a double quote breaks out of its quotes and could turn the insert into any
+// other statement: it is compiled for its error message and never run.
 void _refuseStatement(sqlite3 *handle, const char *statement)
 {
     sqlite3_stmt *compiled = nullptr;
@@ -180,10 +180,10 @@ void writeUploadDataToDb(const UploadNotiData *node)
     RETURN_IF_NULL(node, "node is NULL");
     sqlite3 *handle = _getDatabaseHandle();
     const std::string files = _fileListText(*node);
-    const SqliteText statement(sqlite3_mprintf(
-        "INSERT into %s VALUES (%d, %d, %ld, \"%s\", \"%s\", \"%s\");", tableName,
-        node->request_id, node->total_files, static_cast<long>(node->total_size), files.c_str(),
-        node->recipient_list, node->recipient_index_list));
+    const SqliteText statement(
+        sqlite3_mprintf("INSERT into %s VALUES (%d, %d, %ld, \"%s\", \"%s\", \"%s\");", tableName,
+                        node->request_id, node->total_files, static_cast<long>(node->total_size),
+                        files.c_str(), node->recipient_list, node->recipient_index_list));
     if (!statement)
         return;
     if (_hasQuote(files.c_str()) || _hasQuote(node->recipient_list) ||

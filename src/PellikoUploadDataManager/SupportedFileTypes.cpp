@@ -15,14 +15,14 @@ namespace
 // (0-24 video and subtitles, 25-56 audio and playlists, 57-64 images, 65-76 documents, 77-79 cards
 // and calendars).
 constexpr const char *supported_extensions[] = {
-    "mpeg", "mpg",  "mp4",  "m4v",   "3gp",  "3gpp", "3g2",  "3gpp2", "mkv",  "webm",    //
-    "ts",   "avi",  "ram",  "rm",    "rmvb", "wmv",  "asf",  "divx",  "flv",  "tp",      //
-    "trp",  "m2ts", "mts",  "m2t",   "smi",  "mp3",  "mpga", "m4a",   "wav",  "amr",     //
-    "awb",  "3ga",  "wma",  "qcp",   "evc",  "pva",  "aac",  "pyv",   "dm",   "ogg",     //
-    "oga",  "mka",  "mid",  "midi",  "xmf",  "rtttl", "smf", "imy",   "rtx",  "ota",     //
-    "mxmf", "m3u",  "pls",  "wpl",   "m3u8", "fl",   "flac", "jpeg",  "jpg",  "png",     //
-    "bmp",  "gif",  "agif", "webp",  "wbmp", "ppt",  "pptx", "doc",   "docx", "xls",     //
-    "xlsx", "hwp",  "gul",  "pdf",   "txt",  "html", "htm",  "vcf",   "vcs",  "vts",     //
+    "mpeg",   "mpg",  "mp4",  "m4v",  "3gp",  "3gpp",  "3g2",  "3gpp2", "mkv",  "webm", //
+    "ts",     "avi",  "ram",  "rm",   "rmvb", "wmv",   "asf",  "divx",  "flv",  "tp",   //
+    "trp",    "m2ts", "mts",  "m2t",  "smi",  "mp3",   "mpga", "m4a",   "wav",  "amr",  //
+    "awb",    "3ga",  "wma",  "qcp",  "evc",  "pva",   "aac",  "pyv",   "dm",   "ogg",  //
+    "oga",    "mka",  "mid",  "midi", "xmf",  "rtttl", "smf",  "imy",   "rtx",  "ota",  //
+    "mxmf",   "m3u",  "pls",  "wpl",  "m3u8", "fl",    "flac", "jpeg",  "jpg",  "png",  //
+    "bmp",    "gif",  "agif", "webp", "wbmp", "ppt",   "pptx", "doc",   "docx", "xls",  //
+    "xlsx",   "hwp",  "gul",  "pdf",  "txt",  "html",  "htm",  "vcf",   "vcs",  "vts",  //
     "invalid"};
 constexpr int extensionCount = sizeof(supported_extensions) / sizeof(supported_extensions[0]) - 1;
 constexpr size_t sentinelLength = 7;

@@ -8,6 +8,19 @@
 namespace pelliko
 {
 
+namespace
+{
+
+// Removes the first element of a list and gives its data.
+void *_takeFirst(Eina_List *&list)
+{
+    void *data = eina_list_data_get(list);
+    list = eina_list_remove_list(list, list);
+    return data;
+}
+
+} // namespace
+
 UploadItem *createUploadData()
 {
     auto *item = new (std::nothrow) UploadItem;
@@ -28,16 +41,14 @@ void freeUploadRecipient(UploadRecipient *recipient)
 
 void clearUploadRecipients(UploadItem &item)
 {
-    void *recipient = nullptr;
-    EINA_LIST_FREE(item.recipient_list, recipient)
-    freeUploadRecipient(static_cast<UploadRecipient *>(recipient));
+    while (item.recipient_list)
+        freeUploadRecipient(static_cast<UploadRecipient *>(_takeFirst(item.recipient_list)));
 }
 
 void clearUploadFiles(UploadItem &item)
 {
-    void *path = nullptr;
-    EINA_LIST_FREE(item.files, path)
-    g_free(path);
+    while (item.files)
+        g_free(_takeFirst(item.files));
     item.files_size = 0;
     item.before_files_size = 0;
 }

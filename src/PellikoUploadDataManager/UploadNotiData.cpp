@@ -16,8 +16,8 @@ UploadNotiData *g_current_node = nullptr;
 namespace
 {
 
-// Where g_current_node points after its node was freed: it is never in the list, so a second removal
-// finds nothing, and a new node at the freed address is never mistaken for the removed one.
+// Where g_current_node points after its node was freed: it is never in the list, so a second
+// removal finds nothing, and a new node at the freed address is never mistaken for the removed one.
 UploadNotiData g_removed_node;
 
 void _freeNode(UploadNotiData *node)
