@@ -3,6 +3,10 @@
 find_package(PkgConfig REQUIRED)
 find_package(Threads REQUIRED)
 pkg_check_modules(efl REQUIRED IMPORTED_TARGET elementary edje evas ecore ecore-file ecore-x ecore-evas eina)
+# Debian's package files name a folder that no package has; CMake refuses such a path.
+get_target_property(efl_includes PkgConfig::efl INTERFACE_INCLUDE_DIRECTORIES)
+list(FILTER efl_includes EXCLUDE REGEX "/ector-1$")
+set_target_properties(PkgConfig::efl PROPERTIES INTERFACE_INCLUDE_DIRECTORIES "${efl_includes}")
 pkg_check_modules(gio REQUIRED IMPORTED_TARGET gio-2.0 gio-unix-2.0)
 pkg_check_modules(sqlite3 REQUIRED IMPORTED_TARGET sqlite3)
 pkg_check_modules(curl REQUIRED IMPORTED_TARGET libcurl)
