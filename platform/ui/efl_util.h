@@ -35,7 +35,7 @@ typedef enum {
 int efl_util_set_notification_window_level(Evas_Object *window,
                                            efl_util_notification_level_e level);
 
-/* The level set last, EFL_UTIL_NOTIFICATION_LEVEL_NONE when none was. */
+/* The level set last, EFL_UTIL_NOTIFICATION_LEVEL_NONE when none was (or level 0). */
 int efl_util_get_notification_window_level(Evas_Object *window,
                                            efl_util_notification_level_e *level);
 
