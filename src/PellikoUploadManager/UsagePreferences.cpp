@@ -1,0 +1,185 @@
+#include "PellikoUploadManager/UsagePreferences.h"
+
+#include "AppLog/AppLog.h"
+#include "PellikoApp/AppData.h"
+#include "PellikoApp/TextFormat.h"
+#include "PellikoUploadDataManager/UploadNotiData.h"
+#include "PellikoUploadManager/ExitPolicy.h"
+#include "PellikoUploadManager/PeriodClock.h"
+
+#include <app_preference.h>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <memory>
+
+namespace pelliko
+{
+
+namespace
+{
+
+constexpr size_t popupDataSize = 20; ///< bytes of the hand-over text with its terminator
+
+struct CFree {
+    void operator()(char *text) const { free(text); }
+};
+using CText = std::unique_ptr<char, CFree>;
+
+struct PopupData {
+    int status = 0;
+    double progress_percent = 0.0;
+    int error_code = 0;
+};
+
+void _logPopupData(const PopupData &data)
+{
+    const PlainNumbers plain;
+    LOG_DEBUG("status = %d, progress_percent = %f, error_code = %d", data.status,
+              data.progress_percent, data.error_code);
+}
+
+int _readTotalSize()
+{
+    int total = 0;
+    const int ret = preference_get_int(shareTotalSizeKey, &total);
+    if (ret == PREFERENCE_ERROR_NONE)
+        return total;
+    if (ret == PREFERENCE_ERROR_NO_KEY) {
+        const int p_err = preference_set_int(shareTotalSizeKey, 0);
+        if (p_err != PREFERENCE_ERROR_NONE)
+            LOG_ERROR("Error in setting PREFERENCE KEY SHARE_TOTAL_SIZE, p_err = %d", p_err);
+    } else {
+        LOG_ERROR("Error in getting PREFERENCE KEY SHARE_TOTAL_SIZE, p_err = %d", ret);
+    }
+    return 0;
+}
+
+CText _readPopupData()
+{
+    char *text = nullptr;
+    const int ret = preference_get_string(updatePopupDataKey, &text);
+    if (ret == PREFERENCE_ERROR_NONE)
+        return CText(text);
+    if (ret == PREFERENCE_ERROR_NO_KEY) {
+        if (preference_set_string(updatePopupDataKey, "") == PREFERENCE_ERROR_NONE)
+            return CText(strdup(""));
+        LOG_ERROR("Error in setting PREFERENCE KEY SHARE_UPDATE_POPUP_DATA");
+    } else {
+        LOG_ERROR("Error in getting PREFERENCE KEY SHARE_UPDATE_POPUP_DATA");
+    }
+    return nullptr;
+}
+
+// Missing pieces read as zero.
+PopupData _parsePopupData(char *text)
+{
+    const PlainNumbers plain;
+    PopupData data;
+    if (!text)
+        return data;
+    char *rest = nullptr;
+    if (const char *token = strtok_r(text, "+", &rest))
+        data.status = static_cast<int>(strtol(token, nullptr, 10));
+    if (const char *token = strtok_r(nullptr, "+", &rest))
+        data.progress_percent = strtod(token, nullptr);
+    if (const char *token = strtok_r(nullptr, "+", &rest))
+        data.error_code = static_cast<int>(strtol(token, nullptr, 10));
+    return data;
+}
+
+// The SMS event of the share that the record names; true when that share is now complete.
+bool _noteSmsDone(const PellikoAppData *ad)
+{
+    const long parsed = ad->req_id ? strtol(ad->req_id, nullptr, 10) : 0;
+    const auto req_id = static_cast<int32_t>(parsed);
+    LOG_DEBUG("req_id = %d", req_id);
+    UploadNotiData *node = getUploadNotiDataNode(req_id);
+    if (!node)
+        return false;
+    if (node->completion_flag == 1)
+        return true;
+    node->completion_flag = 1;
+    return false;
+}
+
+} // namespace
+
+void updatePreference()
+{
+    preference_set_changed_cb(shareSmsDoneKey, _preferenceUpdatedCb, nullptr);
+    const int p_err = preference_set_int(shareSmsDoneKey, 1);
+    if (p_err != PREFERENCE_ERROR_NONE)
+        LOG_ERROR("Error in setting PREFERENCE SHARE_SMS_DONE with sms_done = 1, p_err = %d",
+                  p_err);
+    else
+        LOG_DEBUG("Updating preference for sms_done with value = 1");
+}
+
+void _updateTimestamp()
+{
+    const double now = periodSeconds();
+    const PlainNumbers plain;
+    if (preference_set_double(shareTimeLastKey, now) != PREFERENCE_ERROR_NONE)
+        LOG_ERROR("Error in setting PREFERENCE KEY SHARE_TIME_LAST");
+    else
+        LOG_DEBUG("Updating preference for share_time_last with value = %f", now);
+}
+
+void _updateUploadedData()
+{
+    RETURN_IF_NULL(g_current_node, "g_current_node is NULL");
+    const auto before = static_cast<uint32_t>(_readTotalSize());
+    const auto added = static_cast<uint32_t>(g_current_node->total_size);
+    const auto total = static_cast<int32_t>(before + added);
+    const int p_err = preference_set_int(shareTotalSizeKey, total);
+    const PlainNumbers plain;
+    if (p_err != PREFERENCE_ERROR_NONE)
+        LOG_ERROR(
+            "Error in setting PREFERENCE SHARE_TOTAL_SIZE with share_total_size = %f, p_err = %d",
+            static_cast<double>(total), p_err);
+    else
+        LOG_DEBUG("Updating preference for share_total_size with value = %ld",
+                  static_cast<long>(total));
+}
+
+void _updatePopupPreference(int status, double progress_percent, int error_code)
+{
+    _logPopupData({status, progress_percent, error_code});
+    const CText previous = _readPopupData();
+    LOG_DEBUG("previous update_popup_data = %s", textOrNull(previous.get()));
+    preference_set_changed_cb(updatePopupDataKey, _popupDataPreferenceUpdatedCb, nullptr);
+
+    char text[popupDataSize];
+    {
+        const PlainNumbers plain;
+        snprintf(text, sizeof(text), "%d+%f+%d", status, progress_percent, error_code);
+    }
+    LOG_DEBUG("new update_popup_data = %s", text);
+    if (preference_set_string(updatePopupDataKey, text) == PREFERENCE_ERROR_NONE)
+        LOG_DEBUG("PREFERENCE KEY SHARE_UPDATE_POPUP_DATA updated.");
+    else
+        LOG_ERROR("Error in getting PREFERENCE KEY SHARE_UPDATE_POPUP_DATA");
+}
+
+void _popupDataPreferenceUpdatedCb(const char * /*key*/, void * /*user_data*/)
+{
+    char *value = nullptr;
+    if (preference_get_string(updatePopupDataKey, &value) != PREFERENCE_ERROR_NONE)
+        LOG_ERROR("Error in getting PREFERENCE KEY SHARE_UPDATE_POPUP_DATA, Popup cannot be "
+                  "updated.");
+    const CText text(value);
+    LOG_DEBUG("update_popup_data = %s", textOrNull(text.get()));
+    _logPopupData(_parsePopupData(text.get()));
+}
+
+void _preferenceUpdatedCb(const char * /*key*/, void * /*user_data*/)
+{
+    PellikoAppData *ad = getAppData();
+    // Only an open popup leaves the question unanswered: it is asked again below.
+    if (ad && _noteSmsDone(ad) && applyExitPolicy(ad) != ExitOutcome::popup_open)
+        return;
+    applyExitPolicy(ad);
+}
+
+} // namespace pelliko
