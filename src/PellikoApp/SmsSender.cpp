@@ -137,8 +137,8 @@ void _parseSmsTo(PellikoAppData *ad, app_control_h request)
         LOG_DEBUG("There is no receiver msisdn!");
     } else {
         void *old = nullptr;
-        EINA_LIST_FREE (ad->to_msisdn_list, old)
-            g_free(old);
+        EINA_LIST_FREE(ad->to_msisdn_list, old)
+        g_free(old);
         ad->to_msisdn_count = count;
         for (int i = 0; i < count; ++i)
             ad->to_msisdn_list =

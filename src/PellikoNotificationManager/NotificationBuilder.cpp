@@ -111,8 +111,8 @@ bool attachLaunchRequest(notification_h notification, int state_code, OldFigures
     if (old_figures == OldFigures::remove)
         _removeExtraData(request);
     _addExtraData(request, state_code);
-    const int err = notification_set_launch_option(
-        notification, NOTIFICATION_LAUNCH_OPTION_APP_CONTROL, request);
+    const int err = notification_set_launch_option(notification,
+                                                   NOTIFICATION_LAUNCH_OPTION_APP_CONTROL, request);
     if (err != NOTIFICATION_ERROR_NONE)
         LOG_ERROR("notification_set_launch_option failed [%d]", err);
     if (request)

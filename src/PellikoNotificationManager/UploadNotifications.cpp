@@ -121,8 +121,7 @@ bool _buildPaused(notification_h notification)
         return false;
     LOG_DEBUG("Updating notification with text <Uploading Paused>");
     if (setText(notification, NOTIFICATION_TEXT_TYPE_TITLE, pausedId) != NOTIFICATION_ERROR_NONE ||
-        setText(notification, NOTIFICATION_TEXT_TYPE_CONTENT, waitingId) !=
-            NOTIFICATION_ERROR_NONE)
+        setText(notification, NOTIFICATION_TEXT_TYPE_CONTENT, waitingId) != NOTIFICATION_ERROR_NONE)
         return false;
     attachLaunchRequest(notification, NOTI_STATE_PAUSED, OldFigures::remove, WithoutRequest::go_on,
                         noRequestText);
@@ -142,8 +141,8 @@ void _postNotifying(notification_h notification)
     LOG_DEBUG("Updating notification with text <Sending notifications to recipients...>");
     setText(notification, NOTIFICATION_TEXT_TYPE_TITLE, notifyingId);
     setDisplay(notification, displayTray);
-    attachLaunchRequest(notification, NOTI_STATE_NOTIFYING, OldFigures::none,
-                        WithoutRequest::go_on, noRequestText);
+    attachLaunchRequest(notification, NOTI_STATE_NOTIFYING, OldFigures::none, WithoutRequest::go_on,
+                        noRequestText);
     const int err = _notificationInsert(notification, NOTI_STATE_NOTIFYING);
     if (err != NOTIFICATION_ERROR_NONE)
         LOG_ERROR("_notificationInsert fail, noti_err = %d", err);

@@ -192,9 +192,9 @@ void _refresh(PellikoAppData *ad, int status, int progress_percent, int request_
     if (status != PELLIKO_UPLOAD_STATUS_FINISHED &&
         status != PELLIKO_UPLOAD_STATUS_SHARE_FINISHED) {
         LOG_DEBUG("Updating = %p", static_cast<void *>(g_current_node->notif));
-        updateUploadNotificationSendingStatus(
-            ad, static_cast<int>(g_current_node->progress_percent), &g_current_node->notif,
-            g_current_node->noti_priv_id);
+        updateUploadNotificationSendingStatus(ad,
+                                              static_cast<int>(g_current_node->progress_percent),
+                                              &g_current_node->notif, g_current_node->noti_priv_id);
     }
     const auto pressed = static_cast<int32_t>(g_noti_press_data.upload_request_id);
     LOG_DEBUG("req_id = %d and g_noti_press_data.upload_request_id = %d", request_id, pressed);
