@@ -1,6 +1,7 @@
 #include "PellikoApp/SmsSender.h"
 
 #include "AppLog/AppLog.h"
+#include "PellikoApp/Decimal.h"
 #include "PellikoApp/TextFormat.h"
 #include "PellikoUploadManager/UsagePreferences.h"
 
@@ -39,7 +40,7 @@ void _readFileCount(app_control_h request, PellikoAppData *ad)
     if (app_control_get_extra_data(request, "file_count", &value) != APP_CONTROL_ERROR_NONE ||
         !value)
         return;
-    ad->file_count = static_cast<int32_t>(strtol(value, nullptr, 10));
+    ad->file_count = decimalValue(value);
     free(value);
 }
 
@@ -136,9 +137,9 @@ void _parseSmsTo(PellikoAppData *ad, app_control_h request)
     if (ret != APP_CONTROL_ERROR_NONE || count <= 0 || !numbers) {
         LOG_DEBUG("There is no receiver msisdn!");
     } else {
-        void *old = nullptr;
-        EINA_LIST_FREE(ad->to_msisdn_list, old)
-        g_free(old);
+        for (const Eina_List *l = ad->to_msisdn_list; l; l = eina_list_next(l))
+            g_free(eina_list_data_get(l));
+        ad->to_msisdn_list = eina_list_free(ad->to_msisdn_list);
         ad->to_msisdn_count = count;
         for (int i = 0; i < count; ++i)
             ad->to_msisdn_list =

@@ -5,6 +5,7 @@
 #include "PellikoNotificationManager/NotificationPrimitives.h"
 
 #include <app_control.h>
+#include <pelliko_operations.h>
 #include <tizen_error.h>
 
 namespace pelliko
@@ -107,7 +108,7 @@ bool attachLaunchRequest(notification_h notification, int state_code, OldFigures
         request = nullptr;
     }
     app_control_set_app_id(request, applicationId);
-    app_control_set_operation(request, notificationPressedOperation);
+    app_control_set_operation(request, APP_CONTROL_OPERATION_UPLOADING_NOTI_PRESSED);
     if (old_figures == OldFigures::remove)
         _removeExtraData(request);
     _addExtraData(request, state_code);

@@ -14,10 +14,6 @@ namespace pelliko
 /// Application id of the notifications' launch requests: the application itself.
 constexpr const char *applicationId = "com.velmora.pelliko";
 
-/// Operation of the notifications' launch requests.
-constexpr const char *notificationPressedOperation =
-    "http://tizen.org/appcontrol/operation/uploading_noti_pressed";
-
 /// The state that a notification shows, carried as "upload_status" in its launch request. These are
 /// the application's own codes, not the service's status values.
 enum NotificationState : int {

@@ -5,6 +5,7 @@
 #include <app_control.h>
 #include <aul.h>
 #include <cstdio>
+#include <pelliko_operations.h>
 
 namespace pelliko
 {
@@ -13,8 +14,6 @@ namespace
 {
 
 constexpr const char *historyId = "com.velmora.pelliko-history";
-constexpr const char *sharedOperation = "http://tizen.org/appcontrol/operation/shared";
-constexpr const char *resharedOperation = "http://tizen.org/appcontrol/operation/reshared";
 constexpr size_t requestIdSize = 20;
 
 // A step that fails is logged and the rest still runs: a notice with less is better than none.
@@ -53,12 +52,12 @@ void _notify(const char *operation, int32_t request_id)
 
 void _sendSharedNotification(int32_t request_id)
 {
-    _notify(sharedOperation, request_id);
+    _notify(APP_CONTROL_OPERATION_SHARED, request_id);
 }
 
 void _sendResharedNotification(int32_t request_id)
 {
-    _notify(resharedOperation, request_id);
+    _notify(APP_CONTROL_OPERATION_RESHARED, request_id);
 }
 
 } // namespace pelliko

@@ -2,6 +2,7 @@
 
 #include "AppLog/AppLog.h"
 #include "PellikoApp/AppData.h"
+#include "PellikoApp/Decimal.h"
 #include "PellikoApp/TextFormat.h"
 #include "PellikoUploadDataManager/UploadNotiData.h"
 #include "PellikoUploadManager/ExitPolicy.h"
@@ -80,19 +81,18 @@ PopupData _parsePopupData(char *text)
         return data;
     char *rest = nullptr;
     if (const char *token = strtok_r(text, "+", &rest))
-        data.status = static_cast<int>(strtol(token, nullptr, 10));
+        data.status = decimalValue(token);
     if (const char *token = strtok_r(nullptr, "+", &rest))
         data.progress_percent = strtod(token, nullptr);
     if (const char *token = strtok_r(nullptr, "+", &rest))
-        data.error_code = static_cast<int>(strtol(token, nullptr, 10));
+        data.error_code = decimalValue(token);
     return data;
 }
 
 // The SMS event of the share that the record names; true when that share is now complete.
 bool _noteSmsDone(const PellikoAppData *ad)
 {
-    const long parsed = ad->req_id ? strtol(ad->req_id, nullptr, 10) : 0;
-    const auto req_id = static_cast<int32_t>(parsed);
+    const int32_t req_id = decimalValue(ad->req_id);
     LOG_DEBUG("req_id = %d", req_id);
     UploadNotiData *node = getUploadNotiDataNode(req_id);
     if (!node)
