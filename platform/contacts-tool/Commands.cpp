@@ -68,14 +68,15 @@ std::optional<ContactCard> cardOf(const NewContact &contact, std::string &error)
 
 void printJson(const std::vector<ListedNumber> &numbers)
 {
-    auto rows = nlohmann::json::array();
+    auto rows = nlohmann::ordered_json::array();
     for (const ListedNumber &row : numbers)
         rows.push_back({{"number_id", row.number_id},
                         {"name", row.name},
                         {"number", row.number},
                         {"joined", row.joined}});
     constexpr int indentation = 2;
-    std::cout << rows.dump(indentation, ' ', false, nlohmann::json::error_handler_t::replace) << '\n';
+    std::cout << rows.dump(indentation, ' ', false, nlohmann::ordered_json::error_handler_t::replace)
+              << '\n';
 }
 
 void printTable(const std::vector<ListedNumber> &numbers)

@@ -118,9 +118,9 @@ std::string pictureOf(SQLite::Database &database, int contact_id)
 // A number without any digit is only equal to itself.
 std::optional<int> numberOf(SQLite::Database &database, int contact_id, const std::string &number)
 {
-    SQLite::Statement select(database,
-                             "SELECT id FROM numbers WHERE contact_id = ?1 AND "
-                             "(normalized = ?2 OR (normalized IS NULL AND number = ?3)) ORDER BY id");
+    SQLite::Statement select(
+        database, "SELECT id FROM numbers WHERE contact_id = ?1 AND "
+                  "(normalized = ?2 OR (normalized IS NULL AND number = ?3)) ORDER BY id");
     select.bind(1, contact_id);
     bindText(select, 2, normalizeNumber(number));
     select.bind(3, number);
@@ -129,8 +129,8 @@ std::optional<int> numberOf(SQLite::Database &database, int contact_id, const st
 
 int addNumber(SQLite::Database &database, int contact_id)
 {
-    SQLite::Statement insert(
-        database, "INSERT INTO numbers (contact_id, number, folded) VALUES (?, '', '')");
+    SQLite::Statement insert(database,
+                             "INSERT INTO numbers (contact_id, number, folded) VALUES (?, '', '')");
     insert.bind(1, contact_id);
     insert.exec();
     return lastId(database);
@@ -140,9 +140,9 @@ int saveNumber(SQLite::Database &database, int contact_id, const CardNumber &num
 {
     const std::optional<int> known = numberOf(database, contact_id, number.number);
     const int number_id = known ? *known : addNumber(database, contact_id);
-    SQLite::Statement update(database,
-                             "UPDATE numbers SET type = ?2, label = ?3, is_default = ?4, "
-                             "number = ?5, folded = ?6, cleaned = ?7, normalized = ?8 WHERE id = ?1");
+    SQLite::Statement update(
+        database, "UPDATE numbers SET type = ?2, label = ?3, is_default = ?4, "
+                  "number = ?5, folded = ?6, cleaned = ?7, normalized = ?8 WHERE id = ?1");
     update.bind(1, number_id);
     update.bind(2, number.type);
     bindText(update, 3, number.label);
@@ -211,7 +211,8 @@ bool setLetters(SQLite::Database &database, int number_id,
                 const std::optional<std::string> &letters)
 {
     SQLite::Statement update(
-        database, "UPDATE contacts SET sync2 = ? WHERE lower(number_id) = ? AND address_book_id = ?");
+        database,
+        "UPDATE contacts SET sync2 = ? WHERE lower(number_id) = ? AND address_book_id = ?");
     SQLite::Statement insert(
         database, "INSERT INTO contacts (sync2, number_id, address_book_id, person_id, "
                   "display_name, display_source_type) "

@@ -12,8 +12,8 @@
 namespace pelliko::contacts
 {
 
-/// Adds or updates the contact of the card. A picture's path is given, its file being in place; empty
-/// keeps the one that the contact has. A picture that is replaced goes into `replaced`.
+/// Adds or updates the contact of the card. A picture's path is given, its file being in place;
+/// empty keeps the one that the contact has. A picture that is replaced goes into `replaced`.
 SavedContact saveCard(SQLite::Database &database, const ContactCard &card,
                       const std::string &picture_path, std::set<std::string> &replaced);
 

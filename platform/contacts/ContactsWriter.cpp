@@ -39,8 +39,8 @@ bool isPictureUsed(SQLite::Database &database, const std::string &path)
     return select.executeStep();
 }
 
-// Removes the pictures that no contact shows. Pictures are stored inside write transactions, so none
-// comes into use while this one holds the lock. A file that stays behind only costs room.
+// Removes the pictures that no contact shows. Pictures are stored inside write transactions, so
+// none comes into use while this one holds the lock. A file that stays behind only costs room.
 void removeUnused(SQLite::Database &database, const std::set<std::string> &paths)
 {
     if (paths.empty())
@@ -62,7 +62,7 @@ std::vector<SavedContact> saveAll(SQLite::Database &database, std::span<const Co
     for (const ContactCard &card : cards) {
         std::string path;
         if (!card.picture.empty())
-            pictures.insert(path = storePicture(card.picture).path);
+            pictures.insert(path = storePicture(card.picture));
         saved.push_back(saveCard(database, card, path, pictures));
     }
     transaction.commit();
@@ -104,8 +104,8 @@ Outcome<ContactsWriter> ContactsWriter::open()
 Outcome<std::vector<SavedContact>> ContactsWriter::save(std::span<const ContactCard> cards)
 {
     std::set<std::string> touched;
-    auto outcome = attempt<std::vector<SavedContact>>(
-        [&] { return saveAll(*m_database, cards, touched); });
+    auto outcome =
+        attempt<std::vector<SavedContact>>([&] { return saveAll(*m_database, cards, touched); });
     const auto tidy = attempt<bool>([&] { return removeUnused(*m_database, touched), true; });
     static_cast<void>(tidy);
     return outcome;

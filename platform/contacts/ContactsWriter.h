@@ -1,5 +1,5 @@
-// Writing to the contacts store: for the command-line tool and for the service that keeps the joined
-// users up to date. Applications only read (contacts.h).
+// Writing to the contacts store: for the command-line tool and for the service that keeps the
+// joined users up to date. Applications only read (contacts.h).
 #pragma once
 
 #include <memory>
@@ -49,13 +49,14 @@ public:
     ContactsWriter &operator=(ContactsWriter &&) noexcept;
     ~ContactsWriter();
 
-    /// Writes the cards in one transaction: on disk when it returns, or none of them. A card whose uid
-    /// is known replaces that contact; one whose name and any number are known completes it. A number
-    /// that stays keeps its id.
+    /// Writes the cards in one transaction: on disk when it returns, or none of them. A card whose
+    /// uid is known replaces that contact; one whose name and any number are known completes it. A
+    /// number that stays keeps its id.
     [[nodiscard]] Outcome<std::vector<SavedContact>> save(std::span<const ContactCard> cards);
 
-    /// Sets the sharing service's letters of a number ("R": joined; null: known but without letters),
-    /// adding its row in the service's address book. The value is false when there is no such number.
+    /// Sets the sharing service's letters of a number ("R": joined; null: known but without
+    /// letters), adding its row in the service's address book. The value is false when there is no
+    /// such number.
     [[nodiscard]] Outcome<bool> setServiceLetters(int number_id,
                                                   const std::optional<std::string> &letters);
 

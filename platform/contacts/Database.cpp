@@ -18,9 +18,10 @@ namespace
 constexpr int schema_version = 1;
 constexpr int busy_timeout_ms = 5000;
 
-// A row of contacts in the service's book stands for one phone number of its person: number_id names
-// it, sync2 holds the service's letters. AUTOINCREMENT keeps an id from being given out twice, since
-// other programs remember number ids. number_trigrams finds a number by any part of it.
+// A row of contacts in the service's book stands for one phone number of its person: number_id
+// names it, sync2 holds the service's letters. AUTOINCREMENT keeps an id from being given out
+// twice, since other programs remember number ids. number_trigrams finds a number by any part of
+// it.
 constexpr const char *schema = R"sql(
 CREATE TABLE address_books (
     id INTEGER PRIMARY KEY,
@@ -80,7 +81,8 @@ END;
 
 void addBook(SQLite::Database &database, int id, const char *name, int mode)
 {
-    SQLite::Statement insert(database, "INSERT INTO address_books (id, name, mode) VALUES (?, ?, ?)");
+    SQLite::Statement insert(database,
+                             "INSERT INTO address_books (id, name, mode) VALUES (?, ?, ?)");
     insert.bind(1, id);
     insert.bind(2, name);
     insert.bind(3, mode);

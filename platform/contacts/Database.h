@@ -21,8 +21,8 @@ inline constexpr const char *service_book_name = "ZORP_Universal_Contact";
 
 enum class Access { Read, Write };
 
-/// Opens contacts.db in the state directory, making file and tables when they are not there yet, and
-/// adds the SQL function fold(text). A connection is used by one thread at a time. Throws
+/// Opens contacts.db in the state directory, making file and tables when they are not there yet,
+/// and adds the SQL function fold(text). A connection is used by one thread at a time. Throws
 /// SQLite::Exception; a store that a newer version made is refused.
 std::unique_ptr<SQLite::Database> openDatabase(Access access);
 

@@ -11,8 +11,8 @@ namespace pelliko::contacts
 namespace
 {
 
-// Shorter texts have no trigram; longer ones are looked up by their end, because beginnings (country,
-// network) are shared by very many numbers.
+// Shorter texts have no trigram; longer ones are looked up by their end, because beginnings
+// (country, network) are shared by very many numbers.
 constexpr size_t shortest_in_index = 3;
 constexpr size_t longest_in_index = 8;
 
@@ -28,7 +28,8 @@ SqlText contains(const Property &property, const std::string &folded)
     const std::string test = "instr(" + std::string(property.folded) + ", ?) > 0";
     if (property.matching != Matching::NumberText || !isIndexable(folded))
         return {test, {folded}};
-    const std::string end = folded.substr(folded.size() - std::min(folded.size(), longest_in_index));
+    const std::string end =
+        folded.substr(folded.size() - std::min(folded.size(), longest_in_index));
     return {"n.id IN (SELECT rowid FROM number_trigrams WHERE number_trigrams MATCH ?) AND " + test,
             {'"' + end + '"', folded}};
 }

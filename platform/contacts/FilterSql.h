@@ -17,8 +17,8 @@ struct SqlText {
     std::vector<SqlValue> values; ///< one for each "?" of the text, in order
 };
 
-/// The expression that is true for the rows that the conditions let through; empty without conditions.
-/// No part of a match value ever becomes part of the SQL text.
+/// The expression that is true for the rows that the conditions let through; empty without
+/// conditions. No part of a match value ever becomes part of the SQL text.
 SqlText whereExpression(const Conditions &row);
 
 } // namespace pelliko::contacts

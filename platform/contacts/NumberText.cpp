@@ -23,8 +23,8 @@ bool isAscii(std::string_view text)
 
 GText validUtf8(std::string_view text)
 {
-    return GText(g_utf8_make_valid(text.data() ? text.data() : "",
-                                   static_cast<gssize>(text.size())));
+    return GText(
+        g_utf8_make_valid(text.data() ? text.data() : "", static_cast<gssize>(text.size())));
 }
 
 } // namespace

@@ -11,7 +11,8 @@ namespace pelliko::contacts
 /// UTF-8 become the replacement character.
 std::string foldText(std::string_view text);
 
-/// A phone number without its formatting: digits (of any script, as 0 to 9), "*", "#" and one leading
+/// A phone number without its formatting: digits (of any script, as 0 to 9), "*", "#" and one
+/// leading
 /// "+". Empty when nothing of that is in it.
 std::string cleanNumber(std::string_view number);
 

@@ -140,8 +140,8 @@ std::optional<std::string> readPictureFile(const std::string &path, std::string 
     struct stat status {
     };
     if (file.descriptor() < 0 || ::fstat(file.descriptor(), &status) != 0) {
-        error = "the picture " + path +
-                " cannot be read: " + std::generic_category().message(errno);
+        error =
+            "the picture " + path + " cannot be read: " + std::generic_category().message(errno);
         return std::nullopt;
     }
     if (!S_ISREG(status.st_mode)) {
@@ -154,8 +154,8 @@ std::optional<std::string> readPictureFile(const std::string &path, std::string 
     }
     auto bytes = readAll(file.descriptor(), static_cast<size_t>(status.st_size));
     if (!bytes)
-        error = "the picture " + path +
-                " cannot be read: " + std::generic_category().message(errno);
+        error =
+            "the picture " + path + " cannot be read: " + std::generic_category().message(errno);
     return bytes;
 }
 

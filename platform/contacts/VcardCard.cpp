@@ -92,9 +92,10 @@ struct TypeWord {
     int bits;
 };
 constexpr std::array type_words{
-    TypeWord{"home", number_home}, TypeWord{"work", number_work},   TypeWord{"voice", number_voice},
-    TypeWord{"fax", number_fax},   TypeWord{"msg", number_message}, TypeWord{"text", number_message},
-    TypeWord{"cell", number_cell}, TypeWord{"pager", number_pager},
+    TypeWord{"home", number_home},   TypeWord{"work", number_work},
+    TypeWord{"voice", number_voice}, TypeWord{"fax", number_fax},
+    TypeWord{"msg", number_message}, TypeWord{"text", number_message},
+    TypeWord{"cell", number_cell},   TypeWord{"pager", number_pager},
 };
 
 void takeTypeWord(const char *word, CardNumber &number)
@@ -177,7 +178,8 @@ std::string pictureOf(EVCardAttribute *attribute, std::vector<std::string> &note
         return {};
     }
     if (!pictureKind(bytes)) {
-        notes.emplace_back("its picture is not a JPEG, PNG, GIF, BMP or WebP image and was left out");
+        notes.emplace_back(
+            "its picture is not a JPEG, PNG, GIF, BMP or WebP image and was left out");
         return {};
     }
     return bytes;
@@ -220,7 +222,8 @@ void dropUnusableNumbers(ContactCard &card, std::vector<std::string> &notes)
     };
     for (const CardNumber &number : card.numbers) {
         if (unusable(number))
-            notes.push_back("the phone number \"" + number.number + "\" has no digit and was left out");
+            notes.push_back("the phone number \"" + number.number +
+                            "\" has no digit and was left out");
     }
     std::erase_if(card.numbers, unusable);
 }

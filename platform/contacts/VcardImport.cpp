@@ -23,8 +23,7 @@ Outcome<std::string> readFile(const std::string &path)
     std::ifstream file(path, std::ios::binary);
     std::string text{std::istreambuf_iterator<char>(file), std::istreambuf_iterator<char>()};
     if (!file.is_open() || file.bad())
-        return {std::nullopt,
-                path + " cannot be read: " + std::generic_category().message(errno)};
+        return {std::nullopt, path + " cannot be read: " + std::generic_category().message(errno)};
     return {std::move(text), {}};
 }
 

@@ -16,8 +16,9 @@ struct ImportReport {
     std::vector<std::string> messages; ///< sentences that name the card's place, in its order
 };
 
-/// Imports every card that can be read in one transaction. Fails, leaving the store as it was, when the
-/// file cannot be read, holds no card, or the store cannot be written. Skipped cards are no failure.
+/// Imports every card that can be read in one transaction. Fails, leaving the store as it was, when
+/// the file cannot be read, holds no card, or the store cannot be written. Skipped cards are no
+/// failure.
 Outcome<ImportReport> importVcards(ContactsWriter &writer, const std::string &path);
 
 } // namespace pelliko::contacts

@@ -55,8 +55,8 @@ public:
     }
 
 private:
-    // A card may hold the card of its person's agent; any other BEGIN inside a card means that the END
-    // of the card before it is missing.
+    // A card may hold the card of its person's agent; any other BEGIN inside a card means that the
+    // END of the card before it is missing.
     void begin()
     {
         if (m_depth > 0 && m_after_agent) {

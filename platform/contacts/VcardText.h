@@ -14,8 +14,8 @@ struct RawCard {
     std::string error; ///< why it is no card, or empty
 };
 
-/// The cards of the text in their order, also those that are broken. What stands outside of cards is
-/// left out. Text that is not UTF-8 is taken as Windows-1252, which old phones write.
+/// The cards of the text in their order, also those that are broken. What stands outside of cards
+/// is left out. Text that is not UTF-8 is taken as Windows-1252, which old phones write.
 std::vector<RawCard> splitCards(std::string_view text);
 
 } // namespace pelliko::contacts

@@ -11,10 +11,9 @@ namespace
 {
 
 constexpr const char *person_from = "persons p LEFT JOIN contacts d ON d.id = p.display_contact_id";
-constexpr const char *person_contact_from =
-    "contacts c JOIN persons p ON p.id = c.person_id "
-    "JOIN address_books b ON b.id = c.address_book_id "
-    "LEFT JOIN contacts d ON d.id = p.display_contact_id";
+constexpr const char *person_contact_from = "contacts c JOIN persons p ON p.id = c.person_id "
+                                            "JOIN address_books b ON b.id = c.address_book_id "
+                                            "LEFT JOIN contacts d ON d.id = p.display_contact_id";
 constexpr const char *person_number_from =
     "numbers n JOIN contacts c ON c.id = n.contact_id JOIN persons p ON p.id = c.person_id "
     "LEFT JOIN contacts d ON d.id = p.display_contact_id";
@@ -47,10 +46,13 @@ View numberView()
             "numbers n",
             "n.id",
             "n.id",
-            {integer(ids.id, "n.id"), integer(ids.contact_id, "n.contact_id"),
-             integer(ids.type, "n.type"), text(ids.label, "n.label", "fold(n.label)"),
+            {integer(ids.id, "n.id"),
+             integer(ids.contact_id, "n.contact_id"),
+             integer(ids.type, "n.type"),
+             text(ids.label, "n.label", "fold(n.label)"),
              {ids.is_default, ValueType::Bool, "n.is_default", nullptr, Matching::Text},
-             numberText(ids.number), normalizedNumber(ids.number_filter),
+             numberText(ids.number),
+             normalizedNumber(ids.number_filter),
              normalizedNumber(ids.normalized_number),
              text(ids.cleaned_number, "n.cleaned", nullptr, Matching::Cleaned)}};
 }
@@ -58,33 +60,31 @@ View numberView()
 View simpleContactView()
 {
     const auto &ids = _contacts_simple_contact;
-    return {ids._uri,
-            "contacts c",
-            "c.id",
-            "c.id",
-            {integer(ids.id, "c.id"),
-             text(ids.display_name, "c.display_name", "fold(c.display_name)"),
-             integer(ids.display_source_type, "c.display_source_type"),
-             integer(ids.address_book_id, "c.address_book_id"),
-             text(ids.ringtone_path, "c.ringtone_path", "fold(c.ringtone_path)"),
-             text(ids.image_thumbnail_path, "c.image_thumbnail_path",
-                  "fold(c.image_thumbnail_path)"),
-             integer(ids.person_id, "c.person_id")}};
+    return {
+        ids._uri,
+        "contacts c",
+        "c.id",
+        "c.id",
+        {integer(ids.id, "c.id"), text(ids.display_name, "c.display_name", "fold(c.display_name)"),
+         integer(ids.display_source_type, "c.display_source_type"),
+         integer(ids.address_book_id, "c.address_book_id"),
+         text(ids.ringtone_path, "c.ringtone_path", "fold(c.ringtone_path)"),
+         text(ids.image_thumbnail_path, "c.image_thumbnail_path", "fold(c.image_thumbnail_path)"),
+         integer(ids.person_id, "c.person_id")}};
 }
 
 View personView()
 {
     const auto &ids = _contacts_person;
-    return {ids._uri,
-            person_from,
-            "p.id",
-            "p.id",
-            {integer(ids.id, "p.id"),
-             text(ids.display_name, "d.display_name", "fold(d.display_name)"),
-             integer(ids.display_contact_id, "p.display_contact_id"),
-             text(ids.ringtone_path, "p.ringtone_path", "fold(p.ringtone_path)"),
-             text(ids.image_thumbnail_path, "d.image_thumbnail_path",
-                  "fold(d.image_thumbnail_path)")}};
+    return {
+        ids._uri,
+        person_from,
+        "p.id",
+        "p.id",
+        {integer(ids.id, "p.id"), text(ids.display_name, "d.display_name", "fold(d.display_name)"),
+         integer(ids.display_contact_id, "p.display_contact_id"),
+         text(ids.ringtone_path, "p.ringtone_path", "fold(p.ringtone_path)"),
+         text(ids.image_thumbnail_path, "d.image_thumbnail_path", "fold(d.image_thumbnail_path)")}};
 }
 
 // Number ids are decimal, so that SQLite's own lower(), which the index is over, folds them.
@@ -98,17 +98,17 @@ std::vector<Property> serviceProperties()
 View personContactView()
 {
     const auto &ids = _contacts_person_contact;
-    View view{ids._uri,
-              person_contact_from,
-              "c.id",
-              nullptr,
-              {integer(ids.person_id, "p.id"),
-               text(ids.display_name, "d.display_name", "fold(d.display_name)"),
-               text(ids.image_thumbnail_path, "d.image_thumbnail_path",
-                    "fold(d.image_thumbnail_path)"),
-               integer(ids.contact_id, "c.id"), integer(ids.address_book_id, "b.id"),
-               integer(ids.address_book_mode, "b.mode"),
-               text(ids.address_book_name, "b.name", "fold(b.name)")}};
+    View view{
+        ids._uri,
+        person_contact_from,
+        "c.id",
+        nullptr,
+        {integer(ids.person_id, "p.id"),
+         text(ids.display_name, "d.display_name", "fold(d.display_name)"),
+         text(ids.image_thumbnail_path, "d.image_thumbnail_path", "fold(d.image_thumbnail_path)"),
+         integer(ids.contact_id, "c.id"), integer(ids.address_book_id, "b.id"),
+         integer(ids.address_book_mode, "b.mode"),
+         text(ids.address_book_name, "b.name", "fold(b.name)")}};
     for (const Property &property : serviceProperties())
         view.properties.push_back(property);
     return view;
@@ -123,16 +123,16 @@ View serviceView()
 View personNumberView()
 {
     const auto &ids = _contacts_person_number;
-    return {ids._uri,
-            person_number_from,
-            "n.id",
-            nullptr,
-            {integer(ids.person_id, "p.id"),
-             text(ids.display_name, "d.display_name", "fold(d.display_name)"),
-             text(ids.image_thumbnail_path, "d.image_thumbnail_path",
-                  "fold(d.image_thumbnail_path)"),
-             integer(ids.number_id, "n.id"), integer(ids.type, "n.type"), numberText(ids.number),
-             normalizedNumber(ids.number_filter)}};
+    return {
+        ids._uri,
+        person_number_from,
+        "n.id",
+        nullptr,
+        {integer(ids.person_id, "p.id"),
+         text(ids.display_name, "d.display_name", "fold(d.display_name)"),
+         text(ids.image_thumbnail_path, "d.image_thumbnail_path", "fold(d.image_thumbnail_path)"),
+         integer(ids.number_id, "n.id"), integer(ids.type, "n.type"), numberText(ids.number),
+         normalizedNumber(ids.number_filter)}};
 }
 
 } // namespace

@@ -10,10 +10,10 @@ enum class ValueType { Bool, Integer, Text };
 
 /// How a text property is compared.
 enum class Matching {
-    Text,         ///< as the match flag says
-    NumberText,   ///< as the match flag says, with the index over parts of numbers
-    Normalized,   ///< exactly, after normalizeNumber on both sides
-    Cleaned,      ///< exactly, after cleanNumber on both sides
+    Text,       ///< as the match flag says
+    NumberText, ///< as the match flag says, with the index over parts of numbers
+    Normalized, ///< exactly, after normalizeNumber on both sides
+    Cleaned,    ///< exactly, after cleanNumber on both sides
 };
 
 struct Property {
