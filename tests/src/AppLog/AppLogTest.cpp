@@ -1,0 +1,258 @@
+#include "AppLog/AppLog.h"
+#include "support/FileLog.h"
+#include "support/FreshProcess.h"
+
+#include <cstdlib>
+#include <filesystem>
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <regex>
+#include <sys/syscall.h>
+#include <thread>
+
+namespace pelliko
+{
+namespace
+{
+
+namespace fs = std::filesystem;
+using test::FileLog;
+using test::holdsInFreshProcess;
+using ::testing::ElementsAre;
+using ::testing::HasSubstr;
+
+constexpr uintmax_t rotationSize = 5242880;
+constexpr const char *tag = "PELLIKO:MESSAGE";
+
+std::string archive(int number)
+{
+    return std::string(test::logPath) + "." + std::to_string(number) + ".tar.gz";
+}
+
+void write(const std::string &text)
+{
+    appLogWrite("AppLogTest.cpp", "write", 1, tag, "%s", text.c_str());
+}
+
+std::string textIn(const std::string &archive_path)
+{
+    std::string text;
+    FILE *tar = popen(("tar -xzOf " + archive_path + " app.log | tail -c 200").c_str(), "r");
+    char buffer[256];
+    while (fgets(buffer, sizeof(buffer), tar))
+        text += buffer;
+    pclose(tar);
+    return text;
+}
+
+// The bytes that one line with an empty message takes in this process.
+uintmax_t lineLength()
+{
+    const uintmax_t before = fs::file_size(test::logPath);
+    write("");
+    return fs::file_size(test::logPath) - before;
+}
+
+void rotateWith(const std::string &mark)
+{
+    fs::resize_file(test::logPath, rotationSize - 1);
+    write(mark);
+}
+
+class AppLog : public ::testing::Test
+{
+protected:
+    // The module counts its archives per process: each case has a directory and a process of its
+    // own.
+    void SetUp() override
+    {
+        fs::remove_all(test::logDirectory);
+        fs::create_directories(test::logDirectory);
+    }
+    void TearDown() override
+    {
+        fs::remove_all(test::logDirectory);
+        fs::create_directories(test::logDirectory);
+    }
+};
+
+TEST_F(AppLog, LineHasTimeThreadTagAndPlace)
+{
+    const FileLog log;
+    appLogWrite("Some.cpp", "someFunction", 42, tag, "count = %d", 7);
+    ASSERT_EQ(log.lines().size(), 1u);
+    const std::regex form("(\\d{4})-(\\d{2})-(\\d{2}) (\\d{2}):(\\d{2}):(\\d{2}) \\((\\d+)\\) "
+                          "\\[PELLIKO:MESSAGE\\] Some\\.cpp: someFunction\\(42\\) > count = 7");
+    std::smatch parts;
+    const std::string line = log.lines()[0];
+    ASSERT_TRUE(std::regex_match(line, parts, form)) << line;
+    EXPECT_EQ(parts[7].str(), std::to_string(syscall(SYS_gettid)));
+    const time_t now = time(nullptr);
+    struct tm local;
+    localtime_r(&now, &local);
+    EXPECT_EQ(parts[1].str(), std::to_string(local.tm_year + 1900));
+}
+
+TEST_F(AppLog, PercentInAMessageIsNotFormattedAgain)
+{
+    const FileLog log;
+    write("100%d of %s %n");
+    EXPECT_THAT(log.messages(), ElementsAre("100%d of %s %n"));
+}
+
+TEST_F(AppLog, MacrosWriteTheMessageWithTheCallersPlace)
+{
+    const FileLog log;
+    LOG_DEBUG("one %d", 1);
+    LOG_ERROR("two");
+    ASSERT_EQ(log.lines().size(), 2u);
+    EXPECT_THAT(log.lines()[0], HasSubstr("AppLogTest.cpp: TestBody("));
+    EXPECT_THAT(log.messages(), ElementsAre("one 1", "two"));
+}
+
+int checkedNull(const char *data)
+{
+    RETURN_VALUE_IF_NULL(data, -1, "data is NULL");
+    return 0;
+}
+
+void checkedCount(int count)
+{
+    RETURN_IF(count % 2 == 1, "count %d is odd", count);
+    LOG_DEBUG("count is good");
+}
+
+TEST_F(AppLog, ChecksNameTheConditionAndTheResult)
+{
+    const FileLog log;
+    EXPECT_EQ(checkedNull(nullptr), -1);
+    EXPECT_EQ(checkedNull("x"), 0);
+    checkedCount(3);
+    checkedCount(2);
+    EXPECT_THAT(log.messages(),
+                ElementsAre("[ERROR][(data == NULL)] Return value : -1, message : data is NULL",
+                            "[ERROR][(count % 2 == 1)] Return message : count 3 is odd",
+                            "count is good"));
+}
+
+TEST_F(AppLog, LineThatFillsTheFileRotatesAtOnce)
+{
+    EXPECT_TRUE(holdsInFreshProcess([] {
+        write("x");
+        const uintmax_t line = lineLength();
+        fs::resize_file(test::logPath, rotationSize - 1 - line);
+        write("");
+        EXPECT_EQ(fs::file_size(test::logPath), rotationSize - 1);
+        EXPECT_FALSE(fs::exists(archive(1)));
+
+        fs::resize_file(test::logPath, rotationSize - line);
+        write("");
+        EXPECT_EQ(fs::file_size(test::logPath), 0u);
+        EXPECT_TRUE(fs::exists(archive(1)));
+        const FileLog log;
+        write("first of the fresh file");
+        EXPECT_THAT(log.messages(), ElementsAre("first of the fresh file"));
+        EXPECT_LT(fs::file_size(test::logPath), 200u);
+    }));
+}
+
+TEST_F(AppLog, SevenRotationsLeaveTheFiveNewestArchives)
+{
+    EXPECT_TRUE(holdsInFreshProcess([] {
+        write("x");
+        for (int i = 1; i <= 7; ++i)
+            rotateWith("mark " + std::to_string(i));
+        EXPECT_FALSE(fs::exists(archive(6)));
+        for (int i = 1; i <= 5; ++i)
+            EXPECT_THAT(textIn(archive(i)), HasSubstr("mark " + std::to_string(8 - i)));
+    }));
+}
+
+TEST_F(AppLog, NewProcessOverwritesTheNewestArchiveFirst)
+{
+    EXPECT_TRUE(holdsInFreshProcess([] {
+        write("x");
+        rotateWith("old process");
+    }));
+    EXPECT_TRUE(holdsInFreshProcess([] {
+        write("x");
+        rotateWith("new process, first");
+        EXPECT_FALSE(fs::exists(archive(2)));
+        EXPECT_THAT(textIn(archive(1)), HasSubstr("new process, first"));
+        rotateWith("new process, second");
+        EXPECT_THAT(textIn(archive(2)), HasSubstr("new process, first"));
+    }));
+}
+
+TEST_F(AppLog, OnlyFilesNamedAppCountAtTheStartAlsoInSubfolders)
+{
+    fs::create_directory(std::string(test::logDirectory) + "/deep");
+    std::ofstream(std::string(test::logDirectory) + "/deep/app");
+    std::ofstream(std::string(test::logDirectory) + "/apple");
+    std::ofstream(archive(1)) << "old one";
+    std::ofstream(archive(2)) << "old two";
+    EXPECT_TRUE(holdsInFreshProcess([] {
+        write("x");
+        rotateWith("mark");
+        // One was counted, so archive 1 moved over archive 2 and nothing moved to 3.
+        std::string text;
+        std::ifstream(archive(2)) >> text >> text;
+        EXPECT_EQ(text, "one");
+        EXPECT_FALSE(fs::exists(archive(3)));
+    }));
+}
+
+TEST_F(AppLog, WithoutTarTheFileIsEmptiedAndTheRotationCounted)
+{
+    std::ofstream(archive(1)) << "stale";
+    EXPECT_TRUE(holdsInFreshProcess([] {
+        const std::string path = getenv("PATH");
+        write("x");
+        setenv("PATH", "/nowhere", 1);
+        rotateWith("lost");
+        setenv("PATH", path.c_str(), 1);
+        EXPECT_EQ(fs::file_size(test::logPath), 0u);
+        EXPECT_FALSE(fs::exists(archive(2)));
+        write("x");
+        rotateWith("kept");
+        std::string text;
+        std::ifstream(archive(2)) >> text;
+        EXPECT_EQ(text, "stale");
+        EXPECT_THAT(textIn(archive(1)), HasSubstr("kept"));
+    }));
+}
+
+TEST_F(AppLog, WithoutADirectoryNothingIsCreatedUntilItIsThere)
+{
+    fs::remove_all(test::logDirectory);
+    EXPECT_TRUE(holdsInFreshProcess([] {
+        write("lost");
+        EXPECT_FALSE(fs::exists(test::logDirectory));
+        fs::create_directory(test::logDirectory);
+        const FileLog log;
+        write("kept");
+        EXPECT_THAT(log.messages(), ElementsAre("kept"));
+    }));
+}
+
+TEST_F(AppLog, LinesOfManyThreadsNeverMix)
+{
+    constexpr int threads = 8;
+    constexpr int lines = 200;
+    const FileLog log;
+    std::vector<std::thread> writers;
+    for (int i = 0; i < threads; ++i)
+        writers.emplace_back([i] {
+            for (int j = 0; j < lines; ++j)
+                write(std::string(300, static_cast<char>('a' + i)));
+        });
+    for (std::thread &writer : writers)
+        writer.join();
+    const std::vector<std::string> messages = log.messages();
+    EXPECT_EQ(messages.size(), size_t{threads * lines});
+    for (const std::string &message : messages)
+        ASSERT_EQ(message, std::string(300, message.at(0)));
+}
+
+} // namespace
+} // namespace pelliko
