@@ -27,23 +27,43 @@ constexpr const char *supported_extensions[] = {
 constexpr int extensionCount = sizeof(supported_extensions) / sizeof(supported_extensions[0]) - 1;
 constexpr size_t sentinelLength = 7;
 
+// Only as many characters as the extension has are compared: "mp" is taken for "mpeg".
+bool _matches(const char *row, const char *extension, size_t length)
+{
+    return strncasecmp(extension, row, length) == 0;
+}
+
+bool _isSentinel(const char *row)
+{
+    return strncmp(row, "invalid", sentinelLength) == 0;
+}
+
+// The first row that the extension begins; but an extension that is a row itself is that row, so
+// that "fl" is not taken for the earlier "flv".
+int _rowOf(const char *extension)
+{
+    const size_t length = strlen(extension);
+    int first = -1;
+    for (int row = 0; !_isSentinel(supported_extensions[row]); ++row) {
+        if (!_matches(supported_extensions[row], extension, length))
+            continue;
+        if (supported_extensions[row][length] == '\0')
+            return row;
+        if (first < 0)
+            first = row;
+    }
+    return first;
+}
+
 } // namespace
 
 int supportedExtensionPosition(const char *path)
 {
     const char *dot = path ? strrchr(path, '.') : nullptr;
-    if (!dot)
-        return -1;
-    const char *extension = dot + 1;
-    // Only as many characters as the extension has are compared: "mp" is taken for "mpeg".
-    const size_t length = strlen(extension);
-    for (int row = 0; strncmp(supported_extensions[row], "invalid", sentinelLength) != 0; ++row) {
-        if (strncasecmp(extension, supported_extensions[row], length) == 0) {
-            LOG_DEBUG("extension[%s], match[%s]", extension, supported_extensions[row]);
-            return row;
-        }
-    }
-    return -1;
+    const int row = dot ? _rowOf(dot + 1) : -1;
+    if (row >= 0)
+        LOG_DEBUG("extension[%s], match[%s]", dot + 1, supported_extensions[row]);
+    return row;
 }
 
 const char *supportedExtensionAt(int position)

@@ -36,11 +36,10 @@ void write(const std::string &text)
 
 std::string textIn(const std::string &archive_path)
 {
-    std::string text;
+    std::string text; // holds the zeros that fill the file too
     FILE *tar = popen(("tar -xzOf " + archive_path + " app.log | tail -c 200").c_str(), "r");
     char buffer[256];
-    while (fgets(buffer, sizeof(buffer), tar))
-        text += buffer;
+    text.assign(buffer, fread(buffer, 1, sizeof(buffer), tar));
     pclose(tar);
     return text;
 }
@@ -78,36 +77,42 @@ protected:
 
 TEST_F(AppLog, LineHasTimeThreadTagAndPlace)
 {
-    const FileLog log;
-    appLogWrite("Some.cpp", "someFunction", 42, tag, "count = %d", 7);
-    ASSERT_EQ(log.lines().size(), 1u);
-    const std::regex form("(\\d{4})-(\\d{2})-(\\d{2}) (\\d{2}):(\\d{2}):(\\d{2}) \\((\\d+)\\) "
-                          "\\[PELLIKO:MESSAGE\\] Some\\.cpp: someFunction\\(42\\) > count = 7");
-    std::smatch parts;
-    const std::string line = log.lines()[0];
-    ASSERT_TRUE(std::regex_match(line, parts, form)) << line;
-    EXPECT_EQ(parts[7].str(), std::to_string(syscall(SYS_gettid)));
-    const time_t now = time(nullptr);
-    struct tm local;
-    localtime_r(&now, &local);
-    EXPECT_EQ(parts[1].str(), std::to_string(local.tm_year + 1900));
+    EXPECT_TRUE(holdsInFreshProcess([] {
+        const FileLog log;
+        appLogWrite("Some.cpp", "someFunction", 42, tag, "count = %d", 7);
+        ASSERT_EQ(log.lines().size(), 1u);
+        const std::regex form("(\\d{4})-(\\d{2})-(\\d{2}) (\\d{2}):(\\d{2}):(\\d{2}) \\((\\d+)\\) "
+                              "\\[PELLIKO:MESSAGE\\] Some\\.cpp: someFunction\\(42\\) > count = 7");
+        std::smatch parts;
+        const std::string line = log.lines()[0];
+        ASSERT_TRUE(std::regex_match(line, parts, form)) << line;
+        EXPECT_EQ(parts[7].str(), std::to_string(syscall(SYS_gettid)));
+        const time_t now = time(nullptr);
+        struct tm local;
+        localtime_r(&now, &local);
+        EXPECT_EQ(parts[1].str(), std::to_string(local.tm_year + 1900));
+    }));
 }
 
 TEST_F(AppLog, PercentInAMessageIsNotFormattedAgain)
 {
-    const FileLog log;
-    write("100%d of %s %n");
-    EXPECT_THAT(log.messages(), ElementsAre("100%d of %s %n"));
+    EXPECT_TRUE(holdsInFreshProcess([] {
+        const FileLog log;
+        write("100%d of %s %n");
+        EXPECT_THAT(log.messages(), ElementsAre("100%d of %s %n"));
+    }));
 }
 
 TEST_F(AppLog, MacrosWriteTheMessageWithTheCallersPlace)
 {
-    const FileLog log;
-    LOG_DEBUG("one %d", 1);
-    LOG_ERROR("two");
-    ASSERT_EQ(log.lines().size(), 2u);
-    EXPECT_THAT(log.lines()[0], HasSubstr("AppLogTest.cpp: TestBody("));
-    EXPECT_THAT(log.messages(), ElementsAre("one 1", "two"));
+    EXPECT_TRUE(holdsInFreshProcess([] {
+        const FileLog log;
+        LOG_DEBUG("one %d", 1);
+        LOG_ERROR("two");
+        ASSERT_EQ(log.lines().size(), 2u);
+        EXPECT_THAT(log.lines()[0], HasSubstr("AppLogTest.cpp: operator()("));
+        EXPECT_THAT(log.messages(), ElementsAre("one 1", "two"));
+    }));
 }
 
 int checkedNull(const char *data)
@@ -124,15 +129,17 @@ void checkedCount(int count)
 
 TEST_F(AppLog, ChecksNameTheConditionAndTheResult)
 {
-    const FileLog log;
-    EXPECT_EQ(checkedNull(nullptr), -1);
-    EXPECT_EQ(checkedNull("x"), 0);
-    checkedCount(3);
-    checkedCount(2);
-    EXPECT_THAT(log.messages(),
-                ElementsAre("[ERROR][(data == NULL)] Return value : -1, message : data is NULL",
-                            "[ERROR][(count % 2 == 1)] Return message : count 3 is odd",
-                            "count is good"));
+    EXPECT_TRUE(holdsInFreshProcess([] {
+        const FileLog log;
+        EXPECT_EQ(checkedNull(nullptr), -1);
+        EXPECT_EQ(checkedNull("x"), 0);
+        checkedCount(3);
+        checkedCount(2);
+        EXPECT_THAT(log.messages(),
+                    ElementsAre("[ERROR][(data == NULL)] Return value : -1, message : data is NULL",
+                                "[ERROR][(count % 2 == 1)] Return message : count 3 is odd",
+                                "count is good"));
+    }));
 }
 
 TEST_F(AppLog, LineThatFillsTheFileRotatesAtOnce)
@@ -237,21 +244,23 @@ TEST_F(AppLog, WithoutADirectoryNothingIsCreatedUntilItIsThere)
 
 TEST_F(AppLog, LinesOfManyThreadsNeverMix)
 {
-    constexpr int threads = 8;
-    constexpr int lines = 200;
-    const FileLog log;
-    std::vector<std::thread> writers;
-    for (int i = 0; i < threads; ++i)
-        writers.emplace_back([i] {
-            for (int j = 0; j < lines; ++j)
-                write(std::string(300, static_cast<char>('a' + i)));
-        });
-    for (std::thread &writer : writers)
-        writer.join();
-    const std::vector<std::string> messages = log.messages();
-    EXPECT_EQ(messages.size(), size_t{threads * lines});
-    for (const std::string &message : messages)
-        ASSERT_EQ(message, std::string(300, message.at(0)));
+    EXPECT_TRUE(holdsInFreshProcess([] {
+        constexpr int threads = 8;
+        constexpr int lines = 200;
+        const FileLog log;
+        std::vector<std::thread> writers;
+        for (int i = 0; i < threads; ++i)
+            writers.emplace_back([i] {
+                for (int j = 0; j < lines; ++j)
+                    write(std::string(300, static_cast<char>('a' + i)));
+            });
+        for (std::thread &writer : writers)
+            writer.join();
+        const std::vector<std::string> messages = log.messages();
+        EXPECT_EQ(messages.size(), size_t{threads * lines});
+        for (const std::string &message : messages)
+            ASSERT_EQ(message, std::string(300, message.at(0)));
+    }));
 }
 
 } // namespace

@@ -70,6 +70,13 @@ TEST(SupportedFileTypes, LongerExtensionIsNotTakenForAShorterRow)
     EXPECT_EQ(supportedExtensionPosition("/tmp/song.fl"), 55);
 }
 
+TEST(SupportedFileTypes, RowOfItsOwnWinsOverAnEarlierLongerRow)
+{
+    EXPECT_EQ(matchOf("a.htm"), "htm");
+    EXPECT_EQ(matchOf("a.ht"), "html");
+    EXPECT_EQ(matchOf("a.f"), "flv");
+}
+
 TEST(SupportedFileTypes, SentinelIsNeverMatched)
 {
     EXPECT_EQ(isSupportedFileType("/tmp/notes.invalid"), 0);

@@ -49,23 +49,33 @@ protected:
     test::FileLog log;
 };
 
-// Calls safeExit inside a running loop; true when that ended the loop.
+Eina_Bool stillRunning(void *ended)
+{
+    *static_cast<bool *>(ended) = false;
+    ecore_main_loop_quit();
+    return ECORE_CALLBACK_CANCEL;
+}
+
+// Calls safeExit inside a running loop; true when that ended the loop. A loop that goes on becomes
+// idle, one that was asked to end does not.
 bool endsTheLoop()
 {
     bool ended = true;
-    ecore_job_add([](void *) { safeExit(); }, nullptr);
-    // Runs only when the loop is still there a moment later, and ends it.
-    Ecore_Timer *watch = ecore_timer_add(
-        0.3,
-        [](void *data) -> Eina_Bool {
-            *static_cast<bool *>(data) = false;
-            ecore_main_loop_quit();
-            return ECORE_CALLBACK_CANCEL;
+    Ecore_Idler *idle = nullptr;
+    struct Watch {
+        bool &ended;
+        Ecore_Idler *&idle;
+    } watch = {ended, idle};
+    ecore_job_add(
+        [](void *data) {
+            safeExit();
+            auto *of = static_cast<Watch *>(data);
+            of->idle = ecore_idler_add(stillRunning, &of->ended);
         },
-        &ended);
+        &watch);
     ecore_main_loop_begin();
     if (ended)
-        ecore_timer_del(watch);
+        ecore_idler_del(idle);
     return ended;
 }
 
