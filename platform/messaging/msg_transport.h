@@ -10,8 +10,9 @@ extern "C" {
 
 /**
  * Submits the message of a request to each of its addresses and blocks until the transport has
- * taken it for good. MSG_SUCCESS, MSG_ERR_INVALID_PARAMETER for a request without message, text or
- * number, or MSG_ERR_TRANSPORT_ERROR when the transport failed; it may then be sent again.
+ * taken it for good. The text must have been set but may be empty; every address needs a number.
+ * MSG_SUCCESS, MSG_ERR_INVALID_PARAMETER for an incomplete request, or MSG_ERR_TRANSPORT_ERROR when
+ * the transport failed; the request may then be sent again.
  */
 int msg_sms_send_message(msg_handle_t handle, msg_struct_t request);
 
