@@ -9,6 +9,7 @@
 #include <cstdio>
 #include <cstring>
 #include <glib.h>
+#include <memory>
 #include <new>
 
 namespace pelliko
@@ -66,22 +67,34 @@ private:
 // What the loop over the ids does after one of them.
 enum class Step { next, stop };
 
+struct GFree {
+    void operator()(char *text) const { g_free(text); }
+};
+
 struct RecipientRecords {
     Record number;
     Record contact;
     Record person;
+    std::unique_ptr<char, GFree> number_text;
 };
 
-void _fillRecipient(UploadRecipient &recipient, int32_t number_id, const RecipientRecords &records)
+// The number without formatting characters, as a copy.
+char *_readNumber(const Record &record)
 {
-    const char *stored = records.number.text(_contacts_number.number);
+    const char *stored = record.text(_contacts_number.number);
     char *normalized = _makeNormalizedNumber(stored);
-    if (normalized)
-        LOG_DEBUG("normalized number = %s", normalized);
+    if (!normalized)
+        return g_strdup(stored);
+    LOG_DEBUG("normalized number = %s", normalized);
+    return normalized;
+}
+
+void _fillRecipient(UploadRecipient &recipient, int32_t number_id, RecipientRecords &records)
+{
     recipient.type = records.number.number(_contacts_number.type);
     recipient.number_id = number_id;
     recipient.name = g_strdup(records.contact.text(_contacts_simple_contact.display_name));
-    recipient.number = normalized ? normalized : g_strdup(stored);
+    recipient.number = records.number_text.release();
     recipient.image_path = g_strdup(records.person.text(_contacts_person.image_thumbnail_path));
 }
 
@@ -95,7 +108,7 @@ void _markSmsReceiver(UploadRecipient &recipient)
     g_has_sms_receiver = 1;
 }
 
-Step _appendRecipient(UploadItem &item, int32_t number_id, const RecipientRecords &records)
+Step _appendRecipient(UploadItem &item, int32_t number_id, RecipientRecords &records)
 {
     auto *recipient = new (std::nothrow) UploadRecipient;
     if (!recipient) {
@@ -119,6 +132,7 @@ Step _addRecipient(UploadItem &item, int32_t number_id)
     RecipientRecords records;
     if (!records.number.read(_contacts_number._uri, number_id))
         return Step::next;
+    records.number_text.reset(_readNumber(records.number));
     const int contact_id = records.number.number(_contacts_number.contact_id);
     if (!records.contact.read(_contacts_simple_contact._uri, contact_id))
         return Step::next;
