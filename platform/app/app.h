@@ -35,6 +35,7 @@ typedef void (*app_resume_cb)(void *user_data);
 typedef void (*app_control_cb)(app_control_h app_control, void *user_data);
 typedef void (*app_event_cb)(app_event_info_h event_info, void *user_data);
 
+/// pause and resume follow the windows, which only app_assist::WApp knows: it raises them itself.
 typedef struct {
     app_create_cb create;
     app_terminate_cb terminate;
