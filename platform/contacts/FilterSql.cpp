@@ -104,4 +104,25 @@ SqlText whereExpression(const Conditions &row)
     return all;
 }
 
+std::string selectFrom(const View &view)
+{
+    std::string columns;
+    for (const Property &property : view.properties) {
+        if (property.isReadable())
+            columns += (columns.empty() ? "" : ", ") + std::string(property.column);
+    }
+    return "SELECT " + columns + " FROM " + view.from;
+}
+
+SqlText selectText(const View &view, const Conditions &row, int offset, int limit)
+{
+    constexpr int all = -1;
+    SqlText select = whereExpression(row);
+    const std::string where = select.text.empty() ? "" : " WHERE " + select.text;
+    select.text = selectFrom(view) + where + " ORDER BY " + view.order + " LIMIT ? OFFSET ?";
+    select.values.emplace_back(limit == 0 ? all : limit);
+    select.values.emplace_back(offset);
+    return select;
+}
+
 } // namespace pelliko::contacts

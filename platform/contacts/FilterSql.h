@@ -21,4 +21,10 @@ struct SqlText {
 /// conditions. No part of a match value ever becomes part of the SQL text.
 SqlText whereExpression(const Conditions &row);
 
+/// "SELECT readable properties FROM tables" of the view.
+std::string selectFrom(const View &view);
+
+/// The whole query for a list of records; limit 0 means all.
+SqlText selectText(const View &view, const Conditions &row, int offset, int limit);
+
 } // namespace pelliko::contacts

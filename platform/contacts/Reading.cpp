@@ -1,6 +1,5 @@
 // contacts_db_*: records out of the tables.
 #include <memory>
-#include <string>
 
 #include <SQLiteCpp/SQLiteCpp.h>
 
@@ -13,16 +12,6 @@ namespace pelliko::contacts
 {
 namespace
 {
-
-std::string selectFrom(const View &view)
-{
-    std::string columns;
-    for (const Property &property : view.properties) {
-        if (property.isReadable())
-            columns += (columns.empty() ? "" : ", ") + std::string(property.column);
-    }
-    return "SELECT " + columns + " FROM " + view.from;
-}
 
 void bind(SQLite::Statement &statement, const std::vector<SqlValue> &values)
 {
@@ -69,17 +58,9 @@ int readList(const View &view, const Conditions &row, int offset, int limit, con
     SQLite::Database *database = threadDatabase();
     if (!database)
         return CONTACTS_ERROR_IPC;
-    constexpr int all = -1;
-    SqlText where = whereExpression(row);
-    std::string text = selectFrom(view);
-    if (!where.text.empty())
-        text += " WHERE " + where.text;
-    text += std::string(" ORDER BY ") + view.order + " LIMIT ? OFFSET ?";
-    where.values.emplace_back(limit == 0 ? all : limit);
-    where.values.emplace_back(offset);
-
-    SQLite::Statement select(*database, text);
-    bind(select, where.values);
+    const SqlText text = selectText(view, row, offset, limit);
+    SQLite::Statement select(*database, text.text);
+    bind(select, text.values);
     auto result = std::make_unique<__contacts_list_h>();
     while (select.executeStep())
         result->records.push_back(recordOf(view, select));

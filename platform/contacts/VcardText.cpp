@@ -30,6 +30,15 @@ bool isWord(std::string_view line, std::string_view word)
            g_ascii_strncasecmp(line.data(), word.data(), word.size()) == 0;
 }
 
+bool isQuotedPrintable(std::string_view line)
+{
+    std::string head(line.substr(0, line.find(':')));
+    for (char &letter : head)
+        letter = g_ascii_toupper(letter);
+    return head.find(";") != std::string::npos &&
+           head.find("QUOTED-PRINTABLE") != std::string::npos;
+}
+
 // Collects the lines of one card after the other.
 class Splitter
 {
@@ -41,7 +50,7 @@ public:
             begin();
         if (m_depth == 0)
             return;
-        m_card.text.append(line).append("\r\n");
+        append(line);
         if (isWord(line, "END:VCARD") && --m_depth == 0)
             finish();
         m_after_agent = isWord(line, "AGENT:");
@@ -55,6 +64,22 @@ public:
     }
 
 private:
+    // A quoted-printable value goes on in the next line after a "=" at its end. The vCard library
+    // does not join such lines.
+    void append(std::string_view line)
+    {
+        constexpr size_t soft_end = 3; // "=", CR, LF
+        const bool joins = m_value_goes_on && !isWord(line, "END:VCARD");
+        if (m_value_goes_on)
+            m_card.text.resize(m_card.text.size() - soft_end);
+        if (m_value_goes_on && !joins)
+            m_card.text.append("\r\n");
+        if (!joins)
+            m_is_quoted = isQuotedPrintable(line);
+        m_card.text.append(line).append("\r\n");
+        m_value_goes_on = m_is_quoted && line.ends_with('=');
+    }
+
     // A card may hold the card of its person's agent; any other BEGIN inside a card means that the
     // END of the card before it is missing.
     void begin()
@@ -66,6 +91,7 @@ private:
         if (m_depth > 0)
             abandon();
         m_depth = 1;
+        m_value_goes_on = false;
         m_card = {m_line, {}, {}};
     }
 
@@ -86,6 +112,8 @@ private:
     size_t m_line = 0;
     int m_depth = 0;
     bool m_after_agent = false;
+    bool m_is_quoted = false;
+    bool m_value_goes_on = false;
     RawCard m_card{};
     std::vector<RawCard> m_cards;
 };
