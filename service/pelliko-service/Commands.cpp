@@ -1,0 +1,116 @@
+#include "Commands.h"
+
+#include "Account.h"
+
+#include "com.velmora.pelliko.Service1.h"
+
+#include <nlohmann/json.hpp>
+
+#include <cstdio>
+#include <iostream>
+
+namespace pelliko::service
+{
+namespace
+{
+struct Row {
+    gint32 id = 0;
+    const char *state = "";
+    gint32 percent = 0;
+    gint32 files = 0;
+    gint64 size = 0;
+    gint64 expires = 0;
+    gint32 error = 0;
+};
+
+// The state stays the variant's.
+Row rowOf(GVariant *request)
+{
+    Row row;
+    g_variant_lookup(request, "id", "i", &row.id);
+    g_variant_lookup(request, "state", "&s", &row.state);
+    g_variant_lookup(request, "percent", "i", &row.percent);
+    g_variant_lookup(request, "files", "i", &row.files);
+    g_variant_lookup(request, "size", "x", &row.size);
+    g_variant_lookup(request, "expires", "x", &row.expires);
+    g_variant_lookup(request, "error", "i", &row.error);
+    return row;
+}
+
+GVariant *askRequests()
+{
+    g_autoptr(GError) error = nullptr;
+    g_autoptr(PellikoService1) proxy = pelliko_service1_proxy_new_for_bus_sync(
+        G_BUS_TYPE_SESSION, G_DBUS_PROXY_FLAGS_DO_NOT_LOAD_PROPERTIES,
+        "com.velmora.pelliko.Service", "/com/velmora/pelliko/Service", nullptr, &error);
+    GVariant *requests = nullptr;
+    if (!proxy || !pelliko_service1_call_list_requests_sync(proxy, &requests, nullptr, &error)) {
+        g_dbus_error_strip_remote_error(error);
+        std::fprintf(stderr, "pelliko-service: the service does not answer: %s\n", error->message);
+    }
+    return requests;
+}
+
+void printTable(GVariant *requests)
+{
+    std::printf("%10s  %-10s %8s %6s %15s %6s\n", "ID", "STATE", "PERCENT", "FILES", "BYTES",
+                "ERROR");
+    for (gsize i = 0; i < g_variant_n_children(requests); ++i) {
+        g_autoptr(GVariant) request = g_variant_get_child_value(requests, i);
+        const Row row = rowOf(request);
+        std::printf("%10d  %-10s %7d%% %6d %15" G_GINT64_FORMAT " %6d\n", row.id, row.state,
+                    row.percent, row.files, row.size, row.error);
+    }
+}
+
+void printJson(GVariant *requests)
+{
+    nlohmann::json list = nlohmann::json::array();
+    for (gsize i = 0; i < g_variant_n_children(requests); ++i) {
+        g_autoptr(GVariant) request = g_variant_get_child_value(requests, i);
+        const Row row = rowOf(request);
+        list.push_back({{"id", row.id},
+                        {"state", row.state},
+                        {"percent", row.percent},
+                        {"files", row.files},
+                        {"size", row.size},
+                        {"expires", row.expires},
+                        {"error", row.error}});
+    }
+    std::printf("%s\n", list.dump().c_str());
+}
+} // namespace
+
+int accountCommand(const std::string &file, const std::string &server, const std::string &number)
+{
+    Account account{server, number, {}};
+    if (!std::getline(std::cin, account.token)) {
+        std::fprintf(stderr, "pelliko-service: no token came on standard input\n");
+        return 1;
+    }
+    std::string fault = accountFault(account);
+    if (fault.empty()) {
+        fault = writeAccount(file, account);
+    }
+    if (!fault.empty()) {
+        std::fprintf(stderr, "pelliko-service: %s\n", fault.c_str());
+        return 1;
+    }
+    return 0;
+}
+
+int statusCommand(bool json)
+{
+    g_autoptr(GVariant) requests = askRequests();
+    if (!requests) {
+        return 1;
+    }
+    if (json) {
+        printJson(requests);
+    } else {
+        printTable(requests);
+    }
+    return 0;
+}
+
+} // namespace pelliko::service

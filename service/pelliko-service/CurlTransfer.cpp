@@ -1,0 +1,177 @@
+#include "CurlTransfer.h"
+
+#include <algorithm>
+#include <cctype>
+#include <cstdio>
+#include <utility>
+
+namespace pelliko::service
+{
+namespace
+{
+constexpr long connectSeconds = 20;
+constexpr long stallSeconds = 60; // without a byte in either direction
+constexpr long bufferBytes = 512L * 1024;
+constexpr size_t longestAnswer = 1024UL * 1024;
+constexpr std::chrono::milliseconds reportInterval{100};
+
+std::string failureName(CURLcode result)
+{
+    switch (result) {
+    case CURLE_OPERATION_TIMEDOUT:
+        return "timeout";
+    case CURLE_COULDNT_RESOLVE_HOST:
+    case CURLE_COULDNT_RESOLVE_PROXY:
+    case CURLE_COULDNT_CONNECT:
+        return "unreachable";
+    case CURLE_SSL_CONNECT_ERROR:
+    case CURLE_PEER_FAILED_VERIFICATION:
+    case CURLE_WEIRD_SERVER_REPLY:
+        return "unexpected_answer";
+    default:
+        return "connection_lost";
+    }
+}
+
+std::string trimmed(const std::string &text)
+{
+    const auto first = text.find_first_not_of(" \t\r\n");
+    const auto last = text.find_last_not_of(" \t\r\n");
+    return first == std::string::npos ? std::string() : text.substr(first, last - first + 1);
+}
+} // namespace
+
+CurlTransfer::CurlTransfer(uint64_t number, HttpRequest request, Progress progress)
+    : number_(number), request_(std::move(request)), progress_(std::move(progress)),
+      easy_(curl_easy_init())
+{
+    setOptions();
+    setBody();
+    curl_easy_setopt(easy_, CURLOPT_HTTPHEADER, headers_);
+}
+
+CurlTransfer::~CurlTransfer()
+{
+    curl_easy_cleanup(easy_);
+    curl_slist_free_all(headers_);
+}
+
+void CurlTransfer::setOptions()
+{
+    curl_easy_setopt(easy_, CURLOPT_PRIVATE, this);
+    curl_easy_setopt(easy_, CURLOPT_URL, request_.url.c_str());
+    curl_easy_setopt(easy_, CURLOPT_PROTOCOLS_STR, "http,https");
+    curl_easy_setopt(easy_, CURLOPT_FOLLOWLOCATION, 0L);
+    curl_easy_setopt(easy_, CURLOPT_NOSIGNAL, 1L);
+    curl_easy_setopt(easy_, CURLOPT_USERAGENT, "pelliko-service");
+    curl_easy_setopt(easy_, CURLOPT_CONNECTTIMEOUT, connectSeconds);
+    curl_easy_setopt(easy_, CURLOPT_LOW_SPEED_LIMIT, 1L);
+    curl_easy_setopt(easy_, CURLOPT_LOW_SPEED_TIME, stallSeconds);
+    curl_easy_setopt(easy_, CURLOPT_WRITEFUNCTION, onWrite);
+    curl_easy_setopt(easy_, CURLOPT_WRITEDATA, this);
+    curl_easy_setopt(easy_, CURLOPT_HEADERFUNCTION, onHeader);
+    curl_easy_setopt(easy_, CURLOPT_HEADERDATA, this);
+    for (const std::string &header : request_.headers) {
+        headers_ = curl_slist_append(headers_, header.c_str());
+    }
+    // Waiting for "100 Continue" costs a round trip and gains nothing: bodies are short or can be
+    // resumed.
+    headers_ = curl_slist_append(headers_, "Expect:");
+}
+
+void CurlTransfer::setBody()
+{
+    if (request_.range.file) {
+        curl_easy_setopt(easy_, CURLOPT_UPLOAD, 1L);
+        curl_easy_setopt(easy_, CURLOPT_INFILESIZE_LARGE,
+                         static_cast<curl_off_t>(request_.range.length));
+        curl_easy_setopt(easy_, CURLOPT_UPLOAD_BUFFERSIZE, bufferBytes);
+        curl_easy_setopt(easy_, CURLOPT_READFUNCTION, onRead);
+        curl_easy_setopt(easy_, CURLOPT_READDATA, this);
+        curl_easy_setopt(easy_, CURLOPT_SEEKFUNCTION, onSeek);
+        curl_easy_setopt(easy_, CURLOPT_SEEKDATA, this);
+        curl_easy_setopt(easy_, CURLOPT_XFERINFOFUNCTION, onProgress);
+        curl_easy_setopt(easy_, CURLOPT_XFERINFODATA, this);
+        curl_easy_setopt(easy_, CURLOPT_NOPROGRESS, 0L);
+    } else if (request_.method == "HEAD") {
+        curl_easy_setopt(easy_, CURLOPT_NOBODY, 1L);
+    } else if (request_.method == "POST") {
+        curl_easy_setopt(easy_, CURLOPT_POST, 1L);
+        curl_easy_setopt(easy_, CURLOPT_POSTFIELDS, request_.body.data());
+        curl_easy_setopt(easy_, CURLOPT_POSTFIELDSIZE_LARGE,
+                         static_cast<curl_off_t>(request_.body.size()));
+    }
+    curl_easy_setopt(easy_, CURLOPT_CUSTOMREQUEST, request_.method.c_str());
+}
+
+HttpAnswer CurlTransfer::answer(CURLcode result)
+{
+    curl_easy_getinfo(easy_, CURLINFO_RESPONSE_CODE, &answer_.status);
+    if (!readFailure_.empty()) {
+        answer_.failure = readFailure_;
+    } else if (result != CURLE_OK && answer_.status < 400) {
+        // A refusal that came before the whole body was sent is an answer all the same.
+        answer_.failure = failureName(result);
+    }
+    return answer_;
+}
+
+size_t CurlTransfer::onRead(char *buffer, size_t size, size_t count, void *self)
+{
+    auto &transfer = *static_cast<CurlTransfer *>(self);
+    const FileRange &range = transfer.request_.range;
+    const int64_t room = static_cast<int64_t>(size * count);
+    const int64_t wanted = std::min(room, range.length - transfer.position_);
+    const int64_t got = range.file->read(buffer, wanted, range.offset + transfer.position_);
+    if (got < 0 || (got == 0 && wanted > 0)) {
+        transfer.readFailure_ = got < 0 ? "file_unreadable" : "file_changed";
+        return CURL_READFUNC_ABORT;
+    }
+    transfer.position_ += got;
+    return static_cast<size_t>(got);
+}
+
+int CurlTransfer::onSeek(void *self, curl_off_t offset, int origin)
+{
+    if (origin != SEEK_SET) {
+        return CURL_SEEKFUNC_CANTSEEK;
+    }
+    static_cast<CurlTransfer *>(self)->position_ = offset;
+    return CURL_SEEKFUNC_OK;
+}
+
+size_t CurlTransfer::onWrite(char *data, size_t size, size_t count, void *self)
+{
+    std::string &body = static_cast<CurlTransfer *>(self)->answer_.body;
+    const size_t length = size * count;
+    body.append(data, std::min(length, longestAnswer - body.size()));
+    return length;
+}
+
+size_t CurlTransfer::onHeader(char *data, size_t size, size_t count, void *self)
+{
+    const size_t length = size * count;
+    const std::string line(data, length);
+    const auto colon = line.find(':');
+    if (colon != std::string::npos) {
+        std::string name = line.substr(0, colon);
+        std::transform(name.begin(), name.end(), name.begin(),
+                       [](unsigned char c) { return static_cast<char>(std::tolower(c)); });
+        static_cast<CurlTransfer *>(self)->answer_.headers[name] = trimmed(line.substr(colon + 1));
+    }
+    return length;
+}
+
+int CurlTransfer::onProgress(void *self, curl_off_t, curl_off_t, curl_off_t, curl_off_t sent)
+{
+    auto &transfer = *static_cast<CurlTransfer *>(self);
+    const auto now = std::chrono::steady_clock::now();
+    if (sent != transfer.reported_ && now - transfer.lastReport_ >= reportInterval) {
+        transfer.reported_ = sent;
+        transfer.lastReport_ = now;
+        transfer.progress_(sent);
+    }
+    return 0;
+}
+
+} // namespace pelliko::service

@@ -1,0 +1,43 @@
+#pragma once
+
+#include <cstdint>
+#include <functional>
+#include <string>
+#include <vector>
+
+namespace pelliko::service
+{
+
+/** What the application is told when its messages are wanted. */
+struct SmsLaunch {
+    int32_t id = 0;
+    std::string url;
+    std::string from; ///< the user's own number
+    int64_t expires = 0;
+    int fileCount = 0;
+    std::vector<std::string> numbers;
+};
+
+enum class LaunchResult {
+    received, ///< the application has taken the launch
+    notSent,  ///< the application surely did not get it
+    unknown   ///< the receipt is missing; the application may have got it
+};
+
+/** Launches the application. Belongs to the main loop; the results come from there, never from
+ * inside a call. */
+class Launcher
+{
+public:
+    virtual ~Launcher() = default;
+
+    virtual void launchSms(const SmsLaunch &launch, std::function<void(LaunchResult)> done) = 0;
+
+    /** @param done receives whether the application answered that it takes the ids over */
+    virtual void launchResume(const std::vector<int32_t> &ids, std::function<void(bool)> done) = 0;
+
+    /** Whether the application runs now. */
+    virtual bool applicationRuns() const = 0;
+};
+
+} // namespace pelliko::service

@@ -1,0 +1,214 @@
+#include "TransferThread.h"
+
+#include "CurlTransfer.h"
+
+#include <glib.h>
+
+#include <mutex>
+#include <thread>
+#include <utility>
+
+namespace pelliko::service
+{
+namespace
+{
+constexpr int idleWaitMs = 600'000; // the thread is woken for everything that matters
+constexpr long connectionsPerHost = 8;
+
+using Task = std::function<void()>;
+
+gboolean runTask(gpointer data)
+{
+    (*static_cast<Task *>(data))();
+    return G_SOURCE_REMOVE;
+}
+
+void deleteTask(gpointer data)
+{
+    std::unique_ptr<Task>(static_cast<Task *>(data));
+}
+
+// An own source, for g_main_context_invoke() might run the task right here when the loop stands
+// still.
+void onMainLoop(Task task)
+{
+    GSource *source = g_idle_source_new();
+    g_source_set_priority(source, G_PRIORITY_DEFAULT);
+    g_source_set_callback(source, runTask, new Task(std::move(task)), deleteTask);
+    g_source_attach(source, nullptr);
+    g_source_unref(source);
+}
+} // namespace
+
+// What runs on the thread. Orders come through a list under a lock, results go to the main loop.
+class TransferThread::Loop
+{
+public:
+    explicit Loop(std::weak_ptr<TransferThread *> owner)
+        : owner_(std::move(owner)), multi_(curl_multi_init()), thread_([this] { run(); })
+    {
+    }
+
+    ~Loop()
+    {
+        {
+            const std::lock_guard lock(mutex_);
+            stop_ = true;
+        }
+        curl_multi_wakeup(multi_);
+        thread_.join();
+        curl_multi_cleanup(multi_);
+    }
+
+    void add(uint64_t number, HttpRequest request)
+    {
+        order([this, number, request = std::move(request)]() mutable {
+            begin(number, std::move(request));
+        });
+    }
+
+    void remove(uint64_t number)
+    {
+        order([this, number] { end(number); });
+    }
+
+private:
+    void order(Task task)
+    {
+        {
+            const std::lock_guard lock(mutex_);
+            orders_.push_back(std::move(task));
+        }
+        curl_multi_wakeup(multi_);
+    }
+
+    void run()
+    {
+        curl_multi_setopt(multi_, CURLMOPT_MAX_HOST_CONNECTIONS, connectionsPerHost);
+        while (takeOrders()) {
+            int running = 0;
+            curl_multi_perform(multi_, &running);
+            readResults();
+            curl_multi_poll(multi_, nullptr, 0, idleWaitMs, nullptr);
+        }
+        while (!transfers_.empty()) {
+            end(transfers_.begin()->first);
+        }
+    }
+
+    bool takeOrders()
+    {
+        std::vector<Task> orders;
+        {
+            const std::lock_guard lock(mutex_);
+            if (stop_) {
+                return false;
+            }
+            orders.swap(orders_);
+        }
+        for (Task &task : orders) {
+            task();
+        }
+        return true;
+    }
+
+    void begin(uint64_t number, HttpRequest request)
+    {
+        auto transfer = std::make_unique<CurlTransfer>(
+            number, std::move(request), [this, number](int64_t sent) {
+                post([number, sent](TransferThread &owner) { owner.onProgress(number, sent); });
+            });
+        curl_multi_add_handle(multi_, transfer->handle());
+        transfers_[number] = std::move(transfer);
+    }
+
+    void end(uint64_t number)
+    {
+        const auto found = transfers_.find(number);
+        if (found != transfers_.end()) {
+            curl_multi_remove_handle(multi_, found->second->handle());
+            transfers_.erase(found);
+        }
+    }
+
+    void readResults()
+    {
+        int left = 0;
+        while (const CURLMsg *message = curl_multi_info_read(multi_, &left)) {
+            if (message->msg != CURLMSG_DONE) {
+                continue;
+            }
+            CurlTransfer *transfer = nullptr;
+            const CURLcode result = message->data.result;
+            curl_easy_getinfo(message->easy_handle, CURLINFO_PRIVATE, &transfer);
+            const uint64_t number = transfer->number();
+            post([number, answer = transfer->answer(result)](TransferThread &owner) {
+                owner.onDone(number, answer);
+            });
+            end(number);
+        }
+    }
+
+    void post(std::function<void(TransferThread &)> task)
+    {
+        onMainLoop([owner = owner_, task = std::move(task)] {
+            if (const auto alive = owner.lock()) {
+                task(**alive);
+            }
+        });
+    }
+
+    std::weak_ptr<TransferThread *> owner_;
+    std::mutex mutex_;
+    std::vector<Task> orders_;
+    bool stop_ = false;
+    std::map<uint64_t, std::unique_ptr<CurlTransfer>> transfers_;
+    CURLM *multi_;
+    std::thread thread_;
+};
+
+TransferThread::TransferThread() : self_(std::make_shared<TransferThread *>(this))
+{
+    static std::once_flag once;
+    std::call_once(once, [] { curl_global_init(CURL_GLOBAL_DEFAULT); });
+    loop_ = std::make_unique<Loop>(self_);
+}
+
+TransferThread::~TransferThread() = default;
+
+uint64_t TransferThread::send(HttpRequest request, Progress progress, Done done)
+{
+    const uint64_t number = ++lastNumber_;
+    callbacks_[number] = {std::move(progress), std::move(done)};
+    loop_->add(number, std::move(request));
+    return number;
+}
+
+void TransferThread::cancel(uint64_t transfer)
+{
+    if (callbacks_.erase(transfer) != 0) {
+        loop_->remove(transfer);
+    }
+}
+
+void TransferThread::onProgress(uint64_t transfer, int64_t bytesSent)
+{
+    const auto found = callbacks_.find(transfer);
+    if (found != callbacks_.end() && found->second.progress) {
+        const Progress progress = found->second.progress;
+        progress(bytesSent);
+    }
+}
+
+void TransferThread::onDone(uint64_t transfer, const HttpAnswer &answer)
+{
+    const auto found = callbacks_.find(transfer);
+    if (found == callbacks_.end()) {
+        return;
+    }
+    const Callbacks callbacks = std::move(found->second);
+    callbacks_.erase(found);
+    callbacks.done(answer);
+}
+
+} // namespace pelliko::service

@@ -1,0 +1,299 @@
+#include "UploadQueue.h"
+
+#include <SQLiteCpp/SQLiteCpp.h>
+#include <SQLiteCpp/VariadicBind.h>
+#include <glib.h>
+#include <sys/random.h>
+
+#include <array>
+#include <stdexcept>
+
+namespace pelliko::service
+{
+namespace
+{
+constexpr int schemaVersion = 1;
+constexpr int busyMs =
+    60'000; // a backup that holds the file locked makes the service wait, not fail
+
+constexpr const char *schema = R"sql(
+CREATE TABLE requests (
+  id INTEGER PRIMARY KEY AUTOINCREMENT CHECK (id BETWEEN 1 AND 2147483647),
+  state INTEGER NOT NULL,
+  wifi_only INTEGER NOT NULL,
+  reshare_of TEXT NOT NULL,
+  idempotency_key TEXT NOT NULL,
+  share TEXT NOT NULL DEFAULT '',
+  url TEXT NOT NULL DEFAULT '',
+  expires INTEGER NOT NULL DEFAULT 0,
+  sms_state INTEGER NOT NULL DEFAULT 0,
+  sms_attempts INTEGER NOT NULL DEFAULT 0,
+  end_status INTEGER NOT NULL DEFAULT 0,
+  error INTEGER NOT NULL DEFAULT 0,
+  delivered INTEGER NOT NULL DEFAULT 0,
+  withdraw INTEGER NOT NULL DEFAULT 0,
+  created_at INTEGER NOT NULL,
+  ended_at INTEGER NOT NULL DEFAULT 0
+);
+CREATE INDEX requests_open ON requests (id) WHERE state < 2 OR delivered = 0;
+CREATE TABLE files (
+  request INTEGER NOT NULL REFERENCES requests (id) ON DELETE CASCADE,
+  position INTEGER NOT NULL,
+  path BLOB NOT NULL,
+  size INTEGER NOT NULL,
+  mtime_ns INTEGER NOT NULL,
+  PRIMARY KEY (request, position)
+) WITHOUT ROWID;
+CREATE TABLE recipients (
+  request INTEGER NOT NULL REFERENCES requests (id) ON DELETE CASCADE,
+  position INTEGER NOT NULL,
+  ccc TEXT NOT NULL,
+  number TEXT NOT NULL,
+  number_id INTEGER NOT NULL,
+  PRIMARY KEY (request, position)
+) WITHOUT ROWID;
+CREATE TABLE sms_numbers (
+  request INTEGER NOT NULL REFERENCES requests (id) ON DELETE CASCADE,
+  position INTEGER NOT NULL,
+  number TEXT NOT NULL,
+  PRIMARY KEY (request, position)
+) WITHOUT ROWID;
+)sql";
+
+std::unique_ptr<SQLite::Database> openDatabase(const std::string &file)
+{
+    g_autofree char *folder = g_path_get_dirname(file.c_str());
+    if (g_mkdir_with_parents(folder, 0700) != 0) {
+        throw std::runtime_error(std::string("cannot make ") + folder);
+    }
+    return std::make_unique<SQLite::Database>(
+        file, SQLite::OPEN_READWRITE | SQLite::OPEN_CREATE | SQLite::OPEN_FULLMUTEX, busyMs);
+}
+
+template <typename... Values>
+void execute(SQLite::Database &db, const char *sql, const Values &...values)
+{
+    SQLite::Statement statement(db, sql);
+    SQLite::bind(statement, values...);
+    statement.exec();
+}
+
+void addFiles(SQLite::Database &db, int64_t id, const std::vector<QueuedFile> &files)
+{
+    SQLite::Statement insert(db, "INSERT INTO files VALUES (?, ?, ?, ?, ?)");
+    int position = 0;
+    for (const QueuedFile &file : files) {
+        insert.bind(1, id);
+        insert.bind(2, position++);
+        insert.bind(3, file.path.data(), static_cast<int>(file.path.size()));
+        insert.bind(4, file.stamp.size);
+        insert.bind(5, file.stamp.mtimeNs);
+        insert.exec();
+        insert.reset();
+    }
+}
+
+void addRecipients(SQLite::Database &db, int64_t id, const std::vector<Recipient> &recipients)
+{
+    SQLite::Statement insert(db, "INSERT INTO recipients VALUES (?, ?, ?, ?, ?)");
+    int position = 0;
+    for (const Recipient &recipient : recipients) {
+        SQLite::bind(insert, id, position++, recipient.ccc, recipient.number, recipient.numberId);
+        insert.exec();
+        insert.reset();
+    }
+}
+} // namespace
+
+std::string randomKey()
+{
+    std::array<unsigned char, 16> bits{};
+    if (getrandom(bits.data(), bits.size(), 0) != static_cast<ssize_t>(bits.size())) {
+        throw std::runtime_error("the system gives no random numbers");
+    }
+    g_autofree char *text = g_base64_encode(bits.data(), bits.size());
+    g_strdelimit(text, "+", '-');
+    g_strdelimit(text, "/", '_');
+    return std::string(text, 22);
+}
+
+std::string UploadQueue::defaultFile()
+{
+    g_autofree char *path =
+        g_build_filename(g_get_user_data_dir(), "pelliko-service", "queue.db", nullptr);
+    return path;
+}
+
+UploadQueue::UploadQueue(const std::string &file) : db_(openDatabase(file))
+{
+    db_->exec("PRAGMA journal_mode = WAL");
+    db_->exec("PRAGMA synchronous = FULL");
+    db_->exec("PRAGMA foreign_keys = ON");
+    migrate();
+}
+
+UploadQueue::~UploadQueue() = default;
+
+void UploadQueue::migrate()
+{
+    SQLite::Transaction transaction(*db_, SQLite::TransactionBehavior::IMMEDIATE);
+    const int version = db_->execAndGet("PRAGMA user_version").getInt();
+    if (version > schemaVersion) {
+        throw std::runtime_error("the queue was made by a newer pelliko-service");
+    }
+    if (version == 0) {
+        db_->exec(schema);
+        db_->exec("PRAGMA user_version = 1");
+    }
+    transaction.commit();
+}
+
+int32_t UploadQueue::add(const NewRequest &request)
+{
+    SQLite::Transaction transaction(*db_, SQLite::TransactionBehavior::IMMEDIATE);
+    execute(*db_,
+            "INSERT INTO requests (state, wifi_only, reshare_of, idempotency_key, created_at)"
+            " VALUES (0, ?, ?, ?, ?)",
+            request.wifiOnly ? 1 : 0, request.reshareOf, randomKey(), request.createdAt);
+    const int64_t id = db_->getLastInsertRowid();
+    addFiles(*db_, id, request.files);
+    addRecipients(*db_, id, request.recipients);
+    transaction.commit();
+    return static_cast<int32_t>(id);
+}
+
+std::optional<QueuedRequest> UploadQueue::find(int32_t id)
+{
+    SQLite::Statement query(
+        *db_,
+        "SELECT state, wifi_only, reshare_of, idempotency_key, share, url, expires, sms_state,"
+        " sms_attempts, end_status, error, delivered FROM requests WHERE id = ?");
+    query.bind(1, id);
+    if (!query.executeStep()) {
+        return std::nullopt;
+    }
+    QueuedRequest request;
+    request.id = id;
+    request.state = static_cast<RequestState>(query.getColumn(0).getInt());
+    request.wifiOnly = query.getColumn(1).getInt() != 0;
+    request.reshareOf = query.getColumn(2).getString();
+    request.key = query.getColumn(3).getString();
+    request.share = query.getColumn(4).getString();
+    request.url = query.getColumn(5).getString();
+    request.expires = query.getColumn(6).getInt64();
+    request.smsState = static_cast<SmsState>(query.getColumn(7).getInt());
+    request.smsAttempts = query.getColumn(8).getInt();
+    request.endStatus = query.getColumn(9).getInt();
+    request.error = query.getColumn(10).getInt();
+    request.delivered = query.getColumn(11).getInt() != 0;
+    readFiles(request);
+    readRecipients(request);
+    return request;
+}
+
+void UploadQueue::readFiles(QueuedRequest &request)
+{
+    SQLite::Statement query(
+        *db_, "SELECT path, size, mtime_ns FROM files WHERE request = ? ORDER BY position");
+    query.bind(1, request.id);
+    while (query.executeStep()) {
+        request.files.push_back({query.getColumn(0).getString(),
+                                 {query.getColumn(1).getInt64(), query.getColumn(2).getInt64()}});
+    }
+}
+
+void UploadQueue::readRecipients(QueuedRequest &request)
+{
+    SQLite::Statement query(
+        *db_, "SELECT ccc, number, number_id FROM recipients WHERE request = ? ORDER BY position");
+    query.bind(1, request.id);
+    while (query.executeStep()) {
+        request.recipients.push_back({query.getColumn(0).getString(),
+                                      query.getColumn(1).getString(), query.getColumn(2).getInt()});
+    }
+    SQLite::Statement sms(*db_,
+                          "SELECT number FROM sms_numbers WHERE request = ? ORDER BY position");
+    sms.bind(1, request.id);
+    while (sms.executeStep()) {
+        request.smsNumbers.push_back(sms.getColumn(0).getString());
+    }
+}
+
+std::vector<int32_t> UploadQueue::ids(const char *sql)
+{
+    SQLite::Statement query(*db_, sql);
+    std::vector<int32_t> result;
+    while (query.executeStep()) {
+        result.push_back(query.getColumn(0).getInt());
+    }
+    return result;
+}
+
+std::vector<int32_t> UploadQueue::allIds()
+{
+    return ids("SELECT id FROM requests ORDER BY id");
+}
+
+std::vector<int32_t> UploadQueue::openIds()
+{
+    return ids("SELECT id FROM requests WHERE state < 2 OR delivered = 0 ORDER BY id");
+}
+
+void UploadQueue::setShare(int32_t id, const std::string &share)
+{
+    execute(*db_, "UPDATE requests SET share = ? WHERE id = ?", share, id);
+}
+
+void UploadQueue::setFinished(int32_t id, const FinishedShare &finished)
+{
+    SQLite::Transaction transaction(*db_, SQLite::TransactionBehavior::IMMEDIATE);
+    const auto sms = finished.sms.empty() ? SmsState::none : SmsState::wanted;
+    execute(*db_, "UPDATE requests SET state = 1, url = ?, expires = ?, sms_state = ? WHERE id = ?",
+            finished.sms.empty() ? std::string() : finished.url, finished.expires,
+            static_cast<int>(sms), id);
+    int position = 0;
+    for (const std::string &number : finished.sms) {
+        execute(*db_, "INSERT INTO sms_numbers VALUES (?, ?, ?)", id, position++, number);
+    }
+    transaction.commit();
+}
+
+void UploadQueue::setSms(int32_t id, SmsState state, int attempts)
+{
+    execute(*db_, "UPDATE requests SET sms_state = ?, sms_attempts = ? WHERE id = ?",
+            static_cast<int>(state), attempts, id);
+}
+
+void UploadQueue::setEnded(int32_t id, int status, int error, bool withdraw, int64_t at)
+{
+    // The link opens the share for anyone: it is not kept longer than it is needed.
+    execute(*db_,
+            "UPDATE requests SET state = 2, url = '', end_status = ?, error = ?, withdraw = ?,"
+            " ended_at = ? WHERE id = ? AND state < 2",
+            status, error, withdraw ? 1 : 0, at, id);
+}
+
+void UploadQueue::setDelivered(int32_t id)
+{
+    execute(*db_, "UPDATE requests SET delivered = 1 WHERE id = ?", id);
+}
+
+std::vector<int32_t> UploadQueue::withdrawals()
+{
+    return ids("SELECT id FROM requests WHERE withdraw = 1 ORDER BY id");
+}
+
+void UploadQueue::withdrawalDone(int32_t id)
+{
+    execute(*db_, "UPDATE requests SET withdraw = 0 WHERE id = ?", id);
+}
+
+void UploadQueue::forgetBefore(int64_t epochSeconds)
+{
+    execute(*db_,
+            "DELETE FROM requests WHERE state = 2 AND delivered = 1 AND withdraw = 0"
+            " AND ended_at < ?",
+            epochSeconds);
+}
+
+} // namespace pelliko::service
