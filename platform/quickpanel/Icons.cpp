@@ -1,0 +1,57 @@
+#include "Icons.h"
+
+#include <array>
+#include <filesystem>
+
+namespace pelliko::quickpanel
+{
+namespace
+{
+
+struct Rule {
+    const char *word;
+    const char *icon;
+};
+
+// The first word that occurs in the picture's name decides.
+constexpr std::array<Rule, 5> pictures{{
+    {"fail", "dialog-error"},
+    {"error", "dialog-error"},
+    {"upload", "document-send"},
+    {"download", "document-save"},
+    {"receiv", "document-save"},
+}};
+
+template <typename Rules> std::string lookUp(const Rules &rules, const std::string &name)
+{
+    for (const Rule &rule : rules)
+        if (name.find(rule.word) != std::string::npos)
+            return rule.icon;
+    return "dialog-information";
+}
+
+bool startsWith(const std::string &text, const char *start)
+{
+    return text.rfind(start, 0) == 0;
+}
+
+bool exists(const std::string &path)
+{
+    std::error_code ignored;
+    return std::filesystem::exists(path, ignored);
+}
+
+} // namespace
+
+std::string drawableIcon(const std::string &image)
+{
+    // What the panel animates is work in progress.
+    if (startsWith(image, "reserved:"))
+        return image.find("/ani/") != std::string::npos ? "emblem-synchronizing"
+                                                        : lookUp(pictures, image);
+    if (image.empty() || image.find('/') == std::string::npos || exists(image))
+        return image;
+    return lookUp(pictures, std::filesystem::path(image).filename());
+}
+
+} // namespace pelliko::quickpanel
