@@ -1,0 +1,102 @@
+#include "PellikoApp/Language.h"
+
+#include "AppLog/AppLog.h"
+#include "PellikoApp/AppData.h"
+#include "PellikoUploadDataManager/PopupLanguage.h"
+
+#include <Elementary.h>
+#include <app_common.h>
+#include <clocale>
+#include <cstdlib>
+#include <cstring>
+#include <libintl.h>
+#include <memory>
+#include <string>
+#include <vconf-keys.h>
+#include <vconf.h>
+
+namespace pelliko
+{
+
+namespace
+{
+
+constexpr const char *domain = "pelliko";
+// The environment's spelling and the one that is asked for as a locale differ.
+constexpr const char *defaultEnvironment = "en_GB.utf8";
+constexpr const char *defaultLanguage = "en_GB.UTF-8";
+
+using CText = std::unique_ptr<char, decltype(&free)>;
+
+void _setEnvironment(const char *language)
+{
+    setenv("LANG", language, 1);
+    setenv("LC_MESSAGES", language, 1);
+}
+
+std::string _deviceLanguage()
+{
+    const CText language(vconf_get_str(VCONFKEY_LANGSET), free);
+    _setEnvironment(language ? language.get() : defaultEnvironment);
+    return language ? language.get() : defaultLanguage;
+}
+
+int _bindCatalogue(const char *name, const char *dir)
+{
+    if (!bindtextdomain(name, dir))
+        return -1;
+    LOG_DEBUG("_initI18n bindtextdomain domain = %s", name);
+    // The toolkit takes UTF-8 only, whatever the locale's own encoding is.
+    bind_textdomain_codeset(name, "UTF-8");
+    if (!textdomain(name))
+        return -1;
+    LOG_DEBUG("_initI18n textdomain domain = %s", name);
+    return 0;
+}
+
+bool _isUntranslated(const char *locale)
+{
+    return !locale || strcmp(locale, "C") == 0 || strcmp(locale, "POSIX") == 0;
+}
+
+// Message ids must never reach the user. The C locale translates nothing, so where the language's
+// locale is not installed C.UTF-8 stands in, with LANGUAGE choosing the catalogue.
+void _translateWithoutLocale(const char *dir, const std::string &language)
+{
+    if (!_isUntranslated(setlocale(LC_MESSAGES, nullptr)))
+        return;
+    LOG_DEBUG("locale %s is not installed, its texts are used without it", language.c_str());
+    setenv("LANGUAGE", language.c_str(), 1);
+    setlocale(LC_ALL, "C.UTF-8");
+    _bindCatalogue(domain, dir);
+}
+
+} // namespace
+
+void _langChanged(app_event_info_h, void *data)
+{
+    auto *ad = static_cast<PellikoAppData *>(data);
+    unsetenv("LANGUAGE"); // it would win over the device's language
+    const std::string language = _deviceLanguage();
+    LOG_DEBUG("Current Lang : %s", language.c_str());
+    const CText resources(app_get_resource_path(), free);
+    const std::string dir = std::string(resources ? resources.get() : "") + "locale";
+    _initI18n(domain, dir.c_str(), language.c_str());
+    _translateWithoutLocale(dir.c_str(), language);
+    elm_language_set(language.c_str());
+    if (ad && ad->popup)
+        updatePopupLanguage(ad);
+}
+
+int _initI18n(const char *name, const char *dir, const char *locale)
+{
+    if (!setlocale(LC_ALL, "")) {
+        LOG_DEBUG("_initI18n setlocale failed for the environment");
+        if (!setlocale(LC_ALL, locale))
+            return -1;
+    }
+    LOG_DEBUG("_initI18n setlocale = %s", setlocale(LC_ALL, nullptr));
+    return _bindCatalogue(name, dir);
+}
+
+} // namespace pelliko

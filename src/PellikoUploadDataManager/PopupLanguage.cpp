@@ -1,0 +1,33 @@
+#include "PellikoUploadDataManager/PopupLanguage.h"
+
+#include "PellikoApp/AppData.h"
+#include "PellikoApp/TextFormat.h"
+#include "PellikoUploadDataManager/ConfirmationContents.h"
+
+#include <Elementary.h>
+
+namespace pelliko
+{
+
+namespace
+{
+
+void _setButton(Evas_Object *popup, const char *part, const char *id)
+{
+    Evas_Object *button = elm_object_part_content_get(popup, part);
+    if (button)
+        elm_object_text_set(button, translated(id));
+}
+
+} // namespace
+
+void updatePopupLanguage(PellikoAppData *ad)
+{
+    if (!ad || !ad->popup || !ad->popup_layout)
+        return;
+    setConfirmationTexts(ad, ad->popup_layout);
+    _setButton(ad->popup, "button1", "IDS_RSH_BUTTON_CANCEL_ABB2");
+    _setButton(ad->popup, "button2", "IDS_RSH_BUTTON_SHARE_ABB5");
+}
+
+} // namespace pelliko

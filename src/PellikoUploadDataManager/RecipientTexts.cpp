@@ -1,0 +1,58 @@
+#include "PellikoUploadDataManager/RecipientTexts.h"
+
+#include "AppLog/AppLog.h"
+#include "PellikoApp/AppData.h"
+#include "PellikoApp/TextFormat.h"
+#include "PellikoUploadDataManager/UploadNotiData.h"
+
+#include <string>
+
+namespace pelliko
+{
+
+namespace
+{
+
+constexpr const char *separator = "?";
+constexpr const char *smsMark = "+SMS";
+
+char recipientList[recipientListSize];
+char recipientIndexList[recipientIndexSize];
+
+} // namespace
+
+const char *getRecipientListText()
+{
+    return recipientList;
+}
+
+const char *getRecipientIndexListText()
+{
+    return recipientIndexList;
+}
+
+void setRecipientTexts(const char *recipient_list, const char *recipient_index_list)
+{
+    copyText(recipientList, sizeof(recipientList), recipient_list);
+    copyText(recipientIndexList, sizeof(recipientIndexList), recipient_index_list);
+}
+
+void _populateExtraData(PellikoAppData *ad)
+{
+    setRecipientTexts(nullptr, nullptr);
+    RETURN_IF_NULL(ad, "ad is NULL");
+    std::string names, indexes;
+    const Eina_List *node = nullptr;
+    void *item = nullptr;
+    EINA_LIST_FOREACH(ad->upload_item ? ad->upload_item->recipient_list : nullptr, node, item)
+    {
+        const auto *recipient = static_cast<const UploadRecipient *>(item);
+        names += recipient->name ? recipient->name : "";
+        names += recipient->is_sms == 1 ? smsMark : "";
+        names += separator;
+        indexes += std::to_string(recipient->number_id) + separator;
+    }
+    setRecipientTexts(names.c_str(), indexes.c_str());
+}
+
+} // namespace pelliko

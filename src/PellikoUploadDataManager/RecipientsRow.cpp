@@ -1,0 +1,148 @@
+#include "PellikoUploadDataManager/RecipientsRow.h"
+
+#include "AppLog/AppLog.h"
+#include "PellikoApp/AppData.h"
+#include "PellikoApp/ThemeLayout.h"
+
+#include <Elementary.h>
+#include <efl_assist.h>
+#include <string>
+#include <uxt_theme.h>
+
+namespace pelliko
+{
+
+namespace
+{
+
+#define IMAGE_DIRECTORY "/opt/usr/apps/com.velmora.pelliko/res/images/sender-images/WVGA/"
+constexpr const char *maskImage = IMAGE_DIRECTORY "pk_caller_id_default_masking.png";
+constexpr const char *defaultImage = IMAGE_DIRECTORY "pk_caller_id_default.png";
+constexpr const char *smsBadge = IMAGE_DIRECTORY "pk_badge_ic_sms.png";
+#undef IMAGE_DIRECTORY
+
+constexpr const char *rowPart = "elm.swallow.scroller";
+constexpr int badgeSize = 30; ///< pixels at the application's base scale
+
+void _tint(Evas_Object *image, const char *color_class)
+{
+    int r = 255, g = 255, b = 255, a = 255;
+    uxt_theme_get_color(color_class, &r, &g, &b, &a);
+    evas_color_argb_premul(a, &r, &g, &b);
+    evas_object_color_set(image, r, g, b, a);
+}
+
+Evas_Object *_addImage(Evas_Object *parent, const char *file)
+{
+    Evas_Object *image = elm_image_add(parent);
+    if (!elm_image_file_set(image, file, nullptr)) {
+        evas_object_del(image);
+        return nullptr;
+    }
+    return image;
+}
+
+// The person's picture, or null when there is none that can be read.
+Evas_Object *_addPersonImage(Evas_Object *item, const char *path)
+{
+    if (!path || !*path)
+        return nullptr;
+    LOG_DEBUG("Setting recipient image = %s", path);
+    Evas_Object *image = _addImage(item, path);
+    if (image && !ea_image_mask_set(image, maskImage))
+        LOG_ERROR("the picture could not be rounded");
+    return image;
+}
+
+Evas_Object *_addDefaultImage(Evas_Object *item)
+{
+    LOG_DEBUG("Setting default contact image = %s", defaultImage);
+    Evas_Object *image = _addImage(item, defaultImage);
+    if (image)
+        _tint(image, "AO003L1");
+    return image;
+}
+
+void _setPicture(Evas_Object *item, const UploadRecipient &recipient)
+{
+    Evas_Object *image = _addPersonImage(item, recipient.image_path);
+    if (!image)
+        image = _addDefaultImage(item);
+    if (image)
+        elm_object_part_content_set(item, "elm.swallow.icon", image);
+}
+
+void _setBadge(Evas_Object *item)
+{
+    LOG_DEBUG("Setting SMS badge.");
+    Evas_Object *badge = elm_icon_add(item);
+    if (!elm_image_file_set(badge, smsBadge, nullptr)) {
+        evas_object_del(badge);
+        return;
+    }
+    _tint(badge, "AO004");
+    const double scale = elm_config_scale_get() / elm_app_base_scale_get();
+    const int size = static_cast<int>(badgeSize * scale + 0.5);
+    evas_object_size_hint_min_set(badge, size, size);
+    evas_object_size_hint_max_set(badge, size, size);
+    elm_object_part_content_set(item, "sms.badge", badge);
+    elm_object_signal_emit(item, "pelliko,badge,shown", "pelliko");
+}
+
+Evas_Object *_addRecipient(Evas_Object *box, PellikoAppData *ad, const UploadRecipient &recipient)
+{
+    LOG_DEBUG("Adding recipient- name = %s", textOrNull(recipient.name));
+    Evas_Object *item = addThemeLayout(box, ad->theme, "1icon.1text.remoteshare");
+    elm_object_part_text_set(item, "elm.text", recipient.name ? recipient.name : "");
+    _setPicture(item, recipient);
+    if (recipient.is_sms == 1)
+        _setBadge(item);
+    elm_object_signal_emit(item, "elm,state,disabled", "elm");
+    evas_object_show(item);
+    return item;
+}
+
+// Sideways only; the bar tells on a desktop that there is more.
+Evas_Object *_addScroller(Evas_Object *parent)
+{
+    Evas_Object *scroller = elm_scroller_add(parent);
+    elm_object_style_set(scroller, "no_inset_shadow");
+    elm_scroller_policy_set(scroller, ELM_SCROLLER_POLICY_AUTO, ELM_SCROLLER_POLICY_OFF);
+    elm_scroller_bounce_set(scroller, EINA_FALSE, EINA_FALSE);
+    elm_scroller_content_min_limit(scroller, EINA_FALSE, EINA_TRUE);
+    elm_object_focus_allow_set(scroller, EINA_FALSE);
+    return scroller;
+}
+
+Evas_Object *_addBox(Evas_Object *scroller)
+{
+    Evas_Object *box = elm_box_add(scroller);
+    elm_box_horizontal_set(box, EINA_TRUE);
+    elm_box_homogeneous_set(box, EINA_FALSE);
+    evas_object_size_hint_weight_set(box, EVAS_HINT_EXPAND, EVAS_HINT_EXPAND);
+    evas_object_size_hint_align_set(box, EVAS_HINT_FILL, EVAS_HINT_FILL);
+    elm_object_content_set(scroller, box);
+    return box;
+}
+
+} // namespace
+
+void addRecipientsFromUploadData(PellikoAppData *ad)
+{
+    if (!ad || !ad->popup_layout || !ad->upload_item)
+        return;
+    Evas_Object *layout = addThemeLayout(ad->popup_layout, ad->theme, "scroller.swallow");
+    Evas_Object *scroller = _addScroller(layout);
+    Evas_Object *box = _addBox(scroller);
+    const Eina_List *node = nullptr;
+    void *recipient = nullptr;
+    EINA_LIST_FOREACH(ad->upload_item->recipient_list, node, recipient)
+    {
+        elm_box_pack_end(box, _addRecipient(box, ad, *static_cast<UploadRecipient *>(recipient)));
+    }
+    elm_object_part_content_set(layout, "elm.swallow.content", scroller);
+    // A content that takes an occupied place deletes the one before it.
+    elm_object_part_content_set(ad->popup_layout, rowPart, layout);
+}
+
+} // namespace pelliko
