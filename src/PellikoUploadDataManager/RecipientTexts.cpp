@@ -41,12 +41,10 @@ void _populateExtraData(PellikoAppData *ad)
 {
     setRecipientTexts(nullptr, nullptr);
     RETURN_IF_NULL(ad, "ad is NULL");
+    const Eina_List *recipients = ad->upload_item ? ad->upload_item->recipient_list : nullptr;
     std::string names, indexes;
-    const Eina_List *node = nullptr;
-    void *item = nullptr;
-    EINA_LIST_FOREACH(ad->upload_item ? ad->upload_item->recipient_list : nullptr, node, item)
-    {
-        const auto *recipient = static_cast<const UploadRecipient *>(item);
+    for (const Eina_List *node = recipients; node; node = eina_list_next(node)) {
+        const auto *recipient = static_cast<const UploadRecipient *>(eina_list_data_get(node));
         names += recipient->name ? recipient->name : "";
         names += recipient->is_sms == 1 ? smsMark : "";
         names += separator;

@@ -134,11 +134,10 @@ void addRecipientsFromUploadData(PellikoAppData *ad)
     Evas_Object *layout = addThemeLayout(ad->popup_layout, ad->theme, "scroller.swallow");
     Evas_Object *scroller = _addScroller(layout);
     Evas_Object *box = _addBox(scroller);
-    const Eina_List *node = nullptr;
-    void *recipient = nullptr;
-    EINA_LIST_FOREACH(ad->upload_item->recipient_list, node, recipient)
-    {
-        elm_box_pack_end(box, _addRecipient(box, ad, *static_cast<UploadRecipient *>(recipient)));
+    for (const Eina_List *node = ad->upload_item->recipient_list; node;
+         node = eina_list_next(node)) {
+        const auto *recipient = static_cast<const UploadRecipient *>(eina_list_data_get(node));
+        elm_box_pack_end(box, _addRecipient(box, ad, *recipient));
     }
     elm_object_part_content_set(layout, "elm.swallow.content", scroller);
     // A content that takes an occupied place deletes the one before it.
