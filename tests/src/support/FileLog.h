@@ -1,6 +1,8 @@
 #pragma once
 
+#include <algorithm>
 #include <fstream>
+#include <regex>
 #include <string>
 #include <vector>
 
@@ -44,6 +46,23 @@ public:
             line = end == std::string::npos ? line : line.substr(end + 4);
         }
         return all;
+    }
+
+    /// Every message on a line of its own, addresses written as "%p".
+    std::string text() const
+    {
+        static const std::regex address("0x[0-9a-f]+|\\(nil\\)");
+        std::string all;
+        for (const std::string &message : messages())
+            all += message + "\n";
+        return std::regex_replace(all, address, "%p");
+    }
+
+    /// Whether one message equals `message`.
+    bool has(const std::string &message) const
+    {
+        const std::vector<std::string> all = messages();
+        return std::find(all.begin(), all.end(), message) != all.end();
     }
 
 private:
