@@ -75,8 +75,8 @@ std::vector<ListedNumber> listNumbers(SQLite::Database &database)
     SQLite::Statement select(
         database, "SELECT n.id, coalesce(c.display_name, ''), n.number, "
                   "coalesce((SELECT instr(s.sync2, 'R') > 0 FROM contacts s "
-                  "WHERE lower(s.number_id) = CAST(n.id AS TEXT) AND s.address_book_id = ? "
-                  "AND s.sync2 IS NOT NULL ORDER BY s.id LIMIT 1), 0) "
+                  "WHERE lower(s.number_id) = lower(n.id) AND s.address_book_id = ? "
+                  "AND s.sync2 IS NOT NULL ORDER BY +s.id LIMIT 1), 0) "
                   "FROM numbers n JOIN contacts c ON c.id = n.contact_id ORDER BY n.id");
     select.bind(1, service_book);
     std::vector<ListedNumber> numbers;
