@@ -71,13 +71,7 @@ std::vector<SavedContact> saveAll(SQLite::Database &database, std::span<const Co
 
 std::vector<ListedNumber> listNumbers(SQLite::Database &database)
 {
-    // As an application tests it: the first row of the service's book with letters decides.
-    SQLite::Statement select(
-        database, "SELECT n.id, coalesce(c.display_name, ''), n.number, "
-                  "coalesce((SELECT instr(s.sync2, 'R') > 0 FROM contacts s "
-                  "WHERE lower(s.number_id) = lower(n.id) AND s.address_book_id = ? "
-                  "AND s.sync2 IS NOT NULL ORDER BY +s.id LIMIT 1), 0) "
-                  "FROM numbers n JOIN contacts c ON c.id = n.contact_id ORDER BY n.id");
+    SQLite::Statement select(database, select_listed_numbers);
     select.bind(1, service_book);
     std::vector<ListedNumber> numbers;
     while (select.executeStep())

@@ -1,6 +1,7 @@
 // Look-ups must not slow down as the store grows: none of them may walk through a whole table.
 #include <SQLiteCpp/SQLiteCpp.h>
 
+#include "ContactRows.h"
 #include "ContactsFixture.h"
 #include "Database.h"
 #include "FilterSql.h"
@@ -84,6 +85,13 @@ TEST_F(ContactsQueryPlan, WholeNumbersAreFoundByEveryFormOfThem)
             EXPECT_FALSE(walksATable(plan)) << plan;
         }
     }
+}
+
+TEST_F(ContactsQueryPlan, ListingWalksThroughTheNumbersOnce)
+{
+    const std::string plan = planOf(select_listed_numbers);
+    EXPECT_NE(plan.find("SCAN n\n"), std::string::npos) << plan;
+    EXPECT_EQ(plan.find("SCAN", plan.find("SCAN") + 1), std::string::npos) << plan;
 }
 
 TEST_F(ContactsQueryPlan, AWalkThroughATableIsSeen)
