@@ -98,15 +98,18 @@ Evas_Object *_addRecipient(Evas_Object *box, PellikoAppData *ad, const UploadRec
     if (recipient.is_sms == 1)
         _setBadge(item);
     elm_object_signal_emit(item, "elm,state,disabled", "elm");
+    if (eina_list_count(ad->upload_item->recipient_list) > 1) // one name may use the whole width
+        evas_object_size_hint_weight_set(item, 0.0, EVAS_HINT_EXPAND);
     evas_object_show(item);
     return item;
 }
 
 // Sideways only; the bar tells on a desktop that there is more.
-Evas_Object *_addScroller(Evas_Object *parent)
+Evas_Object *_addScroller(Evas_Object *parent, Elm_Theme *theme)
 {
     Evas_Object *scroller = elm_scroller_add(parent);
-    elm_object_style_set(scroller, "no_inset_shadow");
+    elm_object_theme_set(scroller, theme);
+    elm_object_style_set(scroller, "pelliko");
     elm_scroller_policy_set(scroller, ELM_SCROLLER_POLICY_AUTO, ELM_SCROLLER_POLICY_OFF);
     elm_scroller_bounce_set(scroller, EINA_FALSE, EINA_FALSE);
     elm_scroller_content_min_limit(scroller, EINA_FALSE, EINA_TRUE);
@@ -121,6 +124,7 @@ Evas_Object *_addBox(Evas_Object *scroller)
     elm_box_homogeneous_set(box, EINA_FALSE);
     evas_object_size_hint_weight_set(box, EVAS_HINT_EXPAND, EVAS_HINT_EXPAND);
     evas_object_size_hint_align_set(box, EVAS_HINT_FILL, EVAS_HINT_FILL);
+    elm_box_align_set(box, 0.5, 0.0);
     elm_object_content_set(scroller, box);
     return box;
 }
@@ -132,7 +136,7 @@ void addRecipientsFromUploadData(PellikoAppData *ad)
     if (!ad || !ad->popup_layout || !ad->upload_item)
         return;
     Evas_Object *layout = addThemeLayout(ad->popup_layout, ad->theme, "scroller.swallow");
-    Evas_Object *scroller = _addScroller(layout);
+    Evas_Object *scroller = _addScroller(layout, ad->theme);
     Evas_Object *box = _addBox(scroller);
     for (const Eina_List *node = ad->upload_item->recipient_list; node;
          node = eina_list_next(node)) {
