@@ -1,0 +1,98 @@
+"""The build tree mirrors the application's directory, readable for everybody, and texts can be read on it."""
+
+import re
+import stat
+import subprocess
+import sys
+import tempfile
+import unittest
+import xml.etree.ElementTree as xml
+from pathlib import Path
+
+SOURCE, BUILD = Path(sys.argv.pop(1)), Path(sys.argv.pop(1))
+APP = BUILD / "app"
+FILES = [
+    "res/edje/pelliko.edj",
+    "res/images/sender-images/WVGA/pk_badge_ic_sms.png",
+    "res/images/sender-images/WVGA/pk_caller_id_default.png",
+    "res/images/sender-images/WVGA/pk_caller_id_default_masking.png",
+    "res/locale/C/LC_MESSAGES/pelliko.mo",
+    "res/locale/de/LC_MESSAGES/pelliko.mo",
+    "res/locale/en/LC_MESSAGES/pelliko.mo",
+    "shared/res/com.velmora.pelliko.png",
+    "shared/res/tables/com.velmora.pelliko_ChangeableColorTable.xml",
+    "shared/res/tables/com.velmora.pelliko_FontInfoTable.xml",
+]
+# Letters and what they stand on.
+PAIRS = [
+    ("pelliko/text", "pelliko/card"),
+    ("pelliko/text/second", "pelliko/card"),
+    ("pelliko/text", "pelliko/row"),
+    ("pelliko/text", "pelliko/row/pressed"),
+    ("pelliko/primary/text", "pelliko/primary"),
+    ("pelliko/primary/text", "pelliko/primary/pressed"),
+    ("pelliko/button/text", "pelliko/button"),
+    ("pelliko/button/text", "pelliko/button/pressed"),
+    ("/fg/normal/popup/text", "pelliko/card"),
+    ("AO004", "pelliko/card"),
+]
+
+
+def table(name):
+    return xml.parse(SOURCE / f"res/tables/com.velmora.pelliko_{name}.xml").getroot()
+
+
+def colors():
+    return {color.get("class"): color.get("value") for color in table("ChangeableColorTable").iter("color")}
+
+
+def luminance(color):
+    channels = [int(color[i : i + 2], 16) / 255 for i in (1, 3, 5)]
+    linear = [c / 12.92 if c <= 0.04045 else ((c + 0.055) / 1.055) ** 2.4 for c in channels]
+    return 0.2126 * linear[0] + 0.7152 * linear[1] + 0.0722 * linear[2]
+
+
+def contrast(one, other):
+    light, dark = sorted((luminance(one), luminance(other)), reverse=True)
+    return (light + 0.05) / (dark + 0.05)
+
+
+class Resources(unittest.TestCase):
+    def test_the_mirror_holds_exactly_these_files(self):
+        found = sorted(str(path.relative_to(APP)) for path in APP.rglob("*") if path.is_file())
+        self.assertEqual(found, FILES)
+
+    def test_everybody_may_read_them(self):
+        for name in FILES:
+            self.assertEqual(stat.S_IMODE((APP / name).stat().st_mode) & 0o444, 0o444, name)
+        self.assertEqual(stat.S_IMODE((APP / FILES[0]).stat().st_mode), 0o644)
+
+    def test_letters_can_be_told_from_their_ground(self):
+        classes = colors()
+        for letters, ground in PAIRS:
+            self.assertGreaterEqual(contrast(classes[letters], classes[ground]), 4.5, f"{letters} on {ground}")
+
+    def test_every_class_of_the_layouts_is_in_the_tables(self):
+        layouts = "".join(path.read_text() for path in (SOURCE / "res/edje").glob("*.edc"))
+        fonts = {font.get("class") for font in table("FontInfoTable").iter("font")}
+        self.assertEqual(set(re.findall(r'"(pelliko/[a-z/]+)"', layouts)) - set(colors()), set())
+        self.assertEqual(set(re.findall(r"text_class[=: ]+\"?(pelliko_[a-z]+)", layouts)) - fonts, set())
+
+    def test_locales_are_made_once_and_kept(self):
+        with tempfile.TemporaryDirectory() as folder:
+            make = [SOURCE / "scripts/make-locales", folder]
+            subprocess.run(make, check=True)
+            made = {path: path.stat().st_mtime_ns for path in Path(folder).glob("*/LC_CTYPE")}
+            self.assertEqual(
+                sorted(path.parent.name for path in made), ["de_DE.utf8", "en_GB.utf8", "en_US.utf8"]
+            )
+            subprocess.run(make, check=True)
+            self.assertEqual({path: path.stat().st_mtime_ns for path in made}, made)
+
+    def test_locales_need_a_folder(self):
+        refused = subprocess.run([SOURCE / "scripts/make-locales"], capture_output=True, text=True)
+        self.assertEqual(refused.returncode, 2)
+        self.assertIn("make-locales DIR", refused.stdout)
+
+
+unittest.main()
