@@ -1,0 +1,205 @@
+#include "Server.h"
+
+#include "Sweeper.h"
+#include "http/Connection.h"
+#include "http/Router.h"
+
+#include <boost/asio/as_tuple.hpp>
+#include <boost/asio/co_spawn.hpp>
+#include <boost/asio/detached.hpp>
+#include <boost/asio/io_context.hpp>
+#include <boost/asio/ip/tcp.hpp>
+#include <boost/asio/post.hpp>
+#include <boost/asio/signal_set.hpp>
+#include <boost/asio/steady_timer.hpp>
+#include <boost/asio/use_awaitable.hpp>
+
+#include <chrono>
+#include <csignal>
+#include <cstdio>
+#include <set>
+#include <stdexcept>
+#include <utility>
+
+namespace pelliko::server
+{
+namespace
+{
+
+namespace asio = boost::asio;
+using asio::ip::tcp;
+constexpr auto asTuple = asio::as_tuple(asio::use_awaitable);
+
+/// Threads that wait for the disk; more than cores, since they wait.
+constexpr std::size_t poolThreads = 8;
+/// Beyond this, callers wait in the system's queue until somebody leaves.
+constexpr std::size_t connectionLimit = 2000;
+/// How long a stop waits for requests in hand.
+constexpr std::chrono::seconds stopPatience{10};
+/// When the system refuses a connection for want of descriptors or memory.
+constexpr std::chrono::seconds acceptPause{1};
+
+} // namespace
+
+struct Server::State {
+    State(const Config &config, Metadata &metadata, Blobs &blobs, std::function<Seconds()> now)
+        : timeouts(config.timeouts), pool(poolThreads), context{metadata,
+                                                                blobs,
+                                                                pool,
+                                                                writes,
+                                                                config.limits,
+                                                                std::move(now),
+                                                                config.publicUrl,
+                                                                [this] { sweeper.wake(); }},
+          sweeper(io.get_executor(), context), acceptor(io), signals(io, SIGTERM, SIGINT),
+          stopTimer(io), room(io, asio::steady_timer::time_point::max())
+    {
+    }
+
+    void listen(const ListenAddress &address);
+    Task<void> acceptAll();
+    Task<void> serve(std::shared_ptr<Connection> connection);
+    Task<void> waitForSignals();
+    Task<void> cutAfterPatience();
+    void stop();
+
+    Timeouts timeouts;
+    asio::io_context io{1};
+    StoragePool pool;
+    ActiveWrites writes;
+    Context context;
+    Sweeper sweeper;
+    tcp::acceptor acceptor;
+    asio::signal_set signals;
+    asio::steady_timer stopTimer;
+    /// Cancelled when a connection leaves, for an acceptor that waits for room.
+    asio::steady_timer room;
+    std::set<std::shared_ptr<Connection>> connections;
+    std::string url;
+    bool stopping = false;
+};
+
+void Server::State::listen(const ListenAddress &address)
+{
+    boost::system::error_code error;
+    const auto ip = asio::ip::make_address(address.host, error);
+    if (error)
+        throw std::runtime_error("\"" + address.host + "\" is not an IP address");
+    const tcp::endpoint endpoint(ip, address.port);
+    acceptor.open(endpoint.protocol());
+    acceptor.set_option(tcp::acceptor::reuse_address(true));
+    acceptor.bind(endpoint, error);
+    if (error)
+        throw std::runtime_error("cannot listen on " + address.host + ":" +
+                                 std::to_string(address.port) + ": " + error.message());
+    acceptor.listen();
+    const std::string host = ip.is_v6() ? "[" + address.host + "]" : address.host;
+    url = "http://" + host + ":" + std::to_string(acceptor.local_endpoint().port());
+    if (context.publicUrl.empty())
+        context.publicUrl = url;
+}
+
+Task<void> Server::State::serve(std::shared_ptr<Connection> connection)
+{
+    connections.insert(connection);
+    co_await connection->run();
+    connections.erase(connection);
+    room.cancel();
+    if (stopping && connections.empty())
+        stopTimer.cancel();
+}
+
+Task<void> Server::State::acceptAll()
+{
+    while (!stopping) {
+        if (connections.size() >= connectionLimit) {
+            co_await room.async_wait(asTuple);
+            continue;
+        }
+        auto [error, socket] = co_await acceptor.async_accept(asTuple);
+        if (stopping)
+            co_return;
+        if (error) {
+            std::fprintf(stderr, "pelliko-server: accept: %s\n", error.message().c_str());
+            stopTimer.expires_after(acceptPause);
+            co_await stopTimer.async_wait(asTuple);
+            continue;
+        }
+        auto connection = Connection::make(
+            std::move(socket), timeouts, pool,
+            [this](Exchange &exchange) { return handleRequest(exchange, context); }, refuseHead);
+        asio::co_spawn(io, serve(std::move(connection)), asio::detached);
+    }
+}
+
+Task<void> Server::State::waitForSignals()
+{
+    auto [error, number] = co_await signals.async_wait(asTuple);
+    if (error)
+        co_return;
+    stop();
+    auto [again, second] = co_await signals.async_wait(asTuple);
+    if (!again)
+        stopTimer.cancel();
+}
+
+/// Uploads are ended at once, since what arrived is kept; downloads get some time.
+void Server::State::stop()
+{
+    if (std::exchange(stopping, true))
+        return;
+    boost::system::error_code ignored;
+    acceptor.close(ignored);
+    room.cancel();
+    sweeper.stop();
+    writes.stopAll();
+    for (const auto &connection : std::set(connections))
+        connection->finish();
+    asio::co_spawn(io, cutAfterPatience(), asio::detached);
+}
+
+Task<void> Server::State::cutAfterPatience()
+{
+    stopTimer.expires_after(stopPatience);
+    if (!connections.empty())
+        co_await stopTimer.async_wait(asTuple);
+    for (const auto &connection : std::set(connections))
+        connection->cut();
+    signals.cancel();
+}
+
+Server::Server(const Config &config, Metadata &metadata, Blobs &blobs, std::function<Seconds()> now)
+    : m_state(std::make_unique<State>(config, metadata, blobs, std::move(now)))
+{
+    m_state->listen(parseListenAddress(config.listen));
+}
+
+Server::~Server()
+{
+    m_state->pool.join();
+}
+
+std::string Server::url() const
+{
+    return m_state->url;
+}
+
+void Server::run()
+{
+    asio::co_spawn(m_state->io, m_state->acceptAll(), asio::detached);
+    asio::co_spawn(m_state->io, m_state->waitForSignals(), asio::detached);
+    asio::co_spawn(m_state->io, m_state->sweeper.run(), asio::detached);
+    m_state->io.run();
+}
+
+void Server::stop()
+{
+    asio::post(m_state->io, [this] { m_state->stop(); });
+}
+
+void Server::sweep()
+{
+    asio::post(m_state->io, [this] { m_state->sweeper.wake(); });
+}
+
+} // namespace pelliko::server

@@ -1,0 +1,35 @@
+#pragma once
+
+#include "http/Context.h"
+
+#include <boost/asio/system_timer.hpp>
+
+namespace pelliko::server
+{
+
+/// Deletes what has expired, at the second when it does: sleeps until the next deadline that the
+/// store knows, or until it is woken. Network thread only.
+class Sweeper
+{
+public:
+    Sweeper(const boost::asio::any_io_executor &executor, Context &context);
+
+    /// Sweeps until stopped.
+    Task<void> run();
+
+    /// Something may have become unneeded, or a deadline was set: look again.
+    void wake();
+    void stop();
+
+private:
+    Task<void> sweep();
+    Task<void> removeDoomed();
+    Task<void> sleep();
+
+    Context &m_context;
+    boost::asio::system_timer m_timer;
+    bool m_woken = false;
+    bool m_stopped = false;
+};
+
+} // namespace pelliko::server

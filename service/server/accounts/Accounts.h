@@ -1,0 +1,22 @@
+#pragma once
+
+#include "http/Context.h"
+
+#include <optional>
+#include <string>
+
+namespace pelliko::server
+{
+
+/// The account whose token the request carries; anything else is refused.
+Task<Account> authenticate(Exchange &exchange, Context &context);
+
+/// `GET /api/v1/account`.
+Task<void> showAccount(Exchange &exchange, Context &context);
+
+/// Makes an account and returns its token, which is kept nowhere. Nothing when the number has an
+/// account already. Blocks.
+[[nodiscard]] std::optional<std::string> makeAccount(Metadata &metadata, const std::string &number,
+                                                     const std::string &name, Seconds now);
+
+} // namespace pelliko::server

@@ -1,0 +1,216 @@
+#include "http/BodyReader.h"
+
+#include <boost/asio/as_tuple.hpp>
+#include <boost/asio/buffer.hpp>
+#include <boost/asio/use_awaitable.hpp>
+#include <boost/beast/core/flat_buffer.hpp>
+#include <boost/beast/http/buffer_body.hpp>
+#include <boost/beast/http/empty_body.hpp>
+#include <boost/beast/http/parser.hpp>
+#include <boost/beast/http/read.hpp>
+
+#include <algorithm>
+#include <limits>
+#include <utility>
+
+namespace pelliko::server
+{
+namespace
+{
+
+namespace asio = boost::asio;
+namespace http = boost::beast::http;
+constexpr auto asTuple = asio::as_tuple(asio::use_awaitable);
+
+constexpr std::uint32_t headLimit = 16 * 1024;
+/// Room for a head and for the first bytes of a body that come with it.
+constexpr std::size_t bufferLimit = 64 * 1024;
+
+using HeadParser = http::request_parser<http::empty_body>;
+using ChunkParser = http::request_parser<http::buffer_body>;
+
+/// Removes "http://host" of the form that proxies send, and the query.
+std::string pathOf(std::string_view target)
+{
+    if (const auto scheme = target.find("://"); scheme != std::string_view::npos && scheme < 6) {
+        const auto path = target.find('/', scheme + 3);
+        target = path == std::string_view::npos ? "/" : target.substr(path);
+    }
+    return std::string(target.substr(0, target.find('?')));
+}
+
+Request requestOf(HeadParser &parser)
+{
+    Request request;
+    const auto &message = parser.get();
+    request.method = std::string(message.method_string());
+    request.path = pathOf({message.target().data(), message.target().size()});
+    for (const auto &field : message) {
+        request.headers.push_back({std::string(field.name_string()), std::string(field.value())});
+    }
+    if (!parser.chunked())
+        request.bodyLength = parser.content_length().value_or(0);
+    return request;
+}
+
+} // namespace
+
+struct BodyReader::State {
+    State(asio::ip::tcp::socket &s, Watchdog &w, std::chrono::seconds p)
+        : socket(s), watchdog(w), progressTimeout(p), buffer(bufferLimit)
+    {
+    }
+
+    asio::ip::tcp::socket &socket;
+    Watchdog &watchdog;
+    std::chrono::seconds progressTimeout;
+    boost::beast::flat_buffer buffer;
+    std::optional<HeadParser> head;
+    std::optional<ChunkParser> chunks;
+    Request request;
+    std::uint64_t remaining = 0;
+    bool keepAlive = false;
+    bool takesChunks = false;
+    bool awaitsContinue = false;
+    bool interrupted = false;
+};
+
+BodyReader::BodyReader(asio::ip::tcp::socket &socket, Watchdog &watchdog,
+                       std::chrono::seconds progressTimeout)
+    : m_state(std::make_unique<State>(socket, watchdog, progressTimeout))
+{
+}
+
+BodyReader::~BodyReader() = default;
+
+const Request &BodyReader::request() const
+{
+    return m_state->request;
+}
+bool BodyReader::keepAlive() const
+{
+    return m_state->keepAlive;
+}
+bool BodyReader::peerTakesChunks() const
+{
+    return m_state->takesChunks;
+}
+bool BodyReader::hasBufferedBytes() const
+{
+    return m_state->buffer.size() > 0;
+}
+
+void BodyReader::interrupt()
+{
+    m_state->interrupted = true;
+    boost::system::error_code ignored;
+    m_state->socket.cancel(ignored);
+}
+
+bool BodyReader::peerAwaitsContinue()
+{
+    return std::exchange(m_state->awaitsContinue, false);
+}
+
+std::uint64_t BodyReader::restOfBody() const
+{
+    const bool unknown = m_state->chunks && !m_state->chunks->is_done();
+    if (unknown || m_state->awaitsContinue || m_state->interrupted)
+        return std::numeric_limits<std::uint64_t>::max();
+    return m_state->remaining;
+}
+
+Task<HeadResult> BodyReader::readHead()
+{
+    State &state = *m_state;
+    state.chunks.reset();
+    state.head.emplace();
+    state.head->header_limit(headLimit);
+    state.head->body_limit(boost::none);
+    state.request = {};
+    state.keepAlive = state.interrupted = false;
+    state.remaining = 0;
+    auto [error, count] =
+        co_await http::async_read_header(state.socket, state.buffer, *state.head, asTuple);
+    if (error == http::error::header_limit || error == http::error::buffer_overflow)
+        co_return HeadResult::tooLarge;
+    if (error == http::error::end_of_stream || error == http::error::partial_message)
+        co_return HeadResult::closed;
+    if (error) {
+        const bool malformed = error.category() == http::make_error_code(http::error{}).category();
+        co_return malformed ? HeadResult::malformed : HeadResult::closed;
+    }
+    state.request = requestOf(*state.head);
+    state.takesChunks = state.head->get().version() >= 11;
+    if (state.takesChunks && state.request.header("Host") == nullptr)
+        co_return HeadResult::malformed;
+    state.keepAlive = state.head->keep_alive();
+    state.remaining = state.request.bodyLength.value_or(0);
+    const std::string *expect = state.request.header("Expect");
+    const bool hasBody = !state.request.bodyLength || state.remaining > 0;
+    state.awaitsContinue = expect != nullptr && state.takesChunks && hasBody &&
+                           equalsIgnoringCase(*expect, "100-continue");
+    if (!state.request.bodyLength)
+        state.chunks.emplace(std::move(*state.head));
+    co_return HeadResult::complete;
+}
+
+Task<std::size_t> BodyReader::readBody(std::span<char> into)
+{
+    if (m_state->interrupted)
+        throw Interrupted();
+    if (m_state->chunks)
+        co_return co_await readChunked(into);
+    co_return co_await readPlain(into);
+}
+
+Task<std::size_t> BodyReader::readPlain(std::span<char> into)
+{
+    State &state = *m_state;
+    const auto wanted =
+        static_cast<std::size_t>(std::min<std::uint64_t>(state.remaining, into.size()));
+    if (wanted == 0)
+        co_return 0;
+    if (state.buffer.size() > 0) {
+        const std::size_t count =
+            asio::buffer_copy(asio::buffer(into.data(), wanted), state.buffer.data());
+        state.buffer.consume(count);
+        state.remaining -= count;
+        co_return count;
+    }
+    state.watchdog.arm(state.progressTimeout);
+    auto [error, count] =
+        co_await state.socket.async_read_some(asio::buffer(into.data(), wanted), asTuple);
+    state.watchdog.disarm();
+    state.remaining -= count;
+    if (count > 0)
+        co_return count;
+    if (state.interrupted)
+        throw Interrupted();
+    throw Disconnected();
+}
+
+Task<std::size_t> BodyReader::readChunked(std::span<char> into)
+{
+    State &state = *m_state;
+    while (!state.chunks->is_done()) {
+        auto &body = state.chunks->get().body();
+        body.data = into.data();
+        body.size = into.size();
+        state.watchdog.arm(state.progressTimeout);
+        auto [error, count] =
+            co_await http::async_read_some(state.socket, state.buffer, *state.chunks, asTuple);
+        state.watchdog.disarm();
+        const std::size_t got = into.size() - body.size;
+        if (got > 0)
+            co_return got;
+        if (error && error != http::error::need_buffer) {
+            if (state.interrupted)
+                throw Interrupted();
+            throw Disconnected();
+        }
+    }
+    co_return 0;
+}
+
+} // namespace pelliko::server

@@ -1,0 +1,30 @@
+#pragma once
+
+#include "http/StoragePool.h"
+#include "shares/Limits.h"
+#include "store/Blobs.h"
+#include "store/Metadata.h"
+#include "tus/ActiveWrites.h"
+
+#include <functional>
+#include <string>
+
+namespace pelliko::server
+{
+
+/// What every endpoint works with. Lives as long as the server.
+struct Context {
+    Metadata &metadata;
+    Blobs &blobs;
+    StoragePool &pool;
+    ActiveWrites &writes;
+    Limits limits;
+    /// Seconds since the epoch.
+    std::function<Seconds()> now;
+    /// What links start with: scheme, host, no slash at the end.
+    std::string publicUrl;
+    /// Called when bytes became unneeded or a deadline was set.
+    std::function<void()> wakeSweeper;
+};
+
+} // namespace pelliko::server

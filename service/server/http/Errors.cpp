@@ -1,0 +1,60 @@
+#include "http/Errors.h"
+
+#include <nlohmann/json.hpp>
+
+#include <algorithm>
+#include <iterator>
+#include <utility>
+
+namespace pelliko::server
+{
+namespace
+{
+
+constexpr ErrorEntry table[] = {
+    {Error::badRequest, "bad_request", 400, "The request cannot be understood."},
+    {Error::unauthorized, "unauthorized", 401, "A valid account token is needed."},
+    {Error::notFound, "not_found", 404, "There is nothing at this address."},
+    {Error::methodNotAllowed, "method_not_allowed", 405, "This address has no such method."},
+    {Error::conflict, "conflict", 409, "The request does not fit the present state."},
+    {Error::gone, "gone", 410, "The share has expired or was withdrawn."},
+    {Error::unsupportedTusVersion, "unsupported_tus_version", 412,
+     "Tus-Resumable has to be 1.0.0."},
+    {Error::tooManyFiles, "too_many_files", 413, "A share holds at most 100 files."},
+    {Error::shareTooLarge, "share_too_large", 413, "A share holds at most 1 GiB."},
+    {Error::tooLarge, "too_large", 413, "The body is larger than allowed."},
+    {Error::unsupportedMediaType, "unsupported_media_type", 415,
+     "Content-Type has to be application/offset+octet-stream."},
+    {Error::rangeNotSatisfiable, "range_not_satisfiable", 416,
+     "The file does not have the wanted bytes."},
+    {Error::dailyLimit, "daily_limit", 429, "The account's limit for 24 hours is used up."},
+    {Error::headerTooLarge, "header_too_large", 431, "The request's head is over 16 KiB."},
+    {Error::internal, "internal", 500, "The server failed."},
+    {Error::noSpace, "no_space", 507, "The store is full."},
+};
+
+} // namespace
+
+const ErrorEntry &errorEntry(Error error)
+{
+    const auto *found = std::find_if(std::begin(table), std::end(table),
+                                     [&](const ErrorEntry &e) { return e.error == error; });
+    return found == std::end(table) ? errorEntry(Error::internal) : *found;
+}
+
+Refusal::Refusal(Error error, std::string message, std::vector<Header> headers)
+    : m_error(error), m_message(message.empty() ? errorEntry(error).sentence : std::move(message)),
+      m_headers(std::move(headers))
+{
+}
+
+Response errorResponse(const Refusal &refusal)
+{
+    nlohmann::json body{{"error", refusal.entry().name}, {"message", refusal.what()}};
+    Response response{refusal.entry().status, refusal.headers(), body.dump() + "\n"};
+    response.headers.push_back({"Content-Type", "application/json"});
+    response.headers.push_back({"Cache-Control", "no-store"});
+    return response;
+}
+
+} // namespace pelliko::server

@@ -1,0 +1,70 @@
+#pragma once
+
+#include "http/Message.h"
+
+#include <boost/asio/awaitable.hpp>
+
+#include <cstddef>
+#include <cstdint>
+#include <exception>
+#include <optional>
+#include <span>
+#include <string>
+#include <string_view>
+
+namespace pelliko::server
+{
+
+/// A coroutine of the server. Debian 12's compiler makes code that crashes of a co_await in the
+/// condition of an if, while or switch, and none at all of one with a braced list in its
+/// expression: give what was awaited, or is passed, a name first.
+template <class T> using Task = boost::asio::awaitable<T>;
+
+/// The peer is gone, or was too slow: there is nobody to answer.
+class Disconnected : public std::exception
+{
+public:
+    [[nodiscard]] const char *what() const noexcept override { return "connection lost"; }
+};
+
+/// Somebody else ended the reading of this body (see Exchange::interrupt); the peer is still there.
+class Interrupted : public std::exception
+{
+public:
+    [[nodiscard]] const char *what() const noexcept override { return "interrupted"; }
+};
+
+/// One request and its answer. Used on the network thread only.
+class Exchange
+{
+public:
+    virtual ~Exchange() = default;
+
+    [[nodiscard]] virtual const Request &request() const = 0;
+
+    /// Reads some bytes of the body into `into`; 0 at its end. Answers a wait for "100 Continue".
+    /// Throws Disconnected or Interrupted.
+    virtual Task<std::size_t> readBody(std::span<char> into) = 0;
+
+    /// Ends a running readBody, and every later one, with Interrupted. An answer can still be sent.
+    virtual void interrupt() = 0;
+
+    /// Sends a whole answer. For HEAD the body is left out and its length stays.
+    virtual Task<void> respond(Response response) = 0;
+
+    /// Sends the head of a streamed answer; without a length it goes out in chunks.
+    /// For HEAD the following writes send nothing.
+    virtual Task<void> startStream(Response head, std::optional<std::uint64_t> length) = 0;
+    virtual Task<void> write(std::string_view bytes) = 0;
+    /// Sends `length` bytes of an open file from `offset`; the kernel copies them.
+    virtual Task<void> sendFile(int file, std::uint64_t offset, std::uint64_t length) = 0;
+    virtual Task<void> endStream() = 0;
+
+    /// True once a head was sent: a refusal can no longer be told.
+    [[nodiscard]] virtual bool answered() const = 0;
+};
+
+/// Reads a whole body of at most `limit` bytes; more is refused as too large.
+Task<std::string> readWholeBody(Exchange &exchange, std::size_t limit);
+
+} // namespace pelliko::server

@@ -1,0 +1,181 @@
+#include "http/Router.h"
+
+#include "accounts/Accounts.h"
+#include "http/Errors.h"
+#include "pages/Download.h"
+#include "pages/LandingPage.h"
+#include "shares/ShareEndpoints.h"
+#include "store/StorageFailure.h"
+#include "tus/TusEndpoints.h"
+#include "tus/TusHeaders.h"
+
+#include <cstdio>
+#include <optional>
+#include <string_view>
+#include <utility>
+#include <vector>
+
+namespace pelliko::server
+{
+namespace
+{
+
+using Parts = std::vector<std::string>;
+
+Parts splitPath(std::string_view path)
+{
+    Parts parts;
+    while (!path.empty()) {
+        path.remove_prefix(1);
+        const auto slash = path.find('/');
+        parts.emplace_back(path.substr(0, slash));
+        path = slash == std::string_view::npos ? std::string_view() : path.substr(slash);
+    }
+    return parts;
+}
+
+[[noreturn]] void refuseMethod(const char *allowed)
+{
+    throw Refusal(Error::methodNotAllowed, {}, {{"Allow", allowed}});
+}
+
+void requireGet(const Request &request)
+{
+    if (request.method != "GET" && request.method != "HEAD")
+        refuseMethod("GET, HEAD");
+}
+
+Task<void> showHealth(Exchange &exchange, Context &context)
+{
+    requireGet(exchange.request());
+    co_await context.pool.run([&] { context.metadata.ping(); });
+    Response response = makeResponse(
+        Status::ok, {{"Content-Type", "text/plain"}, {"Cache-Control", "no-store"}}, "ok\n");
+    co_await exchange.respond(std::move(response));
+}
+
+Task<void> routeShares(Exchange &exchange, Context &context, Parts parts)
+{
+    const std::string &method = exchange.request().method;
+    const bool isGet = method == "GET" || method == "HEAD";
+    if (parts.empty()) {
+        if (!isGet && method != "POST")
+            refuseMethod("GET, HEAD, POST");
+        if (isGet)
+            co_await listShares(exchange, context);
+        else
+            co_await createShare(exchange, context);
+    } else if (parts.size() == 1) {
+        if (!isGet && method != "DELETE")
+            refuseMethod("GET, HEAD, DELETE");
+        if (isGet)
+            co_await showShare(exchange, context, parts[0]);
+        else
+            co_await withdrawShare(exchange, context, parts[0]);
+    } else if (parts.size() == 2 && parts[1] == "finish") {
+        if (method != "POST")
+            refuseMethod("POST");
+        co_await finishShare(exchange, context, parts[0]);
+    } else {
+        throw Refusal(Error::notFound);
+    }
+}
+
+Task<void> routeLinks(Exchange &exchange, Context &context, Parts parts)
+{
+    requireGet(exchange.request());
+    if (parts.size() == 1) {
+        co_await showLandingPage(exchange, context, parts[0]);
+    } else if (parts.size() == 2 && parts[1] == "all.zip") {
+        co_await downloadAll(exchange, context, parts[0]);
+    } else if (const auto index = parts.size() == 2 ? parseNumber(parts[1]) : std::nullopt) {
+        co_await downloadFile(exchange, context, parts[0], static_cast<std::size_t>(*index));
+    } else {
+        throw Refusal(Error::notFound);
+    }
+}
+
+Task<void> routeApi(Exchange &exchange, Context &context, Parts parts)
+{
+    const std::string room = parts.empty() ? std::string() : parts[0];
+    if (!parts.empty())
+        parts.erase(parts.begin());
+    if (room == "shares") {
+        co_await routeShares(exchange, context, std::move(parts));
+    } else if (room == "uploads" && parts.empty()) {
+        co_await tusCollection(exchange, context);
+    } else if (room == "uploads" && parts.size() == 1) {
+        co_await tusUpload(exchange, context, parts[0]);
+    } else if (room == "account" && parts.empty()) {
+        requireGet(exchange.request());
+        co_await showAccount(exchange, context);
+    } else {
+        throw Refusal(Error::notFound);
+    }
+}
+
+bool isLinkPath(const Request &request)
+{
+    return request.path.rfind("/s/", 0) == 0;
+}
+
+Task<void> route(Exchange &exchange, Context &context)
+{
+    Parts parts = splitPath(exchange.request().path);
+    if (parts.size() >= 2 && parts[0] == "api" && parts[1] == "v1")
+        co_await routeApi(exchange, context, Parts(parts.begin() + 2, parts.end()));
+    else if (parts.size() >= 2 && parts[0] == "s")
+        co_await routeLinks(exchange, context, Parts(parts.begin() + 1, parts.end()));
+    else if (parts.size() == 1 && parts[0] == "healthz")
+        co_await showHealth(exchange, context);
+    else
+        throw Refusal(Error::notFound);
+}
+
+Refusal refusalOf(const std::exception_ptr &failure)
+{
+    try {
+        std::rethrow_exception(failure);
+    } catch (const Refusal &refusal) {
+        return refusal;
+    } catch (const Disconnected &) {
+        throw;
+    } catch (const StorageFailure &error) {
+        std::fprintf(stderr, "pelliko-server: %s\n", error.what());
+        return Refusal(error.kind() == StorageFailure::Kind::full ? Error::noSpace
+                                                                  : Error::internal);
+    } catch (const std::exception &error) {
+        std::fprintf(stderr, "pelliko-server: %s\n", error.what());
+        return Refusal(Error::internal);
+    }
+}
+
+} // namespace
+
+Task<void> handleRequest(Exchange &exchange, Context &context)
+{
+    std::exception_ptr failure;
+    try {
+        co_await route(exchange, context);
+    } catch (...) {
+        failure = std::current_exception();
+    }
+    if (!failure)
+        co_return;
+    const Refusal refusal = refusalOf(failure);
+    // Half of a body went out: only a cut tells the receiver that it is not whole.
+    if (exchange.answered())
+        throw Disconnected();
+    Response response =
+        isLinkPath(exchange.request()) ? errorPage(refusal) : errorResponse(refusal);
+    if (exchange.request().path.rfind("/api/v1/uploads", 0) == 0)
+        response.headers.push_back({"Tus-Resumable", tusVersion});
+    co_await exchange.respond(std::move(response));
+}
+
+Response refuseHead(bool tooLarge)
+{
+    return errorResponse(Refusal(tooLarge ? Error::headerTooLarge : Error::badRequest));
+}
+
+} // namespace pelliko::server

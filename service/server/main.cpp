@@ -1,0 +1,155 @@
+#include "AccountCommands.h"
+#include "Config.h"
+#include "DataDirectory.h"
+#include "Server.h"
+#include "store/DirectoryBlobs.h"
+#include "store/SqliteMetadata.h"
+
+#include <CLI/CLI.hpp>
+#include <systemd/sd-daemon.h>
+
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <clocale>
+#include <csignal>
+#include <cstdio>
+#include <cstdlib>
+#include <ctime>
+
+namespace
+{
+
+namespace server = pelliko::server;
+
+struct AccountOptions {
+    std::string data;
+    std::string number;
+    std::string name;
+};
+
+struct ServeOptions {
+    server::Config config;
+    std::string data;
+    long headTimeout = server::Timeouts{}.head.count();
+    long idleTimeout = server::Timeouts{}.idle.count();
+    long progressTimeout = server::Timeouts{}.progress.count();
+};
+
+void announce(const server::Server &server, int readyFd)
+{
+    std::fprintf(stderr, "pelliko-server: serving at %s\n", server.url().c_str());
+    if (readyFd >= 0) {
+        dprintf(readyFd, "%s\n", server.url().c_str());
+        close(readyFd);
+    }
+    sd_notify(0, "READY=1");
+}
+
+int serve(const ServeOptions &options)
+{
+    server::Config config = options.config;
+    config.data = options.data;
+    config.publicUrl = server::normalPublicUrl(config.publicUrl);
+    config.timeouts.head = std::chrono::seconds(options.headTimeout);
+    config.timeouts.idle = std::chrono::seconds(options.idleTimeout);
+    config.timeouts.progress = std::chrono::seconds(options.progressTimeout);
+    server::makeDataDirectory(config.data);
+    const server::DataLock lock(config.data);
+    server::SqliteMetadata metadata(server::metadataFile(config.data));
+    server::DirectoryBlobs blobs(server::blobsDirectory(config.data));
+    server::Server running(config, metadata, blobs, [] { return std::time(nullptr); });
+    announce(running, config.readyFd);
+    running.run();
+    return EXIT_SUCCESS;
+}
+
+void addServe(CLI::App &app, ServeOptions &options)
+{
+    CLI::App *command = app.add_subcommand("serve", "Serve uploads, links and downloads");
+    server::Limits &limits = options.config.limits;
+    command->add_option("--data", options.data, "Directory of everything the server keeps")
+        ->required();
+    command->add_option("--listen", options.config.listen, "Address and port; port 0 picks one")
+        ->capture_default_str();
+    command->add_option("--public-url", options.config.publicUrl,
+                        "What links start with; the listening address when absent");
+    command->add_option("--share-lifetime", limits.shareLifetime, "Seconds from finish to expiry")
+        ->check(CLI::PositiveNumber)
+        ->capture_default_str();
+    command
+        ->add_option("--unfinished-lifetime", limits.unfinishedLifetime,
+                     "Seconds until an unfinished share is given up")
+        ->check(CLI::PositiveNumber)
+        ->capture_default_str();
+    command->add_option("--share-limit", limits.shareBytes, "Bytes in one share")
+        ->capture_default_str();
+    command->add_option("--daily-limit", limits.dailyBytes, "Bytes per account in 24 hours")
+        ->capture_default_str();
+    command->add_option("--head-timeout", options.headTimeout, "Seconds for a whole request head")
+        ->check(CLI::PositiveNumber)
+        ->capture_default_str();
+    command->add_option("--idle-timeout", options.idleTimeout, "Seconds between two requests")
+        ->check(CLI::PositiveNumber)
+        ->capture_default_str();
+    command
+        ->add_option("--progress-timeout", options.progressTimeout,
+                     "Seconds in which a body has to get on")
+        ->check(CLI::PositiveNumber)
+        ->capture_default_str();
+    command->add_option("--ready-fd", options.config.readyFd,
+                        "Descriptor that gets the server's address once it accepts connections");
+    command->set_config("--config", "", "File with these options as lines of name = value");
+}
+
+void addAccount(CLI::App &app, AccountOptions &options)
+{
+    CLI::App *account = app.add_subcommand("account", "Manage the accounts that may share");
+    account->require_subcommand(1);
+    CLI::App *add = account->add_subcommand("add", "Make an account and print its token, once");
+    CLI::App *list = account->add_subcommand("list", "Print number, creation time and name");
+    CLI::App *remove = account->add_subcommand("remove", "Remove an account with all its shares");
+    for (CLI::App *command : {add, list, remove})
+        command->add_option("--data", options.data, "The server's directory")->required();
+    for (CLI::App *command : {add, remove})
+        command->add_option("--number", options.number, "Phone number, like +4915112345678")
+            ->required();
+    add->add_option("--name", options.name, "Name, for the list");
+}
+
+int runCommand(const CLI::App &app, const ServeOptions &serveOptions,
+               const AccountOptions &accountOptions)
+{
+    if (app.got_subcommand("serve"))
+        return serve(serveOptions);
+    const CLI::App *account = app.get_subcommand("account");
+    if (account->got_subcommand("add"))
+        return server::addAccountCommand(accountOptions.data, accountOptions.number,
+                                         accountOptions.name);
+    if (account->got_subcommand("remove"))
+        return server::removeAccountCommand(accountOptions.data, accountOptions.number);
+    return server::listAccountsCommand(accountOptions.data);
+}
+
+} // namespace
+
+int main(int argc, char **argv)
+{
+    // Names in archives are written in the locale's encoding.
+    std::setlocale(LC_CTYPE, "C.UTF-8");
+    std::signal(SIGPIPE, SIG_IGN);
+    umask(077);
+    CLI::App app("Share server of Pelliko: resumable uploads, links with an end, downloads.");
+    app.require_subcommand(1);
+    ServeOptions serveOptions;
+    AccountOptions accountOptions;
+    addServe(app, serveOptions);
+    addAccount(app, accountOptions);
+    CLI11_PARSE(app, argc, argv);
+    try {
+        return runCommand(app, serveOptions, accountOptions);
+    } catch (const std::exception &error) {
+        std::fprintf(stderr, "pelliko-server: %s\n", error.what());
+        return EXIT_FAILURE;
+    }
+}

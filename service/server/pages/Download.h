@@ -1,0 +1,19 @@
+#pragma once
+
+#include "http/Context.h"
+
+#include <string>
+
+namespace pelliko::server
+{
+
+/// `/s/{token}`: the landing page.
+Task<void> showLandingPage(Exchange &exchange, Context &context, std::string token);
+
+/// `/s/{token}/{index}`: one file, whole or a range.
+Task<void> downloadFile(Exchange &exchange, Context &context, std::string token, std::size_t index);
+
+/// `/s/{token}/all.zip`: all files, made while they are sent.
+Task<void> downloadAll(Exchange &exchange, Context &context, std::string token);
+
+} // namespace pelliko::server

@@ -1,0 +1,22 @@
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+
+namespace pelliko::server
+{
+
+/// What an account may do and how long things are kept. Bytes and seconds.
+struct Limits {
+    std::size_t filesPerShare = 100;
+    std::size_t recipientsPerShare = 100;
+    std::uint64_t shareBytes = std::uint64_t{1} << 30;
+    std::uint64_t dailyBytes = std::uint64_t{2} << 30;
+    std::int64_t dailyWindow = 86400;
+    /// From the finish to the end of the link.
+    std::int64_t shareLifetime = 2 * 86400;
+    /// From making a share to giving it up when it is not finished.
+    std::int64_t unfinishedLifetime = 7 * 86400;
+};
+
+} // namespace pelliko::server

@@ -1,0 +1,56 @@
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <memory>
+#include <span>
+#include <string>
+#include <string_view>
+
+namespace pelliko::server
+{
+
+/// One blob open for writing. One thread at a time; `sync` may run beside `write`.
+class BlobWriter
+{
+public:
+    virtual ~BlobWriter() = default;
+
+    /// Writes all of `bytes` at `offset`, which is at most the end of what is stored.
+    virtual void write(std::uint64_t offset, std::string_view bytes) = 0;
+
+    /// Returns once everything written before is on stable storage, the blob's name included.
+    virtual void sync() = 0;
+};
+
+/// One blob open for reading; stays readable while it is removed elsewhere.
+class BlobReader
+{
+public:
+    virtual ~BlobReader() = default;
+
+    /// Reads up to `into.size()` bytes at `offset`; 0 only at the end.
+    virtual std::size_t read(std::uint64_t offset, std::span<char> into) = 0;
+
+    /// A descriptor that the kernel can send from, or -1 where there is none. Owned by the reader.
+    [[nodiscard]] virtual int descriptor() const { return -1; }
+};
+
+/// Where the bytes of files are. Keys are tokens (see looksLikeToken). Thread-safe; calls may
+/// block; every call throws StorageFailure when the store fails.
+class Blobs
+{
+public:
+    virtual ~Blobs() = default;
+
+    /// Opens the blob for writing and makes it when it is absent; bytes it holds stay.
+    virtual std::unique_ptr<BlobWriter> openForWriting(const std::string &key) = 0;
+
+    /// Null when there is no such blob.
+    virtual std::unique_ptr<BlobReader> openForReading(const std::string &key) = 0;
+
+    /// Removes the blob; one that is absent is as good as removed.
+    virtual void remove(const std::string &key) = 0;
+};
+
+} // namespace pelliko::server

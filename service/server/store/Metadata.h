@@ -1,0 +1,164 @@
+#pragma once
+
+#include <cstdint>
+#include <optional>
+#include <string>
+#include <vector>
+
+namespace pelliko::server
+{
+
+/// All times are whole seconds since the epoch, given by the caller: a store has no clock.
+using Seconds = std::int64_t;
+
+struct Account {
+    std::int64_t id = 0;
+    std::string number;
+    std::string name;
+    Seconds created = 0;
+};
+
+struct Recipient {
+    std::string number;
+    /// The sender's country calling code, or empty.
+    std::string callingCode;
+};
+
+enum class ShareState { uploading = 0, finished = 1, withdrawn = 2, expired = 3 };
+
+struct FileRecord {
+    std::string name;
+    std::string type;
+    std::uint64_t size = 0;
+    /// Bytes on stable storage; 0 once the bytes were dropped.
+    std::uint64_t offset = 0;
+    /// The token of the file's upload address.
+    std::string upload;
+    /// The key of the file's bytes; empty once they were dropped.
+    std::string blob;
+
+    [[nodiscard]] bool complete() const { return !blob.empty() && offset == size; }
+};
+
+struct ShareRecord {
+    std::string key;
+    ShareState state = ShareState::uploading;
+    Seconds created = 0;
+    /// When a finished share expires, or an unfinished one is given up.
+    Seconds deadline = 0;
+    std::vector<FileRecord> files;
+    std::vector<Recipient> recipients;
+};
+
+struct NewFile {
+    std::string name;
+    std::string type;
+    std::uint64_t size = 0;
+};
+
+struct NewShare {
+    std::int64_t account = 0;
+    /// Absent for a share that is not to be found again by it.
+    std::optional<std::string> idempotencyKey;
+    /// Empty when `reshareOf` names the share whose files these are.
+    std::vector<NewFile> files;
+    std::optional<std::string> reshareOf;
+    std::vector<Recipient> recipients;
+    Seconds now = 0;
+    Seconds deadline = 0;
+    /// Bytes that the account may announce within `limitWindow`, those of this share included.
+    std::uint64_t dailyLimit = 0;
+    Seconds limitWindow = 86400;
+};
+
+struct CreateResult {
+    enum class Outcome {
+        created,
+        known,
+        overDailyLimit,
+        sourceMissing,
+        sourceUnfinished,
+        sourceGone
+    };
+    Outcome outcome = Outcome::created;
+    ShareRecord share;
+    /// With overDailyLimit: seconds after which the same share fits.
+    Seconds retryAfter = 0;
+};
+
+struct FinishResult {
+    enum class Outcome { finished, missing, incomplete, gone };
+    Outcome outcome = Outcome::missing;
+    ShareRecord share;
+};
+
+/// One file as its upload address sees it.
+struct UploadRecord {
+    std::string share;
+    ShareState state = ShareState::uploading;
+    Seconds deadline = 0;
+    FileRecord file;
+};
+
+/// A share as its link sees it.
+struct LinkRecord {
+    std::string senderNumber;
+    ShareRecord share;
+};
+
+/// What the server knows about accounts, shares and files. Thread-safe; calls may block. A call has
+/// either happened completely and durably when it returns, or throws StorageFailure and has not
+/// happened. A share whose deadline is at or before `now` is seen as expired, swept or not.
+class Metadata
+{
+public:
+    virtual ~Metadata() = default;
+
+    /// False when the number has an account already.
+    virtual bool addAccount(const std::string &number, const std::string &name,
+                            const std::string &tokenHash, Seconds now) = 0;
+    /// Removes the account with all its shares; false when there is none. Bytes become doomed.
+    virtual bool removeAccount(const std::string &number) = 0;
+    virtual std::vector<Account> listAccounts() = 0;
+    virtual std::optional<Account> findAccount(const std::string &tokenHash) = 0;
+    /// Bytes that the account announced after `since`.
+    virtual std::uint64_t usedBytes(std::int64_t account, Seconds since) = 0;
+
+    virtual CreateResult createShare(const NewShare &share) = 0;
+    virtual std::optional<ShareRecord> findShare(std::int64_t account, const std::string &key,
+                                                 Seconds now) = 0;
+    /// Newest first.
+    virtual std::vector<ShareRecord> listShares(std::int64_t account, Seconds now) = 0;
+    /// Ends the upload and replaces the link; `deadline` holds only for the first finish.
+    virtual FinishResult finishShare(std::int64_t account, const std::string &key,
+                                     const std::string &linkHash, Seconds now,
+                                     Seconds deadline) = 0;
+    /// Returns the keys of the blobs that the share had, or nothing when there is no such share.
+    /// Withdrawing a share that is not live changes nothing.
+    virtual std::optional<std::vector<std::string>>
+    withdrawShare(std::int64_t account, const std::string &key, Seconds now) = 0;
+    virtual std::optional<LinkRecord> findLink(const std::string &linkHash, Seconds now) = 0;
+
+    virtual std::optional<UploadRecord> findUpload(std::int64_t account, const std::string &upload,
+                                                   Seconds now) = 0;
+    /// Notes that `offset` bytes of the blob are on stable storage; never goes back. False when the
+    /// blob is no longer wanted.
+    virtual bool recordOffset(const std::string &blob, std::uint64_t offset) = 0;
+    /// Gives the file a new, empty blob; the former one's bytes stay in the account's use. False
+    /// when the upload does not exist or its share is not uploading.
+    virtual bool resetUpload(std::int64_t account, const std::string &upload, Seconds now) = 0;
+
+    /// Ends every live share whose deadline is at or before `now`; returns their blobs' keys.
+    virtual std::vector<std::string> expireShares(Seconds now) = 0;
+    /// The earliest deadline of a live share.
+    virtual std::optional<Seconds> nextDeadline() = 0;
+    /// Keys of blobs that no live share needs, some of them, oldest first.
+    virtual std::vector<std::string> doomedBlobs() = 0;
+    /// The blob's bytes are gone: forgets its key.
+    virtual void forgetBlob(const std::string &blob) = 0;
+
+    /// Throws when the store does not answer.
+    virtual void ping() = 0;
+};
+
+} // namespace pelliko::server

@@ -1,0 +1,52 @@
+#pragma once
+
+#include "store/Metadata.h"
+
+#include <filesystem>
+#include <memory>
+
+namespace pelliko::server
+{
+
+/// Metadata in one SQLite file, in write-ahead mode with a full sync at every commit. Several
+/// processes may have the file open: the commands for accounts work beside a running server.
+class SqliteMetadata final : public Metadata
+{
+public:
+    explicit SqliteMetadata(const std::filesystem::path &file);
+    ~SqliteMetadata() override;
+
+    bool addAccount(const std::string &number, const std::string &name,
+                    const std::string &tokenHash, Seconds now) override;
+    bool removeAccount(const std::string &number) override;
+    std::vector<Account> listAccounts() override;
+    std::optional<Account> findAccount(const std::string &tokenHash) override;
+    std::uint64_t usedBytes(std::int64_t account, Seconds since) override;
+
+    CreateResult createShare(const NewShare &share) override;
+    std::optional<ShareRecord> findShare(std::int64_t account, const std::string &key,
+                                         Seconds now) override;
+    std::vector<ShareRecord> listShares(std::int64_t account, Seconds now) override;
+    FinishResult finishShare(std::int64_t account, const std::string &key,
+                             const std::string &linkHash, Seconds now, Seconds deadline) override;
+    std::optional<std::vector<std::string>>
+    withdrawShare(std::int64_t account, const std::string &key, Seconds now) override;
+    std::optional<LinkRecord> findLink(const std::string &linkHash, Seconds now) override;
+
+    std::optional<UploadRecord> findUpload(std::int64_t account, const std::string &upload,
+                                           Seconds now) override;
+    bool recordOffset(const std::string &blob, std::uint64_t offset) override;
+    bool resetUpload(std::int64_t account, const std::string &upload, Seconds now) override;
+
+    std::vector<std::string> expireShares(Seconds now) override;
+    std::optional<Seconds> nextDeadline() override;
+    std::vector<std::string> doomedBlobs() override;
+    void forgetBlob(const std::string &blob) override;
+    void ping() override;
+
+private:
+    struct Connection;
+    std::unique_ptr<Connection> m_connection;
+};
+
+} // namespace pelliko::server

@@ -1,0 +1,125 @@
+#include "tus/TusAppend.h"
+
+#include "http/Errors.h"
+#include "shares/ShareRules.h"
+#include "tus/TusHeaders.h"
+
+#include <algorithm>
+#include <exception>
+#include <utility>
+#include <vector>
+
+namespace pelliko::server
+{
+namespace
+{
+
+constexpr std::size_t bufferSize = 256 * 1024;
+/// A crash loses at most this much of a running upload.
+constexpr std::uint64_t checkpointEvery = 16 * 1024 * 1024;
+
+Task<void> openWriter(Context &context, ActiveWrite &write)
+{
+    write.writer = co_await context.pool.run(
+        [&]() -> std::shared_ptr<BlobWriter> { return context.blobs.openForWriting(write.key); });
+}
+
+/// Copies the body into the blob, up to `end`.
+Task<void> copyBody(Exchange &exchange, Context &context, std::shared_ptr<ActiveWrite> write,
+                    std::uint64_t end)
+{
+    std::vector<char> buffer(bufferSize);
+    std::uint64_t safe = write->written;
+    while (true) {
+        const std::size_t count = co_await exchange.readBody(buffer);
+        if (count == 0)
+            co_return;
+        if (!write->writer)
+            co_await openWriter(context, *write);
+        const auto fitting = std::min<std::uint64_t>(count, end - write->written);
+        const std::string_view bytes(buffer.data(), static_cast<std::size_t>(fitting));
+        const auto store = [&] { write->writer->write(write->written, bytes); };
+        co_await context.pool.run(store);
+        write->written += fitting;
+        if (fitting < count)
+            throw Refusal(Error::tooLarge, "The upload is longer than announced.");
+        if (write->written - safe >= checkpointEvery) {
+            co_await checkpoint(context, write);
+            safe = write->written;
+        }
+    }
+}
+
+/// Turns what ended a body into what its sender is told.
+[[noreturn]] void rethrowEnding(const std::exception_ptr &ending)
+{
+    try {
+        std::rethrow_exception(ending);
+    } catch (const Interrupted &) {
+        throw Refusal(Error::conflict, "Another request has taken over this upload.");
+    }
+}
+
+void checkAppend(const Request &request, const UploadRecord &upload, std::uint64_t offset)
+{
+    if (offset != upload.file.offset)
+        throw Refusal(Error::conflict, "Upload-Offset is not the upload's offset.",
+                      {{"Upload-Offset", std::to_string(upload.file.offset)}});
+    const std::uint64_t rest = upload.file.size - offset;
+    if (request.bodyLength.value_or(0) > rest)
+        throw Refusal(Error::tooLarge, "The upload is longer than announced.");
+}
+
+} // namespace
+
+Task<UploadRecord> findWantedUpload(Context &context, std::int64_t account, std::string upload)
+{
+    const Seconds now = context.now();
+    auto found = co_await context.pool.run(
+        [&] { return context.metadata.findUpload(account, upload, now); });
+    if (!found)
+        throw Refusal(Error::notFound);
+    checkLive(found->state);
+    co_return std::move(*found);
+}
+
+Task<void> checkpoint(Context &context, std::shared_ptr<ActiveWrite> write)
+{
+    if (!write->writer)
+        co_return;
+    const std::uint64_t upTo = write->written;
+    const bool wanted = co_await context.pool.run([&] {
+        write->writer->sync();
+        return context.metadata.recordOffset(write->key, upTo);
+    });
+    if (!wanted)
+        throw Refusal(Error::gone);
+}
+
+Task<std::uint64_t> appendBody(Exchange &exchange, Context &context, std::int64_t account,
+                               std::string upload)
+{
+    const std::uint64_t offset = requiredNumber(exchange.request(), "Upload-Offset");
+    const UploadRecord before = co_await findWantedUpload(context, account, upload);
+    const ActiveWrites::Lease lease =
+        co_await context.writes.take(before.file.blob, [&exchange] { exchange.interrupt(); });
+    // Read again: the former writer may have got on, or the upload may have been dropped.
+    const UploadRecord current = co_await findWantedUpload(context, account, upload);
+    if (current.file.blob != before.file.blob)
+        throw Refusal(Error::conflict, "The upload was dropped meanwhile.");
+    checkAppend(exchange.request(), current, offset);
+    const std::shared_ptr<ActiveWrite> write = lease.write();
+    write->written = offset;
+    std::exception_ptr ending;
+    try {
+        co_await copyBody(exchange, context, write, current.file.size);
+    } catch (const std::exception &) {
+        ending = std::current_exception();
+    }
+    co_await checkpoint(context, write);
+    if (ending)
+        rethrowEnding(ending);
+    co_return write->written;
+}
+
+} // namespace pelliko::server
