@@ -1,0 +1,138 @@
+// The dispatcher inside the test's own process, where the record and the window can be looked at.
+#include "PellikoApp/AppData.h"
+#include "PellikoApp/PellikoApp.h"
+#include "PellikoUploadManager/ExitPolicy.h"
+#include "support/FileLog.h"
+#include "support/LaunchRequest.h"
+
+#include <Elementary.h>
+#include <fstream>
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+namespace pelliko
+{
+namespace
+{
+
+using test::LaunchRequest;
+using ::testing::ElementsAre;
+
+struct OpenApp : PellikoApp {
+    using PellikoApp::onAppControl;
+    using PellikoApp::onCreate;
+    using PellikoApp::onTerminate;
+};
+
+class Dispatch : public ::testing::Test
+{
+protected:
+    static void SetUpTestSuite()
+    {
+        elm_init(0, nullptr);
+        app = new OpenApp;
+        ASSERT_TRUE(app->onCreate());
+        std::ofstream("/tmp/a.jpg") << "picture";
+    }
+    static void TearDownTestSuite()
+    {
+        app->onTerminate();
+        delete app;
+        elm_shutdown();
+    }
+    ~Dispatch() override { _hideWindow(ad); }
+
+    void share(const char *uri)
+    {
+        LaunchRequest request;
+        app_control_set_operation(request, APP_CONTROL_OPERATION_SHARE);
+        app_control_set_uri(request, uri);
+        app->onAppControl(request, false);
+    }
+
+    bool windowIsShown() const { return ad->win && evas_object_visible_get(ad->win); }
+
+    static inline OpenApp *app = nullptr;
+    PellikoAppData *ad = getAppData();
+    test::FileLog log;
+};
+
+TEST_F(Dispatch, RequestThatIsMissingIsRefused)
+{
+    app->onAppControl(nullptr, false);
+    EXPECT_THAT(log.messages(), ElementsAre("[ERROR][(request == NULL)] Return message : Service "
+                                            "is NULL"));
+}
+
+TEST_F(Dispatch, ShareShowsTheWindowAgainAfterItWasHidden)
+{
+    share("/tmp/a.jpg");
+    EXPECT_TRUE(windowIsShown());
+    EXPECT_NE(ad->popup, nullptr);
+    _hideWindow(ad);
+    EXPECT_FALSE(windowIsShown());
+    share("/tmp/a.jpg");
+    EXPECT_TRUE(windowIsShown());
+}
+
+TEST_F(Dispatch, ShareThatIsNotUnderstoodLeavesNoClearWindowInTheWay)
+{
+    share("a.jpg");
+    EXPECT_EQ(ad->popup, nullptr);
+    EXPECT_FALSE(windowIsShown());
+}
+
+TEST_F(Dispatch, ShareThatIsNotUnderstoodLeavesAnOpenPopupAlone)
+{
+    share("/tmp/a.jpg");
+    const Evas_Object *popup = ad->popup;
+    share("a.jpg");
+    EXPECT_EQ(ad->popup, popup);
+    EXPECT_TRUE(windowIsShown());
+}
+
+TEST_F(Dispatch, EveryRequestIsKeptAsAClone)
+{
+    {
+        LaunchRequest request;
+        app_control_set_operation(request, "first");
+        request.text("key", "value");
+        app->onAppControl(request, false);
+    }
+    char *value = nullptr;
+    EXPECT_EQ(app_control_get_extra_data(ad->app_control, "key", &value), APP_CONTROL_ERROR_NONE);
+    EXPECT_STREQ(value, "value");
+    free(value);
+    app->onAppControl(LaunchRequest(), false);
+    EXPECT_EQ(app_control_get_extra_data(ad->app_control, "key", &value),
+              APP_CONTROL_ERROR_KEY_NOT_FOUND);
+}
+
+TEST_F(Dispatch, ShareEndsAResumeAndReshareIsForgottenByTheNextShare)
+{
+    ad->is_resume_by_reboot = 1;
+    LaunchRequest reshare;
+    app_control_set_operation(reshare, APP_CONTROL_OPERATION_MULTI_SHARE);
+    reshare.text("pk_reshare", "5");
+    app->onAppControl(reshare, false);
+    EXPECT_EQ(ad->action_type, ACTION_RESHARE_UPLOAD);
+    EXPECT_EQ(ad->operation_type, OPERATION_MULTI_SHARE);
+    EXPECT_EQ(ad->req_id_to_reshare, 5);
+    EXPECT_EQ(ad->is_resume_by_reboot, 0);
+    share("/tmp/a.jpg");
+    EXPECT_EQ(ad->action_type, ACTION_UPLOAD);
+    EXPECT_EQ(ad->operation_type, OPERATION_SHARE);
+    EXPECT_EQ(ad->req_id_to_reshare, 5);
+}
+
+TEST_F(Dispatch, EndReleasesTheTables)
+{
+    share("/tmp/a.jpg");
+    app->onTerminate();
+    EXPECT_EQ(ad->color_table, nullptr);
+    EXPECT_EQ(ad->font_table, nullptr);
+    app->onTerminate();
+}
+
+} // namespace
+} // namespace pelliko
