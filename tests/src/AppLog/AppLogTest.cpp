@@ -45,7 +45,7 @@ std::string textIn(const std::string &archive_path)
 }
 
 // The bytes that one line with an empty message takes in this process.
-uintmax_t lineLength()
+uintmax_t emptyLineLength()
 {
     const uintmax_t before = fs::file_size(test::logPath);
     write("");
@@ -146,7 +146,7 @@ TEST_F(AppLog, LineThatFillsTheFileRotatesAtOnce)
 {
     EXPECT_TRUE(holdsInFreshProcess([] {
         write("x");
-        const uintmax_t line = lineLength();
+        const uintmax_t line = emptyLineLength();
         fs::resize_file(test::logPath, rotationSize - 1 - line);
         write("");
         EXPECT_EQ(fs::file_size(test::logPath), rotationSize - 1);
@@ -246,20 +246,21 @@ TEST_F(AppLog, LinesOfManyThreadsNeverMix)
 {
     EXPECT_TRUE(holdsInFreshProcess([] {
         constexpr int threads = 8;
-        constexpr int lines = 200;
+        constexpr int lines = 50;
+        constexpr size_t lineLength = 6000; // more than one write of a buffer
         const FileLog log;
         std::vector<std::thread> writers;
         for (int i = 0; i < threads; ++i)
             writers.emplace_back([i] {
                 for (int j = 0; j < lines; ++j)
-                    write(std::string(300, static_cast<char>('a' + i)));
+                    write(std::string(lineLength, static_cast<char>('a' + i)));
             });
         for (std::thread &writer : writers)
             writer.join();
         const std::vector<std::string> messages = log.messages();
         EXPECT_EQ(messages.size(), size_t{threads * lines});
         for (const std::string &message : messages)
-            ASSERT_EQ(message, std::string(300, message.at(0)));
+            ASSERT_EQ(message, std::string(lineLength, message.at(0)));
     }));
 }
 
