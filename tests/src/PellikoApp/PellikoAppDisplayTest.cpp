@@ -248,7 +248,7 @@ TEST_F(PellikoApp, UploadOfAnotherIdStaysInTheListAndKeepsTheProcess)
     pendingRow(12);
     ASSERT_EQ(app.launch("default", {"--extra-array", "upload_resume=11"}).status, 0);
     const std::vector<std::string> messages = messagesFrom("Reading database...");
-    ASSERT_GE(messages.size(), 8u);
+    ASSERT_GE(messages.size(), 9u);
     EXPECT_EQ(messages[1], "Row returned from database...");
     EXPECT_EQ(messages[2], "Row returned from database...");
     EXPECT_EQ(messages[3], "Records read successfully...");
