@@ -4,9 +4,11 @@
 
 #include <cstdlib>
 #include <filesystem>
+#include <future>
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 #include <regex>
+#include <sys/stat.h>
 #include <sys/syscall.h>
 #include <thread>
 
@@ -240,6 +242,40 @@ TEST_F(AppLog, WithoutADirectoryNothingIsCreatedUntilItIsThere)
         write("kept");
         EXPECT_THAT(log.messages(), ElementsAre("kept"));
     }));
+}
+
+// A tar that tells when it was started and goes on when it is let: "started" and "go" are pipes.
+void installSlowTar(const std::string &folder)
+{
+    fs::create_directory(folder);
+    mkfifo((folder + "/started").c_str(), 0600);
+    mkfifo((folder + "/go").c_str(), 0600);
+    std::ofstream(folder + "/tar")
+        << "#!/bin/sh\necho yes >" << folder << "/started\nread go <" << folder << "/go\n";
+    fs::permissions(folder + "/tar", fs::perms::owner_all);
+    setenv("PATH", (folder + ":" + getenv("PATH")).c_str(), 1);
+}
+
+TEST_F(AppLog, LineDuringARotationWaitsForItAndIsNotEmptiedAway)
+{
+    EXPECT_TRUE(holdsInFreshProcess([] {
+        const std::string folder = "/tmp/slow-tar";
+        installSlowTar(folder);
+        write("x");
+        std::thread rotating([] { rotateWith("mark"); });
+        std::string word;
+        std::ifstream(folder + "/started") >> word;
+
+        std::future<void> second = std::async(std::launch::async, [] { write("second"); });
+        EXPECT_EQ(second.wait_for(std::chrono::milliseconds(200)), std::future_status::timeout);
+        std::ofstream(folder + "/go") << "go\n";
+        rotating.join();
+        second.get();
+        std::ifstream log(test::logPath);
+        const std::string kept(std::istreambuf_iterator<char>(log), {});
+        EXPECT_THAT(kept, ::testing::EndsWith("> second\n"));
+    }));
+    fs::remove_all("/tmp/slow-tar");
 }
 
 TEST_F(AppLog, LinesOfManyThreadsNeverMix)
