@@ -98,6 +98,7 @@ void Desktop::askCapabilities()
     if (asking_)
         return;
     asking_ = true;
+    askedOwner_ = owner_;
     g_dbus_connection_call(bus_, daemonName, daemonPath, daemonName, "GetCapabilities", nullptr,
                            G_VARIANT_TYPE("(as)"), G_DBUS_CALL_FLAGS_NONE, -1, cancel_,
                            onCapabilities, this);
@@ -115,9 +116,8 @@ void Desktop::onCapabilities(GObject *bus, GAsyncResult *result, gpointer self)
     auto *desktop = static_cast<Desktop *>(self);
     desktop->asking_ = false;
     if (error) {
-        g_printerr("quickpanel: nothing shows notifications: %s\n", error->message);
+        desktop->askedInVain(error);
         g_error_free(error);
-        desktop->giveUp();
         return;
     }
     const gchar **capabilities = nullptr;
@@ -129,18 +129,24 @@ void Desktop::onCapabilities(GObject *bus, GAsyncResult *result, gpointer self)
         desktop->becomeReady();
 }
 
+// While the bus tried in vain to start one, another daemon may have come by itself.
+void Desktop::askedInVain(const GError *error)
+{
+    if (!owner_.empty() && owner_ != askedOwner_) {
+        askCapabilities();
+        return;
+    }
+    g_printerr("quickpanel: nothing shows notifications: %s\n", error->message);
+    for (const auto &pending : std::exchange(pending_, {}))
+        pending.done(0);
+}
+
 void Desktop::becomeReady()
 {
     ready_ = true;
     for (const auto &pending : std::exchange(pending_, {}))
         send(pending);
     listener_.appeared();
-}
-
-void Desktop::giveUp()
-{
-    for (const auto &pending : std::exchange(pending_, {}))
-        pending.done(0);
 }
 
 void Desktop::send(const Pending &pending)
