@@ -77,6 +77,8 @@ struct Server::State {
     std::set<std::shared_ptr<Connection>> connections;
     std::string url;
     bool stopping = false;
+    /// Nothing is waited for any more.
+    bool ended = false;
 };
 
 void Server::State::listen(const ListenAddress &address)
@@ -138,6 +140,9 @@ Task<void> Server::State::waitForSignals()
     if (error)
         co_return;
     stop();
+    if (ended)
+        co_return;
+    // A second signal is a person who does not want to wait.
     auto [again, second] = co_await signals.async_wait(asTuple);
     if (!again)
         stopTimer.cancel();
@@ -165,6 +170,7 @@ Task<void> Server::State::cutAfterPatience()
         co_await stopTimer.async_wait(asTuple);
     for (const auto &connection : std::set(connections))
         connection->cut();
+    ended = true;
     signals.cancel();
 }
 
