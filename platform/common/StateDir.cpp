@@ -39,7 +39,7 @@ bool createPrivateDirectories(const std::string &path)
 
 std::string stateDirectory()
 {
-    const std::string path = dataHome() + "/pelliko-platform";
+    std::string path = dataHome() + "/pelliko-platform";
     createPrivateDirectories(path);
     return path;
 }
@@ -47,7 +47,7 @@ std::string stateDirectory()
 std::string runtimeDirectory()
 {
     const std::string base = environment("XDG_RUNTIME_DIR");
-    const std::string path = base.empty() ? stateDirectory() + "/run" : base + "/pelliko-platform";
+    std::string path = base.empty() ? stateDirectory() + "/run" : base + "/pelliko-platform";
     createPrivateDirectories(path);
     return path;
 }
