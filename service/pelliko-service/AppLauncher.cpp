@@ -10,6 +10,7 @@ namespace
 constexpr const char *applicationName = "com.velmora.pelliko";
 constexpr const char *applicationPath = "/com/velmora/pelliko";
 constexpr const char *launchInterface = "com.velmora.Platform.Application1";
+constexpr const char *leavingError = "com.velmora.Platform.Error.Leaving";
 constexpr const char *operationDefault = "http://tizen.org/appcontrol/operation/default";
 constexpr const char *operationSendText = "http://tizen.org/appcontrol/operation/send_text";
 
@@ -59,6 +60,10 @@ void addTexts(GVariantBuilder &extras, const char *key, const std::vector<std::s
 // Errors with which the bus, or the application's frame, says that nothing was handled.
 bool surelyNotSent(const GError *error)
 {
+    g_autofree char *name = g_dbus_error_get_remote_error(error);
+    if (g_strcmp0(name, leavingError) == 0) {
+        return true;
+    }
     const bool spawn = g_error_matches(error, G_DBUS_ERROR, G_DBUS_ERROR_SPAWN_EXEC_FAILED) ||
                        g_error_matches(error, G_DBUS_ERROR, G_DBUS_ERROR_SPAWN_CHILD_EXITED) ||
                        g_error_matches(error, G_DBUS_ERROR, G_DBUS_ERROR_SPAWN_CHILD_SIGNALED) ||

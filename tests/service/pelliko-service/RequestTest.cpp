@@ -1,0 +1,216 @@
+#include "Request.h"
+
+#include "Fakes.h"
+
+#include <gmock/gmock.h>
+#include <nlohmann/json.hpp>
+
+using namespace pelliko::service;
+using testing::ElementsAre;
+
+namespace
+{
+constexpr const char *shareRecord =
+    R"({"share":"S","state":"uploading","files":[{"index":0,"upload":"/u/1","offset":0}]})";
+constexpr const char *finishedRecord = R"({"url":"http://s/T","expires":9000000,"sms":["+442"]})";
+
+struct OneRequest : testing::Test {
+    Hands hands;
+    std::vector<RequestReport> reports;
+    std::unique_ptr<Request> request;
+
+    void begin(const QueuedRequest &record, bool fromEarlierRun = false)
+    {
+        request = std::make_unique<Request>(
+            hands.context, record, fromEarlierRun,
+            [this](const RequestReport &report) { reports.push_back(report); });
+        request->start();
+    }
+    std::vector<int> statuses() const
+    {
+        std::vector<int> result;
+        for (const RequestReport &report : reports) {
+            result.push_back(static_cast<int>(report.status));
+        }
+        return result;
+    }
+    void upload(const std::string &length)
+    {
+        hands.http.answer(204, "", {{"upload-offset", length}});
+    }
+};
+} // namespace
+
+TEST_F(OneRequest, goesFromCreatingToTheEndInOrder)
+{
+    begin(hands.queued("0123456789"));
+    EXPECT_EQ(hands.http.oldest().method, "POST");
+    EXPECT_EQ(hands.http.oldest().url, "http://server/api/v1/shares");
+    hands.http.answer(201, shareRecord);
+    EXPECT_EQ(hands.http.oldest().method, "PATCH");
+    EXPECT_EQ(hands.http.oldest().url, "http://server/u/1");
+    upload("10");
+    hands.timers.pass(200);
+    EXPECT_EQ(hands.http.oldest().url, "http://server/api/v1/shares/S/finish");
+    hands.http.answer(200, finishedRecord);
+    EXPECT_EQ(reports.back().status, Status::finished);
+    EXPECT_TRUE(hands.launcher.launches.empty()) << "finished is told before the launch";
+    hands.timers.pass(0);
+    ASSERT_EQ(hands.launcher.launches.size(), 1U);
+    EXPECT_EQ(hands.launcher.launches[0].url, "http://s/T");
+    EXPECT_FALSE(request->ended());
+    hands.launcher.answer(LaunchResult::received);
+    EXPECT_EQ(reports.back().status, Status::shareFinished);
+    EXPECT_EQ(reports.back().expires, 9000000);
+    EXPECT_EQ(hands.queue.find(request->record().id)->endStatus, 7);
+}
+
+TEST_F(OneRequest, aFirstFailureIsNoPauseASecondIs)
+{
+    begin(hands.queued("0123456789"));
+    hands.http.refuseConnection();
+    EXPECT_THAT(statuses(), ElementsAre());
+    hands.timers.pass(2000);
+    hands.http.refuseConnection();
+    EXPECT_THAT(statuses(), ElementsAre(6));
+    hands.timers.pass(4000);
+    hands.http.refuseConnection();
+    EXPECT_THAT(statuses(), ElementsAre(6)) << "one pause is told once";
+    EXPECT_EQ(hands.timers.next(), 8000);
+}
+
+TEST_F(OneRequest, repeatsCreatingWithTheSameKey)
+{
+    begin(hands.queued("0123456789"));
+    const auto first = hands.http.oldest().headers;
+    hands.http.refuseConnection();
+    hands.timers.pass(2000);
+    EXPECT_EQ(hands.http.oldest().headers, first);
+}
+
+TEST_F(OneRequest, givesUpWhenTheServerStaysAway)
+{
+    begin(hands.queued("0123456789"));
+    while (!request->ended()) {
+        hands.http.refuseConnection();
+        hands.timers.pass(std::max<int64_t>(hands.timers.next(), 0));
+    }
+    EXPECT_EQ(reports.back().error, -7);
+    EXPECT_GE(hands.timers.steadyMs(), hands.settings.giveUpMs);
+}
+
+TEST_F(OneRequest, withoutANetworkItWaitsForTheNetworkAlone)
+{
+    hands.gate.network = false;
+    begin(hands.queued("0123456789"));
+    EXPECT_THAT(statuses(), ElementsAre(6));
+    EXPECT_EQ(hands.timers.next(), -1) << "nothing polls";
+    EXPECT_EQ(hands.http.count, 0U);
+    hands.gate.network = true;
+    request->networkChanged();
+    EXPECT_EQ(hands.http.open.size(), 1U);
+}
+
+TEST_F(OneRequest, aRefusalEndsItAndLeavesNothingToWithdraw)
+{
+    begin(hands.queued("0123456789"));
+    hands.http.answer(429, R"({"error":"daily_limit","message":"x"})");
+    EXPECT_EQ(reports.back().error, -16);
+    EXPECT_TRUE(hands.queue.withdrawals().empty());
+}
+
+TEST_F(OneRequest, aCancelWhileTheShareIsMadeIsWithdrawnLater)
+{
+    begin(hands.queued("0123456789"));
+    request->cancel();
+    EXPECT_EQ(reports.back().status, Status::cancelled);
+    EXPECT_TRUE(hands.http.open.empty());
+    EXPECT_THAT(hands.queue.withdrawals(), ElementsAre(request->record().id));
+    request->cancel();
+    EXPECT_EQ(reports.size(), 1U) << "it ends once";
+}
+
+TEST_F(OneRequest, anOffsetThatDisagreesIsAskedForAndTheRestIsSentFromThere)
+{
+    begin(hands.queued("0123456789"));
+    hands.http.answer(201, shareRecord);
+    hands.http.answer(409, R"({"error":"conflict","message":"x"})");
+    EXPECT_EQ(hands.http.oldest().method, "HEAD");
+    hands.http.answer(200, "", {{"upload-offset", "4"}});
+    EXPECT_EQ(hands.http.oldest().method, "PATCH");
+    EXPECT_EQ(hands.http.oldest().range.offset, 4);
+    EXPECT_EQ(hands.http.oldest().range.length, 6);
+}
+
+TEST_F(OneRequest, largeFilesGoInChunks)
+{
+    hands.settings.chunkBytes = 4;
+    begin(hands.queued("0123456789"));
+    hands.http.answer(201, shareRecord);
+    EXPECT_EQ(hands.http.oldest().range.length, 4);
+    upload("4");
+    EXPECT_EQ(hands.http.oldest().range.offset, 4);
+    upload("8");
+    EXPECT_EQ(hands.http.oldest().range.length, 2);
+}
+
+TEST_F(OneRequest, anOffsetThatDoesNotGrowIsNoProgress)
+{
+    begin(hands.queued("0123456789"));
+    hands.http.answer(201, shareRecord);
+    upload("0");
+    EXPECT_TRUE(hands.http.open.empty()) << "it waits instead of going round";
+    EXPECT_GT(hands.timers.next(), 0);
+}
+
+TEST_F(OneRequest, aFileThatChangesDuringAChunkIsADeviceError)
+{
+    begin(hands.queued("0123456789"));
+    hands.http.answer(201, shareRecord);
+    std::filesystem::resize_file(hands.folder.file("photo.jpg"), 3);
+    upload("10");
+    EXPECT_EQ(reports.back().error, -5);
+    EXPECT_THAT(hands.queue.withdrawals(), ElementsAre(request->record().id));
+}
+
+TEST_F(OneRequest, afterARestartItAsksTheServerWhereItStands)
+{
+    QueuedRequest record = hands.queued("0123456789");
+    hands.queue.setShare(record.id, "S");
+    begin(*hands.queue.find(record.id), true);
+    EXPECT_EQ(hands.http.oldest().method, "GET");
+    hands.http.answer(
+        200, R"({"share":"S","state":"uploading","files":[{"upload":"/u/1","offset":6}]})");
+    EXPECT_EQ(hands.http.oldest().range.offset, 6);
+}
+
+TEST_F(OneRequest, afterAPauseThePercentIsToldAgain)
+{
+    hands.settings.chunkBytes = 4;
+    QueuedRequest record = hands.queued("0123456789", true);
+    begin(record);
+    hands.http.answer(201, shareRecord);
+    upload("4");
+    hands.timers.pass(200);
+    hands.gate.metered = true;
+    request->networkChanged();
+    hands.gate.metered = false;
+    request->networkChanged();
+    hands.http.answer(
+        200, R"({"share":"S","state":"uploading","files":[{"upload":"/u/1","offset":4}]})");
+    EXPECT_THAT(statuses(), ElementsAre(1, 2, 2, 6));
+    hands.timers.pass(200);
+    upload("8");
+    EXPECT_EQ(reports.back().status, Status::progressing);
+    EXPECT_EQ(reports.back().percent, 80);
+}
+
+TEST_F(OneRequest, withoutRecipientsForAnSmsItEndsAfterFinishing)
+{
+    begin(hands.queued("0123456789"));
+    hands.http.answer(201, shareRecord);
+    upload("10");
+    hands.http.answer(200, R"({"url":"http://s/T","expires":9000000,"sms":[]})");
+    EXPECT_EQ(reports.back().status, Status::shareFinished);
+    EXPECT_TRUE(hands.launcher.launches.empty());
+}

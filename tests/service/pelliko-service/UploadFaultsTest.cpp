@@ -1,0 +1,194 @@
+#include "World.h"
+
+#include <gmock/gmock.h>
+#include <nlohmann/json.hpp>
+
+#include <csignal>
+#include <filesystem>
+#include <fstream>
+
+using testing::Contains;
+using testing::ElementsAre;
+using testing::Not;
+namespace fs = std::filesystem;
+
+namespace
+{
+class UploadFaults : public World
+{
+protected:
+    int64_t proxyTotal()
+    {
+        const size_t seen = proxy_->lines().size();
+        proxy_->signal(SIGUSR2);
+        EXPECT_TRUE(runUntil([&] { return proxy_->lines().size() > seen; }));
+        return std::stoll(proxy_->lines().back().substr(6));
+    }
+
+    size_t sharesOnServer()
+    {
+        return nlohmann::json::parse(askServer("GET", "/api/v1/shares"))["shares"].size();
+    }
+};
+} // namespace
+
+TEST_F(UploadFaults, aKilledServiceGoesOnWhereTheServerStands)
+{
+    startServer();
+    RecordingApplication application;
+    startProxy(12'000'000);
+    startService({"--chunk", "1000000"});
+    const std::string file = makeFile("film.mp4", 20'000'000);
+    int32_t id = 0;
+    ASSERT_EQ(request({file}, &id), 0);
+    ASSERT_TRUE(runUntil([&] { return proxy_->lines().back() == "stalled"; }));
+    service_->end(SIGKILL);
+    proxy_->signal(SIGUSR1);
+    startService({"--chunk", "1000000"});
+    // The client comes back by itself and gets the rest of the reports.
+    ASSERT_TRUE(waitForEnd(id, 60));
+    EXPECT_EQ(reportsOf(id).back().status, 7);
+    EXPECT_EQ(application.launches.size(), 1U);
+    EXPECT_EQ(sharesOnServer(), 1U);
+    EXPECT_LT(proxyTotal(), 20'000'000 + 1'000'000 + 200'000);
+    EXPECT_EQ(fs::file_size(downloadOf(application.launches[0].texts.at("url"))), 20'000'000U);
+}
+
+TEST_F(UploadFaults, aLostAnswerToCreatingMakesNoSecondShare)
+{
+    startServer();
+    RecordingApplication application;
+    startProxy(100); // the head of the first request is on its way, the rest is held
+    startService();
+    int32_t id = 0;
+    ASSERT_EQ(request({makeFile("photo.jpg", 100'000)}, &id), 0);
+    ASSERT_TRUE(runUntil([&] { return proxy_->lines().back() == "stalled"; }));
+    // The server gets the request when its client is gone.
+    service_->end(SIGKILL);
+    proxy_->signal(SIGUSR1);
+    startService();
+    ASSERT_TRUE(waitForEnd(id));
+    EXPECT_EQ(reportsOf(id).back().status, 7);
+    EXPECT_EQ(sharesOnServer(), 1U);
+}
+
+TEST_F(UploadFaults, aServerThatIsDownPausesTheRequestUntilItIsThere)
+{
+    startServer();
+    makeAccount();
+    server_.reset();
+    RecordingApplication application;
+    startService();
+    int32_t id = 0;
+    ASSERT_EQ(request({makeFile("photo.jpg", 100'000)}, &id), 0);
+    ASSERT_TRUE(waitForStatus(id, 6));
+    startServer();
+    ASSERT_TRUE(waitForEnd(id));
+    EXPECT_EQ(reportsOf(id).back().status, 7);
+    EXPECT_EQ(statusesOf(id).front(), 6);
+    EXPECT_EQ(std::count(statusesOf(id).begin(), statusesOf(id).end(), 6), 1)
+        << "one pause is reported once";
+}
+
+TEST_F(UploadFaults, aServerThatStaysAwayEndsTheRequest)
+{
+    startServer();
+    makeAccount();
+    server_.reset();
+    startService({"--give-up", "1500"});
+    int32_t id = 0;
+    ASSERT_EQ(request({makeFile("photo.jpg", 100'000)}, &id), 0);
+    ASSERT_TRUE(waitForEnd(id));
+    EXPECT_EQ(reportsOf(id).back().status, 4);
+    EXPECT_EQ(reportsOf(id).back().error, -7);
+}
+
+TEST_F(UploadFaults, aFileThatVanishedBeforeTheUploadIsADeviceError)
+{
+    startServer();
+    makeAccount();
+    startService();
+    int32_t id = 0;
+    ASSERT_EQ(request({makeFile("here.jpg", 100), folder_ + "/missing.jpg"}, &id), 0);
+    ASSERT_TRUE(waitForEnd(id));
+    EXPECT_EQ(reportsOf(id).back().error, -5);
+    EXPECT_EQ(sharesOnServer(), 0U);
+}
+
+TEST_F(UploadFaults, aFileThatIsCutDuringTheUploadIsADeviceError)
+{
+    startServer();
+    RecordingApplication application;
+    startProxy(2'000'000);
+    startService({"--chunk", "1000000"});
+    const std::string file = makeFile("film.mp4", 20'000'000);
+    int32_t id = 0;
+    ASSERT_EQ(request({file}, &id), 0);
+    ASSERT_TRUE(runUntil([&] { return proxy_->lines().back() == "stalled"; }));
+    fs::resize_file(file, 5'000'000);
+    proxy_->signal(SIGUSR1);
+    ASSERT_TRUE(waitForEnd(id));
+    EXPECT_EQ(reportsOf(id).back().status, 4);
+    EXPECT_EQ(reportsOf(id).back().error, -5);
+    EXPECT_THAT(statusesOf(id), Not(Contains(7)));
+    ASSERT_TRUE(runUntil([&] {
+        return nlohmann::json::parse(askServer("GET", "/api/v1/shares"))["shares"][0]["state"] ==
+               "withdrawn";
+    }));
+}
+
+TEST_F(UploadFaults, aTokenThatTheServerDoesNotKnowIsAServerError)
+{
+    startServer();
+    token_ = "0123456789012345678901";
+    makeAccount();
+    startService();
+    int32_t id = 0;
+    ASSERT_EQ(request({makeFile("photo.jpg", 100)}, &id), 0);
+    ASSERT_TRUE(waitForEnd(id));
+    EXPECT_EQ(reportsOf(id).back().status, 4);
+    EXPECT_EQ(reportsOf(id).back().error, -16);
+}
+
+TEST_F(UploadFaults, aQueueThatIsLockedMakesTheServiceSayThatItInitializes)
+{
+    startServer();
+    makeAccount();
+    startService();
+    service_->end(SIGTERM);
+    Process locker({"/usr/bin/python3", "-c",
+                    "import sqlite3, sys, signal\n"
+                    "db = sqlite3.connect(sys.argv[1], isolation_level=None)\n"
+                    "db.execute('PRAGMA locking_mode = EXCLUSIVE')\n"
+                    "db.execute('BEGIN EXCLUSIVE')\n"
+                    "print('locked', flush=True)\n"
+                    "signal.pause()\n",
+                    folder_ + "/queue.db"});
+    ASSERT_TRUE(runUntil([&] { return !locker.lines().empty(); }));
+    startService();
+    int32_t id = 3;
+    EXPECT_EQ(request({makeFile("photo.jpg", 100)}, &id), PELLIKO_ERROR_SERVICE_INITIALIZING);
+    EXPECT_EQ(id, 3);
+    locker.end(SIGKILL);
+    RecordingApplication application;
+    ASSERT_TRUE(runUntil([&] { return request({makeFile("photo.jpg", 100)}, &id) == 0; }));
+    ASSERT_TRUE(waitForEnd(id));
+    EXPECT_EQ(reportsOf(id).back().status, 7);
+}
+
+TEST_F(UploadFaults, idsAreNotUsedAgainAfterARestart)
+{
+    startServer();
+    makeAccount();
+    RecordingApplication application;
+    startService();
+    int32_t first = 0;
+    ASSERT_EQ(request({makeFile("photo.jpg", 100)}, &first), 0);
+    ASSERT_TRUE(waitForEnd(first));
+    service_->end(SIGKILL);
+    startService();
+    int32_t second = 0;
+    ASSERT_EQ(request({makeFile("photo.jpg", 100)}, &second), 0);
+    EXPECT_GT(second, first);
+    ASSERT_TRUE(waitForEnd(second));
+}

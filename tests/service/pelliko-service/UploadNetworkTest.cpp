@@ -1,0 +1,109 @@
+#include "World.h"
+
+#include <gmock/gmock.h>
+
+using testing::Contains;
+using testing::ElementsAre;
+using testing::Not;
+
+namespace
+{
+constexpr const char *managerName = "org.freedesktop.NetworkManager";
+constexpr const char *managerPath = "/org/freedesktop/NetworkManager";
+constexpr unsigned notMetered = 2;
+constexpr unsigned metered = 1;
+
+/** A network manager on the world's system bus whose network can be made metered. */
+class UploadNetwork : public World
+{
+protected:
+    void SetUp() override
+    {
+        manager_ = std::make_unique<Process>(std::vector<std::string>{
+            "/usr/bin/python3", "-m", "dbusmock", "--system", "--template", "networkmanager"});
+        ASSERT_TRUE(waitForName(G_BUS_TYPE_SYSTEM, managerName, true));
+        bus_ = g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr);
+        // 70 is "connected globally", 4 is "full"; the properties have to be there before the
+        // service starts.
+        mock("SetGlobalConnectionState", g_variant_new("(u)", 70U));
+        mock("SetConnectivity", g_variant_new("(u)", 4U));
+        mock("AddProperty",
+             g_variant_new("(ssv)", managerName, "Metered", g_variant_new_uint32(notMetered)));
+    }
+
+    void TearDown() override
+    {
+        service_->end(SIGTERM);
+        manager_.reset();
+        waitForName(G_BUS_TYPE_SYSTEM, managerName, false);
+        g_object_unref(bus_);
+    }
+
+    void setMetered(unsigned value)
+    {
+        GVariantBuilder properties;
+        g_variant_builder_init(&properties, G_VARIANT_TYPE_VARDICT);
+        g_variant_builder_add(&properties, "{sv}", "Metered", g_variant_new_uint32(value));
+        mock("UpdateProperties", g_variant_new("(sa{sv})", managerName, &properties));
+    }
+
+    void mock(const char *method, GVariant *parameters)
+    {
+        g_autoptr(GError) error = nullptr;
+        g_autoptr(GVariant) reply = g_dbus_connection_call_sync(
+            bus_, managerName, managerPath, "org.freedesktop.DBus.Mock", method, parameters,
+            nullptr, G_DBUS_CALL_FLAGS_NONE, -1, nullptr, &error);
+        ASSERT_TRUE(reply) << error->message;
+    }
+
+    std::unique_ptr<Process> manager_;
+    GDBusConnection *bus_ = nullptr;
+};
+} // namespace
+
+TEST_F(UploadNetwork, aWifiOnlyShareWaitsOnAMeteredNetworkAndGoesOnByItself)
+{
+    startServer();
+    makeAccount();
+    RecordingApplication application;
+    setMetered(metered);
+    startService();
+    int32_t id = 0;
+    ASSERT_EQ(request({makeFile("photo.jpg", 100'000)}, &id, true), 0);
+    ASSERT_TRUE(waitForStatus(id, 6));
+    EXPECT_THAT(statusesOf(id), ElementsAre(6));
+    setMetered(notMetered);
+    ASSERT_TRUE(waitForEnd(id));
+    EXPECT_EQ(reportsOf(id).back().status, 7);
+}
+
+TEST_F(UploadNetwork, aNetworkThatBecomesMeteredStopsAWifiOnlyUploadInTheMiddle)
+{
+    startServer();
+    RecordingApplication application;
+    startProxy(3'000'000);
+    startService({"--chunk", "1000000"});
+    int32_t id = 0;
+    ASSERT_EQ(request({makeFile("film.mp4", 10'000'000)}, &id, true), 0);
+    ASSERT_TRUE(runUntil([&] { return proxy_->lines().back() == "stalled"; }));
+    setMetered(metered);
+    ASSERT_TRUE(waitForStatus(id, 6));
+    proxy_->signal(SIGUSR1);
+    EXPECT_THAT(statusesOf(id), ElementsAre(1, 2, 6));
+    setMetered(notMetered);
+    ASSERT_TRUE(waitForEnd(id));
+    EXPECT_THAT(statusesOf(id), ElementsAre(1, 2, 6, 2, 3, 7));
+}
+
+TEST_F(UploadNetwork, anyOtherShareUsesTheMeteredNetwork)
+{
+    startServer();
+    makeAccount();
+    RecordingApplication application;
+    setMetered(metered);
+    startService();
+    int32_t id = 0;
+    ASSERT_EQ(request({makeFile("photo.jpg", 100'000)}, &id, false), 0);
+    ASSERT_TRUE(waitForEnd(id));
+    EXPECT_THAT(statusesOf(id), Not(Contains(6)));
+}
