@@ -51,6 +51,20 @@ SeenLaunch readLaunch(GVariant *parameters)
 // The client library lives as long as the test program; what comes for an earlier test is dropped.
 const void *currentWorld = nullptr;
 
+// A service that the bus would start by itself knows nothing of the test's queue and account.
+void stopActivation()
+{
+    const char *data = std::getenv("XDG_DATA_HOME");
+    if (!std::filesystem::remove(std::string(data) + "/dbus-1/services/" + serviceName +
+                                 ".service")) {
+        return;
+    }
+    g_autoptr(GDBusConnection) bus = g_bus_get_sync(G_BUS_TYPE_SESSION, nullptr, nullptr);
+    g_autoptr(GVariant) reply = g_dbus_connection_call_sync(
+        bus, "org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DBus",
+        "ReloadConfig", nullptr, nullptr, G_DBUS_CALL_FLAGS_NONE, -1, nullptr, nullptr);
+}
+
 std::string program(const char *name)
 {
     return std::string(PELLIKO_BUILD_DIR "/bin/") + name;
@@ -128,6 +142,7 @@ World::World()
     std::string pattern = std::string(std::getenv("PELLIKO_STATE")) + "/uploads.XXXXXX";
     folder_ = mkdtemp(pattern.data());
     currentWorld = this;
+    stopActivation();
 }
 
 World::~World()
