@@ -47,6 +47,7 @@ void ProgressReporter::update(int64_t bytes)
 void ProgressReporter::repeatNext()
 {
     reported_ = -1;
+    reportedAt_ = timers_.steadyMs() - intervalMs;
 }
 
 void ProgressReporter::stop()

@@ -17,7 +17,7 @@ public:
     ProgressReporter &operator=(const ProgressReporter &) = delete;
 
     void update(int64_t bytes);
-    /** Makes the next update report even when the percent is the same. */
+    /** Makes the next update report at once, even when the percent is the same. */
     void repeatNext();
     /** Drops a report that still waits for its turn. */
     void stop();

@@ -14,7 +14,10 @@ namespace
 void addSettings(CLI::App &app, Settings &settings)
 {
     const auto time = [&app](const char *name, int64_t &value, const char *text) {
-        app.add_option(name, value, text)->check(CLI::PositiveNumber)->capture_default_str();
+        app.add_option(name, value, text)
+            ->check(CLI::PositiveNumber)
+            ->take_last()
+            ->capture_default_str();
     };
     app.add_option("--queue", settings.queueFile, "The queue's file")->capture_default_str();
     app.add_option("--account-file", settings.accountFile, "The account's file")

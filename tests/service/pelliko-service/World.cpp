@@ -189,8 +189,6 @@ void World::startService(std::vector<std::string> options)
                                    "100",
                                    "--longest-launch-retry",
                                    "400",
-                                   "--grace",
-                                   "300",
                                    "--claim",
                                    "700"};
     words.insert(words.end(), options.begin(), options.end());
