@@ -98,7 +98,6 @@ void Desktop::askCapabilities()
     if (asking_)
         return;
     asking_ = true;
-    askedOwner_ = owner_;
     g_dbus_connection_call(bus_, daemonName, daemonPath, daemonName, "GetCapabilities", nullptr,
                            G_VARIANT_TYPE("(as)"), G_DBUS_CALL_FLAGS_NONE, -1, cancel_,
                            onCapabilities, this);
@@ -129,13 +128,9 @@ void Desktop::onCapabilities(GObject *bus, GAsyncResult *result, gpointer self)
         desktop->becomeReady();
 }
 
-// While the bus tried in vain to start one, another daemon may have come by itself.
+// The next thing to show asks again.
 void Desktop::askedInVain(const GError *error)
 {
-    if (!owner_.empty() && owner_ != askedOwner_) {
-        askCapabilities();
-        return;
-    }
     g_printerr("quickpanel: nothing shows notifications: %s\n", error->message);
     for (const auto &pending : std::exchange(pending_, {}))
         pending.done(0);

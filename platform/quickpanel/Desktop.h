@@ -70,7 +70,6 @@ private:
     guint watch_;
     guint signals_;
     std::string owner_;
-    std::string askedOwner_; // who had the name when the capabilities were asked for
     bool asking_ = false;
     bool answered_ = false; // by the present owner, about its capabilities
     bool ready_ = false;
