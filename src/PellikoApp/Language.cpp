@@ -32,6 +32,8 @@ void _setEnvironment(const char *language)
 {
     setenv("LANG", language, 1);
     setenv("LC_MESSAGES", language, 1);
+    // Wins over both in the look-up of texts; a language without a catalogue falls back to English.
+    setenv("LANGUAGE", (std::string(language) + ":en").c_str(), 1);
 }
 
 std::string _deviceLanguage()
@@ -54,19 +56,20 @@ int _bindCatalogue(const char *name, const char *dir)
     return 0;
 }
 
-bool _isUntranslated(const char *locale)
+// "C", "POSIX" or "C.UTF-8": no language at all.
+bool _isBareLocale(const char *locale)
 {
-    return !locale || strcmp(locale, "C") == 0 || strcmp(locale, "POSIX") == 0;
+    return !locale || strcmp(locale, "POSIX") == 0 ||
+           (locale[0] == 'C' && (locale[1] == '\0' || locale[1] == '.'));
 }
 
 // Message ids must never reach the user. The C locale translates nothing, so where the language's
-// locale is not installed C.UTF-8 stands in, with LANGUAGE choosing the catalogue.
+// locale is not installed C.UTF-8 stands in: under it LANGUAGE chooses the catalogue.
 void _translateWithoutLocale(const char *dir, const std::string &language)
 {
-    if (!_isUntranslated(setlocale(LC_MESSAGES, nullptr)))
+    if (!_isBareLocale(setlocale(LC_MESSAGES, nullptr)))
         return;
     LOG_DEBUG("locale %s is not installed, its texts are used without it", language.c_str());
-    setenv("LANGUAGE", language.c_str(), 1);
     setlocale(LC_ALL, "C.UTF-8");
     _bindCatalogue(domain, dir);
 }
@@ -76,7 +79,6 @@ void _translateWithoutLocale(const char *dir, const std::string &language)
 void _langChanged(app_event_info_h, void *data)
 {
     auto *ad = static_cast<PellikoAppData *>(data);
-    unsetenv("LANGUAGE"); // it would win over the device's language
     const std::string language = _deviceLanguage();
     LOG_DEBUG("Current Lang : %s", language.c_str());
     const CText resources(app_get_resource_path(), free);

@@ -37,17 +37,22 @@ void _nameWindow(const Evas_Object *win)
         ecore_x_icccm_name_class_set(xwindow, windowClass, windowClass);
 }
 
-// While no popup is shown the window is nothing but air over the whole screen: it must not catch
-// what is meant for the windows under it.
-void _takeInput(const Evas_Object *win, bool take)
+// A window that was shown for a request which then opened no popup is nothing but air over the
+// whole screen, and would catch what is meant for the windows under it.
+bool carriesPopup = false;
+
+void _hideEmptyWindow(void *data)
 {
-    const Ecore_X_Window xwindow = elm_win_xwindow_get(win);
-    if (!xwindow)
-        return;
-    if (take)
-        ecore_x_window_shape_input_mask_set(xwindow, 0);
-    else
-        ecore_x_window_shape_input_rectangle_set(xwindow, 0, 0, 0, 0);
+    auto *ad = static_cast<PellikoAppData *>(data);
+    if (ad->win && !carriesPopup)
+        evas_object_hide(ad->win);
+}
+
+// The request is dispatched by the time the loop comes to its jobs.
+void _awaitPopup(PellikoAppData *ad)
+{
+    carriesPopup = false;
+    ecore_job_add(_hideEmptyWindow, ad);
 }
 
 Evas_Object *_createWindow(const char *name, Elm_Win_Type type)
@@ -67,7 +72,6 @@ Evas_Object *_createWindow(const char *name, Elm_Win_Type type)
     elm_win_autodel_set(win, EINA_TRUE);
     _nameWindow(win);
     evas_object_show(win);
-    _takeInput(win, false);
     return win;
 }
 
@@ -109,6 +113,7 @@ void _createMainWindow(app_assist::WApp *app, PellikoAppData *ad)
     elm_win_indicator_opacity_set(ad->win, transparentIndicator);
     _changeableGuiInit(app, ad);
     _followRotation(ad);
+    _awaitPopup(ad);
 }
 
 void ensureMainWindow(app_assist::WApp *app, PellikoAppData *ad)
@@ -121,17 +126,17 @@ void ensureMainWindow(app_assist::WApp *app, PellikoAppData *ad)
         return;
     evas_object_show(ad->win);
     elm_win_raise(ad->win);
-    _takeInput(ad->win, false);
+    _awaitPopup(ad);
 }
 
 void showMainWindow(PellikoAppData *ad)
 {
     if (!ad->win)
         return;
+    carriesPopup = true;
     evas_object_show(ad->win);
     elm_win_raise(ad->win);
     elm_win_activate(ad->win);
-    _takeInput(ad->win, true);
 }
 
 void _changeableGuiInit(app_assist::WApp *, PellikoAppData *ad)

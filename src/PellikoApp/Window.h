@@ -22,7 +22,7 @@ void _createMainWindow(app_assist::WApp *app, PellikoAppData *ad);
 /// earlier.
 void ensureMainWindow(app_assist::WApp *app, PellikoAppData *ad);
 
-/// Shows and raises `ad->win`, if there is one.
+/// Shows, raises and focuses `ad->win`, if there is one, for a popup that was opened on it.
 void showMainWindow(PellikoAppData *ad);
 
 /// Reads and applies the changeable colour and font tables into `ad`.

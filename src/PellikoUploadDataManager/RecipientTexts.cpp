@@ -33,8 +33,11 @@ const char *getRecipientIndexListText()
 
 void setRecipientTexts(const char *recipient_list, const char *recipient_index_list)
 {
-    copyText(recipientList, sizeof(recipientList), recipient_list);
-    copyText(recipientIndexList, sizeof(recipientIndexList), recipient_index_list);
+    // Either may be the buffer itself.
+    if (recipient_list != recipientList)
+        copyText(recipientList, sizeof(recipientList), recipient_list);
+    if (recipient_index_list != recipientIndexList)
+        copyText(recipientIndexList, sizeof(recipientIndexList), recipient_index_list);
 }
 
 void _populateExtraData(PellikoAppData *ad)

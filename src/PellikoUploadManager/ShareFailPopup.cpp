@@ -17,6 +17,7 @@ namespace
 
 constexpr const char *domain = "pelliko";
 constexpr const char *style = "pelliko";
+constexpr const char *objectName = "share-fail";
 
 void _close(Evas_Object *popup)
 {
@@ -56,6 +57,7 @@ void createShareFailPopup(PellikoAppData *ad)
     if (!popup)
         return;
     elm_object_theme_set(popup, ad->theme);
+    evas_object_name_set(popup, objectName);
     elm_object_style_set(popup, style);
     elm_popup_align_set(popup, ELM_NOTIFY_ALIGN_FILL, 1.0);
     elm_object_domain_translatable_part_text_set(popup, "title,text", domain,

@@ -1,7 +1,12 @@
 #include "PellikoUploadDataManager/ConfirmationPopup.h"
 
+#include "PellikoUploadDataManager/RecipientTexts.h"
+#include "PellikoUploadManager/ExitPolicy.h"
 #include "support/PopupScene.h"
+#include "support/UploadServiceDouble.h"
 
+#include <ContactsWriter.h>
+#include <contacts.h>
 #include <gmock/gmock.h>
 
 namespace pelliko
@@ -9,48 +14,411 @@ namespace pelliko
 namespace
 {
 
-using ConfirmationPopup = test::PopupScene;
+using ::testing::Contains;
+using ::testing::HasSubstr;
+using ::testing::Not;
+using ::testing::StartsWith;
 
-TEST_F(ConfirmationPopup, LooksForOneRecipient)
+class ConfirmationPopup : public test::PopupScene
+{
+protected:
+    // One for all: the client remembers who stood on the bus.
+    static void SetUpTestSuite()
+    {
+        PopupScene::SetUpTestSuite();
+        double_ = std::make_unique<test::UploadServiceDouble>();
+    }
+    static void TearDownTestSuite() { double_.reset(); }
+
+    ConfirmationPopup() { service.forget(); }
+    ~ConfirmationPopup() override
+    {
+        if (ad->popup)
+            evas_object_del(ad->popup);
+    }
+
+    void openPopup()
+    {
+        _createPopupView(ad);
+        ASSERT_TRUE(settle(button("button2")));
+    }
+
+    bool closes()
+    {
+        return waitUntil([this] { return ad->popup == nullptr; });
+    }
+
+    bool isOnScreen() const { return ad->win && evas_object_visible_get(ad->win); }
+
+    static inline std::unique_ptr<test::UploadServiceDouble> double_;
+    test::UploadServiceDouble &service = *double_;
+
+    /// Everything that hangs on the popup is forgotten with it.
+    void expectNothingLeft() const
+    {
+        EXPECT_EQ(ad->popup, nullptr);
+        EXPECT_EQ(ad->popup_layout, nullptr);
+        EXPECT_EQ(ad->wifi_check_box, nullptr);
+    }
+};
+
+TEST_F(ConfirmationPopup, OneRecipientGetsTheSingleLayoutWithASummary)
 {
     share(1, 1500, {{"Anna Müller", true}});
-    _createPopupView(ad);
-    ASSERT_TRUE(settle(button("button2")));
+    openPopup();
     photograph("confirmation-single");
+    EXPECT_THAT(log.messages(), Contains("Setting confirmation_popup_share_view_single"));
+    EXPECT_THAT(log.messages(), Contains("ad->operation_type =4,g_total_recipients =1"));
+    EXPECT_STREQ(elm_object_part_text_get(ad->popup, "title,text"), "Share files via Pelliko");
+    EXPECT_EQ(body(), "To avoid additional charges, share your files via Wi-Fi only.");
+    EXPECT_EQ(layoutText("elm.text.info"), "1 file <br>(1.00KB)");
+    EXPECT_EQ(layoutText("elm.text"), "Share via Wi-Fi only");
+    EXPECT_STREQ(elm_object_text_get(button("button1")), "Cancel");
+    EXPECT_STREQ(elm_object_text_get(button("button2")), "Share");
+    EXPECT_STREQ(getRecipientListText(), "Anna Müller+SMS?");
+    EXPECT_STREQ(getRecipientIndexListText(), "31?");
+    EXPECT_TRUE(isOnScreen());
 }
 
-TEST_F(ConfirmationPopup, LooksForSeveralRecipients)
+TEST_F(ConfirmationPopup, SeveralRecipientsGetAHeadingAndARow)
 {
     unsupported_file_count = 2;
-    const std::string photo = PELLIKO_BUILD_DIR "/app/shared/res/com.velmora.pelliko.png";
-    share(4, 3 << 20, {{"Maximiliana von Hohenstein-Wernigerode", true}, {"Ωμέγα Παπαδοπούλου", false, photo}, {"Анна Каренина", true}, {"Bo"}, {"محمد", true}, {"Zoë & <b>Co</b>"}});
-    _createPopupView(ad);
-    ASSERT_TRUE(settle(button("button2")));
+    const std::string photo =
+        "/opt/usr/apps/com.velmora.pelliko/shared/res/com.velmora.pelliko.png";
+    share(4, 3 << 20,
+          {{"Maximiliana von Hohenstein-Wernigerode", true},
+           {"Ωμέγα Παπαδοπούλου", false, photo},
+           {"Анна Каренина", true},
+           {"Bo"},
+           {"محمد", true},
+           {"Zoë & <b>Co</b>", false, "/nowhere.png"}});
+    openPopup();
     photograph("confirmation-several");
+    EXPECT_EQ(layoutText("elm.swallow.label.text"), "Recipients (6)");
+    EXPECT_EQ(body(),
+              "4 files (3.00MB)<br><br>2 files are not supported and will not be shared. To "
+              "avoid additional charges, share your files via Wi-Fi only.");
+    const auto lines = log.messages();
+    EXPECT_THAT(lines, Contains("Setting confirmation_popup_share_view_multiple"));
+    EXPECT_THAT(lines, Contains("Adding recipient- name = Zoë & <b>Co</b>"));
+    EXPECT_THAT(lines, Contains("Setting recipient image = " + photo));
+    // A picture that cannot be read gives way to the default one.
+    EXPECT_EQ(std::count(lines.begin(), lines.end(),
+                         "Setting default contact image = /opt/usr/apps/com.velmora.pelliko/res/"
+                         "images/sender-images/WVGA/pk_caller_id_default.png"),
+              5);
+    EXPECT_EQ(std::count(lines.begin(), lines.end(), "Setting SMS badge."), 3);
 }
 
-TEST_F(ConfirmationPopup, LooksForReshare)
+TEST_F(ConfirmationPopup, NoRecipientGetsTheLayoutForSeveral)
+{
+    share(1, 1500, {});
+    openPopup();
+    EXPECT_THAT(log.messages(), Contains("Setting confirmation_popup_share_view_multiple"));
+    EXPECT_EQ(layoutText("elm.swallow.label.text"), "(null)");
+}
+
+TEST_F(ConfirmationPopup, ReshareAsksTheServiceForTheFilesAndShowsWhateverTheirSize)
+{
+    service.answerInfo(3, 5000000);
+    ad->action_type = ACTION_RESHARE_UPLOAD;
+    ad->req_id_to_reshare = 5;
+    share(0, 0, {{"Anna Müller", true}, {"Bob"}});
+    openPopup();
+    photograph("confirmation-reshare");
+    EXPECT_THAT(service.calls(), ::testing::ElementsAre("GetUploadInfo (5,)"));
+    EXPECT_EQ(ad->upload_item->files_count, 3);
+    EXPECT_EQ(ad->upload_item->files_size, 5000000);
+    EXPECT_EQ(body(), "3 files (4.77MB)<br><br>Tap Share to share again. The files are already on "
+                      "the server, so there are no data charges.");
+    EXPECT_THAT(log.messages(), Contains("Setting confirmation_popup_reshare_view_multiple"));
+}
+
+TEST_F(ConfirmationPopup, ReshareKeepsTheParsedFiguresWhenTheServiceDoesNotKnow)
 {
     ad->action_type = ACTION_RESHARE_UPLOAD;
     ad->req_id_to_reshare = 5;
-    share(3, 5000000, {{"Anna Müller", true}, {"Bob"}});
-    _createPopupView(ad);
-    ASSERT_TRUE(settle(button("button2")));
-    photograph("confirmation-reshare");
+    share(2, 4096, {{"Anna"}});
+    openPopup();
+    EXPECT_EQ(ad->upload_item->files_count, 2);
+    EXPECT_EQ(layoutText("elm.text.info"), "2 files <br>(4.00KB)");
+    EXPECT_THAT(log.messages(), Contains("Setting confirmation_popup_reshare_view_single"));
+    EXPECT_THAT(log.messages(), Contains("pelliko_upload_info_get_handle failed. Error = -1"));
 }
 
-TEST_F(ConfirmationPopup, LooksInGerman)
+TEST_F(ConfirmationPopup, LanguageChangeRetextsTheOpenPopup)
 {
-    speak("de_DE.UTF-8");
     unsupported_file_count = 1;
     share(2, 1500000, {{"Anna Müller", true}});
-    _createPopupView(ad);
+    openPopup();
+    Evas_Object *popup = ad->popup;
+    speak("de_DE.UTF-8");
     ASSERT_TRUE(settle(button("button2")));
     photograph("confirmation-german");
-    Evas_Object *l = elm_object_part_content_get(ad->popup_layout, "elm.swallow.box");
-    int w,h; evas_object_size_hint_min_get(l,&w,&h); fprintf(stderr,"LABEL min %d %d box %d %d\n",w,h,boxOf(l).width,boxOf(l).height);
-    evas_object_size_hint_min_get(ad->popup_layout,&w,&h); fprintf(stderr,"LAYOUT min %d %d box %d %d\n",w,h,boxOf(ad->popup_layout).width,boxOf(ad->popup_layout).height);
-    edje_object_size_min_calc(elm_layout_edje_get(ad->popup_layout),&w,&h);fprintf(stderr,"LAYOUT calc %d %d\n",w,h);
+    EXPECT_EQ(ad->popup, popup);
+    EXPECT_STREQ(elm_object_part_text_get(ad->popup, "title,text"), "Dateien über Pelliko teilen");
+    EXPECT_EQ(body(),
+              "1 Datei wird nicht unterstützt und nicht geteilt. Teilen Sie Ihre Dateien nur "
+              "über WLAN, um zusätzliche Kosten zu vermeiden.");
+    EXPECT_EQ(layoutText("elm.text.info"), "2 Dateien <br>(1,43MB)");
+    EXPECT_EQ(layoutText("elm.text"), "Nur über WLAN teilen");
+    EXPECT_STREQ(elm_object_text_get(button("button1")), "Abbrechen");
+    EXPECT_STREQ(elm_object_text_get(button("button2")), "Teilen");
+}
+
+TEST_F(ConfirmationPopup, WholeRowOfTheCheckBoxAnswersToThePointer)
+{
+    share(1, 1500, {{"Anna"}});
+    openPopup();
+    EXPECT_EQ(ad->wifi_check, 0);
+    const Box layout = boxOf(ad->popup_layout), check = boxOf(ad->wifi_check_box);
+    pressAt(layout.x + layout.width - 24, check.y + check.height / 2);
+    EXPECT_TRUE(waitUntil([this] { return ad->wifi_check == 1; }));
+    EXPECT_TRUE(elm_check_state_get(ad->wifi_check_box));
+    photograph("confirmation-wifi-only");
+    press(ad->wifi_check_box);
+    EXPECT_TRUE(waitUntil([this] { return ad->wifi_check == 0; }));
+    EXPECT_FALSE(elm_check_state_get(ad->wifi_check_box));
+}
+
+TEST_F(ConfirmationPopup, CheckBoxAnswersToTheKeyboard)
+{
+    share(1, 1500, {{"Anna"}});
+    openPopup();
+    elm_object_focus_set(ad->wifi_check_box, EINA_TRUE);
+    pressKey("space");
+    EXPECT_TRUE(waitUntil([this] { return ad->wifi_check == 1; }));
+    EXPECT_TRUE(elm_check_state_get(ad->wifi_check_box));
+}
+
+TEST_F(ConfirmationPopup, RotationRebuildsThePopupAndKeepsTheBox)
+{
+    contacts_connect();
+    share(1, 1500, {});
+    ad->number_id_count = 0;
+    bypassContactView(ad);
+    ASSERT_TRUE(settle(button("button2")));
+    for (const uint8_t wifi_only : {1, 0}) {
+        press(ad->wifi_check_box);
+        ASSERT_TRUE(waitUntil([&] { return ad->wifi_check == wifi_only; }));
+        const Evas_Object *before = ad->popup;
+        evas_object_smart_callback_call(ad->win, "wm,rotation,changed", nullptr);
+        EXPECT_NE(ad->popup, before);
+        EXPECT_EQ(ad->wifi_check, wifi_only);
+        EXPECT_EQ(elm_check_state_get(ad->wifi_check_box), wifi_only);
+        ASSERT_TRUE(settle(button("button2")));
+    }
+    EXPECT_THAT(log.messages(), Contains("ad->wifi_check = 1"));
+}
+
+TEST_F(ConfirmationPopup, NextShareStartsUncheckedAndListensOnce)
+{
+    contacts_connect();
+    share(1, 1500, {});
+    bypassContactView(ad);
+    ad->wifi_check = 1;
+    evas_object_smart_callback_call(ad->win, "wm,rotation,changed", nullptr);
+    bypassContactView(ad);
+    EXPECT_EQ(ad->wifi_check, 0);
+    log.restart();
+    evas_object_smart_callback_call(ad->win, "wm,rotation,changed", nullptr);
+    const auto lines = log.messages();
+    EXPECT_EQ(std::count(lines.begin(), lines.end(), "ad->wifi_check = 0"), 1);
+}
+
+TEST_F(ConfirmationPopup, CancelForgetsTheChoiceAndLeaves)
+{
+    share(1, 1500, {{"Anna"}});
+    openPopup();
+    ad->wifi_check = 1;
+    press(button("button1"));
+    ASSERT_TRUE(closes());
+    expectNothingLeft();
+    EXPECT_EQ(ad->wifi_check, 0);
+    EXPECT_EQ(log.messages().back(), "No upload_data request id exist so app is exiting");
+}
+
+TEST_F(ConfirmationPopup, CancelHidesTheWindowWhileAnUploadIsPending)
+{
+    addUploadNotiDataNode()->request_id = 3;
+    share(1, 1500, {{"Anna"}});
+    openPopup();
+    press(button("button1"));
+    ASSERT_TRUE(closes());
+    EXPECT_FALSE(isOnScreen());
+    EXPECT_EQ(log.messages().back(), "upload_data request id is not 0 app can't exit");
+}
+
+TEST_F(ConfirmationPopup, BackKeyClosesAndLeaves)
+{
+    is_noti_pressed = 1;
+    share(1, 1500, {{"Anna"}});
+    openPopup();
+    pressKey("Escape");
+    ASSERT_TRUE(closes());
+    expectNothingLeft();
+    EXPECT_EQ(is_noti_pressed, 0);
+    EXPECT_EQ(log.messages().back(), "No upload_data request id exist so app is exiting");
+}
+
+TEST_F(ConfirmationPopup, BackKeyKeepsTheTapWhileTheShareIsFinished)
+{
+    is_noti_pressed = 1;
+    share(1, 1500, {{"Anna"}});
+    ad->upload_item->request_id = 9;
+    UploadNotiData *node = addUploadNotiDataNode();
+    node->request_id = 9;
+    node->upload_status = 7;
+    openPopup();
+    pressKey("XF86Back");
+    ASSERT_TRUE(closes());
+    EXPECT_EQ(is_noti_pressed, 1);
+    is_noti_pressed = 0;
+}
+
+TEST_F(ConfirmationPopup, ClosingTheWindowIsTheBackKey)
+{
+    contacts_connect();
+    share(1, 1500, {});
+    bypassContactView(ad);
+    evas_object_smart_callback_call(ad->win, "delete,request", nullptr);
+    expectNothingLeft();
+    EXPECT_EQ(log.messages().back(), "No upload_data request id exist so app is exiting");
+}
+
+TEST_F(ConfirmationPopup, DeletedWindowTakesEverythingAlong)
+{
+    share(1, 1500, {{"Anna"}});
+    openPopup();
+    evas_object_del(ad->win);
+    EXPECT_EQ(ad->win, nullptr);
+    expectNothingLeft();
+}
+
+TEST_F(ConfirmationPopup, PopupAfterHidingIsVisibleAgain)
+{
+    _hideWindow(ad);
+    EXPECT_FALSE(isOnScreen());
+    share(1, 1500, {{"Anna"}});
+    openPopup();
+    EXPECT_TRUE(isOnScreen());
+    press(button("button1"));
+    EXPECT_TRUE(closes());
+}
+
+TEST_F(ConfirmationPopup, ShareHandsTheFilesOverAndHides)
+{
+    service.answerRequests(0, 7);
+    share(1, 1500, {{"Ann"}});
+    ad->upload_item->files = eina_list_append(nullptr, g_strdup("/a/b.jpg"));
+    openPopup();
+    setRecipientTexts("Somebody else?", "99?"); // a report about another upload came in between
+    press(button("button2"));
+    ASSERT_TRUE(closes());
+    expectNothingLeft();
+    EXPECT_FALSE(isOnScreen());
+    EXPECT_THAT(service.calls(),
+                ::testing::ElementsAre("RequestUpload ((1, 0), [('', '+447700900123', 31)], "
+                                       "[b'/a/b.jpg'], false)"));
+    ASSERT_NE(g_upload_noti_data_list, nullptr);
+    EXPECT_EQ(g_upload_noti_data_list->request_id, 7);
+    EXPECT_EQ(g_upload_noti_data_list->upload_status, 2);
+    EXPECT_STREQ(g_upload_noti_data_list->recipient_list, "Ann?");
+    EXPECT_STREQ(g_upload_noti_data_list->recipient_index_list, "31?");
+    const auto lines = log.messages();
+    EXPECT_THAT(lines, Contains("Action type is ACTION_UPLOAD"));
+    EXPECT_EQ(lines.back(), "uploadStart ret = 0");
+}
+
+TEST_F(ConfirmationPopup, ReshareTakesTheNodeOfTheNewRequest)
+{
+    service.answerInfo(3, 5000);
+    service.answerRequests(0, 8);
+    ad->action_type = ACTION_RESHARE_UPLOAD;
+    ad->req_id_to_reshare = 5;
+    share(0, 0, {{"Ann"}});
+    openPopup();
+    press(button("button2"));
+    ASSERT_TRUE(closes());
+    EXPECT_EQ(service.calls().back(),
+              "RequestReshare ((1, 0), [('', '+447700900123', 31)], 5, false)");
+    UploadNotiData *node = getUploadNotiDataNode(8);
+    ASSERT_NE(node, nullptr);
+    EXPECT_EQ(node->upload_status, 2);
+    EXPECT_EQ(node->total_files, 3);
+    EXPECT_EQ(log.messages()[log.messages().size() - 2], "reshareUploadStart ret = 0");
+}
+
+TEST_F(ConfirmationPopup, EmptyShareStartsWithoutAsking)
+{
+    service.answerRequests(0, 7);
+    share(1, 0, {{"Ann"}});
+    ad->upload_item->files = eina_list_append(nullptr, g_strdup("/a/b.jpg"));
+    _createPopupView(ad);
+    expectNothingLeft();
+    EXPECT_FALSE(isOnScreen());
+    EXPECT_EQ(service.calls().size(), 1U);
+    EXPECT_THAT(log.messages(),
+                Contains("6MB limit not exceeded. Bypassing Confirmation popup view"));
+}
+
+TEST_F(ConfirmationPopup, ServerErrorEndsTheApplicationOnceThePopupIsGone)
+{
+    service.answerRequests(-16);
+    share(1, 1500, {{"Ann"}});
+    ad->upload_item->files = eina_list_append(nullptr, g_strdup("/a/b.jpg"));
+    openPopup();
+    press(button("button2"));
+    ASSERT_TRUE(closes());
+    EXPECT_EQ(g_upload_noti_data_list, nullptr);
+    const auto lines = log.messages();
+    EXPECT_THAT(lines, Contains("Upload error, ret = -16"));
+    EXPECT_THAT(lines, Contains("Popup is open.. can't exit"));
+    EXPECT_EQ(lines.back(), "No upload_data request id exist so app is exiting");
+}
+
+TEST_F(ConfirmationPopup, RefusedShareLeavesOlderUploadsAlone)
+{
+    service.answerRequests(-5);
+    addUploadNotiDataNode()->request_id = 3;
+    share(1, 1500, {{"Ann"}});
+    ad->upload_item->files = eina_list_append(nullptr, g_strdup("/a/b.jpg"));
+    openPopup();
+    press(button("button2"));
+    ASSERT_TRUE(closes());
+    ASSERT_NE(g_upload_noti_data_list, nullptr);
+    EXPECT_EQ(g_upload_noti_data_list->request_id, 3);
+    EXPECT_EQ(g_upload_noti_data_list->next, nullptr);
+    EXPECT_EQ(log.messages().back(), "upload_data request id is not 0 app can't exit");
+}
+
+TEST_F(ConfirmationPopup, StartingServiceOpensTheShareFailurePopupAndOkLeaves)
+{
+    service.beInitializing();
+    share(1, 1500, {{"Ann"}});
+    ad->upload_item->files = eina_list_append(nullptr, g_strdup("/a/b.jpg"));
+    openPopup();
+    press(button("button2"));
+    ASSERT_TRUE(closes());
+    EXPECT_TRUE(isOnScreen());
+    EXPECT_EQ(g_upload_noti_data_list, nullptr);
+    EXPECT_THAT(log.messages(), Contains("Error - PELLIKO_ERROR_SERVICE_INITIALIZING"));
+    EXPECT_THAT(log.messages(), Not(Contains(HasSubstr("exit"))));
+    pressKey("Escape");
+    EXPECT_TRUE(waitUntil([this] {
+        return log.messages().back() == "No upload_data request id exist so app is exiting";
+    }));
+}
+
+TEST_F(ConfirmationPopup, NullRecordMeansTheApplicationsOwn)
+{
+    share(1, 1500, {{"Anna"}});
+    log.restart();
+    _createPopupView(nullptr);
+    EXPECT_NE(ad->popup, nullptr);
+    EXPECT_EQ(log.messages().front(), "ERROR : ad is NULL");
+    bypassContactView(nullptr);
+    EXPECT_EQ(log.messages().back(), "data is NULL");
 }
 
 } // namespace
