@@ -1,8 +1,9 @@
 // Handles and their simple attributes.
 #include "Guard.h"
 #include "Handle.h"
+#include "notification.h"
 
-using pelliko::notification::guarded;
+using pelliko::platform::guarded;
 
 namespace
 {

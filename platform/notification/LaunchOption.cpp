@@ -2,9 +2,10 @@
 #include "Guard.h"
 #include "Handle.h"
 #include "Serialisation.h"
+#include "notification.h"
 
-using pelliko::notification::guarded;
 using pelliko::notification::Variant;
+using pelliko::platform::guarded;
 
 extern "C" {
 

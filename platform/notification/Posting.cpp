@@ -3,8 +3,10 @@
 #include "Guard.h"
 #include "Handle.h"
 #include "PanelClient.h"
+#include "notification.h"
 
 using namespace pelliko::notification;
+using pelliko::platform::guarded;
 
 namespace
 {

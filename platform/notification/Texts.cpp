@@ -3,10 +3,11 @@
 
 #include "Guard.h"
 #include "Handle.h"
+#include "notification.h"
 
-using pelliko::notification::guarded;
 using pelliko::notification::Text;
 using pelliko::notification::Variant;
+using pelliko::platform::guarded;
 
 namespace
 {
