@@ -10,10 +10,27 @@ namespace pelliko::test
 namespace
 {
 
-Eina_Bool _timeoutCb(void *data)
+struct Wait {
+    const std::function<bool()> &condition;
+    bool holds = false;
+    bool late = false;
+};
+
+// Before the loop sleeps: everything that had happened is handled.
+Eina_Bool _lookCb(void *data)
 {
-    *static_cast<bool *>(data) = true;
-    return ECORE_CALLBACK_CANCEL;
+    auto &wait = *static_cast<Wait *>(data);
+    wait.holds = wait.condition();
+    if (wait.holds)
+        ecore_main_loop_quit();
+    return ECORE_CALLBACK_RENEW;
+}
+
+Eina_Bool _lateCb(void *data)
+{
+    static_cast<Wait *>(data)->late = true;
+    ecore_main_loop_quit();
+    return ECORE_CALLBACK_RENEW;
 }
 
 void _reachedCb(void *data)
@@ -37,16 +54,15 @@ MainLoop &MainLoop::instance()
 
 bool MainLoop::runUntil(const std::function<bool()> &condition, double seconds)
 {
-    bool late = false;
-    Ecore_Timer *timer = ecore_timer_add(seconds, _timeoutCb, &late);
-    bool holds = condition();
-    while (!holds && !late) {
-        ecore_main_loop_iterate_may_block(1);
-        holds = condition();
-    }
-    if (!late)
-        ecore_timer_del(timer);
-    return holds;
+    Wait wait{condition};
+    Ecore_Idle_Enterer *look = ecore_idle_enterer_add(_lookCb, &wait);
+    Ecore_Timer *timer = ecore_timer_add(seconds, _lateCb, &wait);
+    // The application's own wish to leave ends one round, not the wait.
+    while (!wait.holds && !wait.late)
+        ecore_main_loop_begin();
+    ecore_timer_del(timer);
+    ecore_idle_enterer_del(look);
+    return wait.holds;
 }
 
 void MainLoop::settle()
