@@ -99,7 +99,11 @@ void addServe(CLI::App &app, ServeOptions &options)
         ->capture_default_str();
     command->add_option("--ready-fd", options.config.readyFd,
                         "Descriptor that gets the server's address once it accepts connections");
-    command->set_config("--config", "", "File with these options as lines of name = value");
+    // The library reads a file only for the whole program: its [serve] section holds these options.
+    app.set_config("--config", "", "File with options of serve, name = value under [serve]");
+    app.allow_config_extras(CLI::config_extras_mode::error);
+    command->fallthrough();
+    command->footer("--config FILE reads these options from the file's section [serve].");
 }
 
 void addAccount(CLI::App &app, AccountOptions &options)

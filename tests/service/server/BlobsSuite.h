@@ -1,0 +1,32 @@
+#pragma once
+
+#include "store/Blobs.h"
+
+#include <gtest/gtest.h>
+
+#include <functional>
+#include <memory>
+#include <string>
+
+namespace pelliko::server
+{
+
+struct BlobsMaker {
+    std::string name;
+    std::function<std::unique_ptr<Blobs>()> fresh;
+    std::function<std::unique_ptr<Blobs>()> again;
+};
+
+/// What every blob store has to do. A new implementation instantiates this suite with a maker.
+class BlobsSuite : public testing::TestWithParam<BlobsMaker>
+{
+protected:
+    void SetUp() override { m_store = GetParam().fresh(); }
+
+    /// The blob's bytes, or "(absent)".
+    static std::string contentOf(Blobs &blobs, const std::string &key);
+
+    std::unique_ptr<Blobs> m_store;
+};
+
+} // namespace pelliko::server

@@ -1,0 +1,96 @@
+"""What a recipient sees: page, files, ranges, the zip of all."""
+
+import io
+import os
+import zipfile
+from urllib.parse import quote
+
+from harness import ServerCase
+
+
+class Downloads(ServerCase):
+    def test_page_headers_keep_browsers_in_bounds(self):
+        _, link = self.make_finished(b"12345")
+        for path in [link, "/s/unknown"]:
+            headers = self.get(path).headers
+            self.assertEqual(headers["Content-Type"], "text/html; charset=utf-8")
+            self.assertIn("default-src 'none'; style-src 'sha256-",
+                          headers["Content-Security-Policy"])
+            self.assertEqual(headers["X-Content-Type-Options"], "nosniff")
+            self.assertEqual(headers["X-Frame-Options"], "DENY")
+            self.assertEqual(headers["Referrer-Policy"], "no-referrer")
+            self.assertIn("noindex", headers["X-Robots-Tag"])
+
+    def test_a_file_is_an_attachment_with_its_bytes(self):
+        content = os.urandom(3000000)
+        _, link = self.make_finished(content, b"", names=["ü \"1\".jpg", "empty"])
+        answer = self.get(link + "/0")
+        self.assertEqual((answer.status, answer.body), (200, content))
+        self.assertEqual(answer.headers["Content-Disposition"],
+                         "attachment; filename=\"_ _1_.jpg\"; filename*=UTF-8''" +
+                         quote("ü \"1\".jpg"))
+        self.assertEqual(answer.headers["Accept-Ranges"], "bytes")
+        self.assertEqual(self.get(link + "/1").body, b"")
+
+    def test_head_has_the_length_and_no_body(self):
+        _, link = self.make_finished(b"12345")
+        for path in [link, link + "/0", link + "/all.zip"]:
+            answer = self.request("HEAD", path, token=False)
+            self.assertEqual((answer.status, answer.body), (200, b""))
+        self.assertEqual(self.request("HEAD", link + "/0").headers["Content-Length"], "5")
+
+    def test_ranges(self):
+        _, link = self.make_finished(b"0123456789")
+        for wanted, body, told in [("bytes=2-4", b"234", "bytes 2-4/10"),
+                                   ("bytes=7-", b"789", "bytes 7-9/10"),
+                                   ("bytes=-2", b"89", "bytes 8-9/10")]:
+            answer = self.get(link + "/0", Range=wanted)
+            self.assertEqual((answer.status, answer.body), (206, body))
+            self.assertEqual(answer.headers["Content-Range"], told)
+        self.assertEqual(self.get(link + "/0", Range="bytes=0-1,3-4").status, 200)
+
+    def test_if_range_and_if_none_match(self):
+        _, link = self.make_finished(b"0123456789", b"0123456789")
+        etag = self.get(link + "/0").headers["ETag"]
+        self.assertNotEqual(self.get(link + "/1").headers["ETag"], etag)
+        self.assertEqual(self.get(link + "/0", Range="bytes=1-1", If_Range=etag).status, 206)
+        self.assertEqual(self.get(link + "/0", Range="bytes=1-1", If_Range='"x"').status, 200)
+        answer = self.get(link + "/0", If_None_Match=etag)
+        self.assertEqual((answer.status, answer.body), (304, b""))
+
+    def test_unknown_links_and_files_are_pages_too(self):
+        _, link = self.make_finished(b"12345")
+        for path in ["/s/", "/s/x", "/s/" + "A" * 22, link + "/1", link + "/x", link + "/-1",
+                     link + "/0/0", link + "/99999999999999999999", "/s/../../etc/passwd",
+                     link + "/../../metadata.db", link + "/%2e%2e"]:
+            answer = self.get(path)
+            self.assertEqual(answer.status, 404, path)
+            self.assertIn(b"<h1>Nothing here</h1>", answer.body)
+
+    def test_zip_of_all_has_every_file_under_its_own_name(self):
+        contents = [os.urandom(1000000), b"two", b"", b"three"]
+        names = ["写真.jpg", "a.txt", "a.txt", "A.TXT"]
+        _, link = self.make_finished(*contents, names=names)
+        answer = self.get(link + "/all.zip")
+        self.assertEqual(answer.headers["Content-Type"], "application/zip")
+        with zipfile.ZipFile(io.BytesIO(answer.body)) as archive:
+            self.assertIsNone(archive.testzip())
+            self.assertEqual(archive.namelist(), ["写真.jpg", "a.txt", "a (2).txt", "A (3).TXT"])
+            self.assertEqual([archive.read(name) for name in archive.namelist()], contents)
+            self.assertTrue(all(i.compress_type == 0 for i in archive.infolist()))
+
+    def test_zip_for_an_old_client_ends_with_the_connection(self):
+        _, link = self.make_finished(b"1", b"2")
+        connection = self.connect()
+        connection.sendall(f"GET {link}/all.zip HTTP/1.0\r\n\r\n".encode())
+        received = b""
+        while part := connection.recv(65536):
+            received += part
+        head, body = received.split(b"\r\n\r\n", 1)
+        self.assertNotIn(b"chunked", head)
+        self.assertEqual(len(zipfile.ZipFile(io.BytesIO(body)).namelist()), 2)
+
+    def test_lost_bytes_are_not_taken_for_the_whole(self):
+        _, link = self.make_finished(b"12345")
+        os.remove(self.blob_files()[0])
+        self.assertEqual(self.get(link + "/0").status, 500)

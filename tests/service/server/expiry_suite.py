@@ -1,0 +1,61 @@
+"""Ends of shares and of unfinished uploads, seen from outside."""
+
+import os
+import sqlite3
+import time
+
+from harness import ServerCase
+from watch import DELETED, Watch
+
+class WatchingCase(ServerCase):
+    def watch_blobs(self):
+        """Notices when the only blob is deleted."""
+        watch = Watch(os.path.dirname(self.blob_files()[0]), DELETED)
+        self.addCleanup(watch.__exit__)
+        return watch
+
+
+class Expiry(WatchingCase):
+    options = ["--share-lifetime", "3"]
+
+    def test_bytes_are_deleted_at_the_second_without_being_asked(self):
+        share, link = self.make_finished(b"12345")
+        deletions = self.watch_blobs()
+        expires = self.request("GET", "/api/v1/shares/" + share["share"]).json()["expires"]
+        self.assertEqual(self.get(link + "/0").status, 200)
+        self.assertLess(time.time(), expires)
+        deletions.wait(10)
+        self.assertGreaterEqual(time.time(), expires)
+        self.assertLess(time.time(), expires + 2)
+        self.assertEqual(self.get(link).status, 410)
+        self.assertEqual(self.blob_files(), [])
+        record = self.request("GET", "/api/v1/shares/" + share["share"]).json()
+        self.assertEqual(record["state"], "expired")
+
+    def test_what_expired_while_the_server_was_down_is_deleted_at_its_start(self):
+        self.make_finished(b"12345")
+        self.assertEqual(self.stop(), 0)
+        with sqlite3.connect(self.data + "/metadata.db") as metadata:
+            metadata.execute("UPDATE shares SET deadline = ?", [int(time.time()) - 1])
+        deletions = self.watch_blobs()
+        self.start()
+        deletions.wait(10)
+
+    def test_a_withdrawn_share_is_deleted_at_once(self):
+        share, _ = self.make_finished(b"12345")
+        deletions = self.watch_blobs()
+        self.request("DELETE", "/api/v1/shares/" + share["share"])
+        deletions.wait(10)
+
+
+class Unfinished(WatchingCase):
+    options = ["--unfinished-lifetime", "2"]
+
+    def test_an_unfinished_upload_is_given_up(self):
+        share = self.make_share(10)
+        upload = share["files"][0]["upload"]
+        self.patch(upload, 0, b"1234")
+        deletions = self.watch_blobs()
+        deletions.wait(10)
+        self.assert_refused(self.patch(upload, 4, b"5"), 410, "gone")
+        self.assertEqual(self.request("GET", "/api/v1/account").json()["used_bytes"], 4)
