@@ -175,6 +175,7 @@ TEST_F(ConfirmationPopup, WholeRowOfTheCheckBoxAnswersToThePointer)
     pressAt(layout.x + layout.width - 24, check.y + check.height / 2);
     EXPECT_TRUE(waitUntil([this] { return ad->wifi_check == 1; }));
     EXPECT_TRUE(elm_check_state_get(ad->wifi_check_box));
+    ASSERT_TRUE(settle(ad->wifi_check_box));
     photograph("confirmation-wifi-only");
     press(ad->wifi_check_box);
     EXPECT_TRUE(waitUntil([this] { return ad->wifi_check == 0; }));
