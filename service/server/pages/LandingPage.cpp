@@ -89,7 +89,7 @@ Response landingPage(const LinkRecord &link, const std::string &token)
     const Seconds deadline = link.share.deadline;
     const std::string content =
         "<h1>" + htmlEscape(title) + "</h1>\n<p class=\"soft\">" + size +
-        (single ? "" : " in all") + " &middot; available until <time datetime=\"" +
+        (single ? "" : " in all") + "</p>\n<p class=\"soft\">Available until <time datetime=\"" +
         isoDate(deadline) + "\">" + readableDate(deadline) + "</time></p>\n" +
         "<a class=\"button\" href=\"" + htmlEscape(all) + "\" download>" +
         (single ? "Download" : "Download all") + " (" + size + ")</a>\n<ul>\n" + items + "</ul>\n";
