@@ -246,3 +246,26 @@ def sha256(data):
 def sha256_of_file(path):
     with open(path, "rb") as file:
         return sha256(file.read())
+
+
+# --- the upload service -----------------------------------------------------------------------------
+
+
+def service(method, arguments=None):
+    """Calls the background service and returns what it answered."""
+    bus = Gio.bus_get_sync(Gio.BusType.SESSION)
+    return bus.call_sync(SERVICE, "/com/velmora/pelliko/Service", "com.velmora.pelliko.Service1", method,
+                         arguments, None, Gio.DBusCallFlags.NONE, int(LIMIT * 1000)).unpack()
+
+
+def requests():
+    """The service's queue and history, oldest first."""
+    return service("ListRequests")[0]
+
+
+def activation_environment(**values):
+    """Sets environment variables that programs get which the bus starts from now on."""
+    bus = Gio.bus_get_sync(Gio.BusType.SESSION)
+    bus.call_sync("org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DBus",
+                  "UpdateActivationEnvironment", GLib.Variant("(a{ss})", (values,)), None,
+                  Gio.DBusCallFlags.NONE, 5000)
