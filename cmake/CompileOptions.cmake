@@ -33,7 +33,7 @@ set(CMAKE_C_FLAGS_RELWITHDEBINFO "-O2 -g1")
 add_library(pelliko_warnings INTERFACE)
 target_compile_options(pelliko_warnings INTERFACE
   -Wall -Wextra -Wpedantic -Werror
-  -Wshadow -Wformat=2 -Wnull-dereference -Wundef -Wimplicit-fallthrough
+  -Wshadow -Wformat=2 -Wundef -Wimplicit-fallthrough
   $<$<COMPILE_LANGUAGE:CXX>:-Wnon-virtual-dtor -Woverloaded-virtual -Wextra-semi -Wold-style-cast
     -Wcast-qual -Wsuggest-override>)
 
