@@ -224,7 +224,7 @@ def download_all(link):
         page.feed(answer.read().decode("utf-8"))
     files = {}
     for target in dict.fromkeys(page.targets):
-        address = urllib.parse.urljoin(link + "/", target)
+        address = urllib.parse.urljoin(link, target)
         if not re.search(r"/s/[A-Za-z0-9_-]{22}/\d+$", urllib.parse.urlsplit(address).path):
             continue
         with urllib.request.urlopen(address, timeout=LIMIT) as answer:

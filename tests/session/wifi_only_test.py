@@ -15,7 +15,7 @@ class WifiOnly(share_case.ShareCase):
         data = share_case.random_bytes(200_000)
         world.share([self.file("map.png", data)], [world.add_contact("Ann Example", "+44 7700 900123")])
         screen.wait_for_control("Share", "button")
-        screen.press("Share via Wi-Fi only")
+        screen.press("Share via Wi-Fi only", "check box")
         self.picture("ticked")
         screen.press("Share", "button")
         self.wait_posted("Sending paused")
