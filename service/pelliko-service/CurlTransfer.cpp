@@ -12,6 +12,8 @@ namespace
 constexpr long connectSeconds = 20;
 constexpr long stallSeconds = 60; // without a byte in either direction
 constexpr long bufferBytes = 512L * 1024;
+constexpr long smallestBufferBytes = 16L * 1024; // libcurl's own lower bound
+constexpr int64_t limitedBuffersPerSecond = 20;  // a limited transfer moves in small steps
 constexpr size_t longestAnswer = 1024UL * 1024;
 constexpr std::chrono::milliseconds reportInterval{100};
 
@@ -33,6 +35,15 @@ std::string failureName(CURLcode result)
     }
 }
 
+long bufferSize(int64_t sendRate)
+{
+    if (sendRate <= 0) {
+        return bufferBytes;
+    }
+    return std::clamp(static_cast<long>(sendRate / limitedBuffersPerSecond), smallestBufferBytes,
+                      bufferBytes);
+}
+
 std::string trimmed(const std::string &text)
 {
     const auto first = text.find_first_not_of(" \t\r\n");
@@ -41,9 +52,10 @@ std::string trimmed(const std::string &text)
 }
 } // namespace
 
-CurlTransfer::CurlTransfer(uint64_t number, HttpRequest request, Progress progress)
+CurlTransfer::CurlTransfer(uint64_t number, HttpRequest request, Progress progress,
+                           int64_t sendRate)
     : number_(number), request_(std::move(request)), progress_(std::move(progress)),
-      easy_(curl_easy_init())
+      sendRate_(sendRate), easy_(curl_easy_init())
 {
     setOptions();
     setBody();
@@ -85,7 +97,8 @@ void CurlTransfer::setBody()
         curl_easy_setopt(easy_, CURLOPT_UPLOAD, 1L);
         curl_easy_setopt(easy_, CURLOPT_INFILESIZE_LARGE,
                          static_cast<curl_off_t>(request_.range.length));
-        curl_easy_setopt(easy_, CURLOPT_UPLOAD_BUFFERSIZE, bufferBytes);
+        curl_easy_setopt(easy_, CURLOPT_UPLOAD_BUFFERSIZE, bufferSize(sendRate_));
+        curl_easy_setopt(easy_, CURLOPT_MAX_SEND_SPEED_LARGE, static_cast<curl_off_t>(sendRate_));
         curl_easy_setopt(easy_, CURLOPT_READFUNCTION, onRead);
         curl_easy_setopt(easy_, CURLOPT_READDATA, this);
         curl_easy_setopt(easy_, CURLOPT_SEEKFUNCTION, onSeek);

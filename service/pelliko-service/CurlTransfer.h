@@ -15,7 +15,8 @@ class CurlTransfer
 public:
     using Progress = std::function<void(int64_t bytesSent)>;
 
-    CurlTransfer(uint64_t number, HttpRequest request, Progress progress);
+    /** @param sendRate most bytes a second of the body, 0 for no limit */
+    CurlTransfer(uint64_t number, HttpRequest request, Progress progress, int64_t sendRate);
     ~CurlTransfer();
     CurlTransfer(const CurlTransfer &) = delete;
     CurlTransfer &operator=(const CurlTransfer &) = delete;
@@ -38,6 +39,7 @@ private:
     uint64_t number_;
     HttpRequest request_;
     Progress progress_;
+    int64_t sendRate_;
     CURL *easy_;
     curl_slist *headers_ = nullptr;
     int64_t position_ = 0; // within the range

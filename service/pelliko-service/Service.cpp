@@ -21,7 +21,8 @@ class Engine : public Orphans
 public:
     Engine(const Settings &settings, GDBusConnection *bus, ServiceObject &object,
            std::unique_ptr<UploadQueue> queue)
-        : queue_(std::move(queue)), gate_([this] { uploads_.networkChanged(); }),
+        : queue_(std::move(queue)), http_(settings.sendRate),
+          gate_([this] { uploads_.networkChanged(); }),
           launcher_(bus, [this] { resume_.applicationGone(); }),
           context_{*queue_,
                    http_,

@@ -44,8 +44,9 @@ void onMainLoop(Task task)
 class TransferThread::Loop
 {
 public:
-    explicit Loop(std::weak_ptr<TransferThread *> owner)
-        : owner_(std::move(owner)), multi_(curl_multi_init()), thread_([this] { run(); })
+    Loop(std::weak_ptr<TransferThread *> owner, int64_t sendRate)
+        : owner_(std::move(owner)), sendRate_(sendRate), multi_(curl_multi_init()),
+          thread_([this] { run(); })
     {
     }
 
@@ -115,9 +116,11 @@ private:
     void begin(uint64_t number, HttpRequest request)
     {
         auto transfer = std::make_unique<CurlTransfer>(
-            number, std::move(request), [this, number](int64_t sent) {
+            number, std::move(request),
+            [this, number](int64_t sent) {
                 post([number, sent](TransferThread &owner) { owner.onProgress(number, sent); });
-            });
+            },
+            sendRate_);
         curl_multi_add_handle(multi_, transfer->handle());
         transfers_[number] = std::move(transfer);
     }
@@ -159,6 +162,7 @@ private:
     }
 
     std::weak_ptr<TransferThread *> owner_;
+    int64_t sendRate_;
     std::mutex mutex_;
     std::vector<Task> orders_;
     bool stop_ = false;
@@ -167,11 +171,11 @@ private:
     std::thread thread_;
 };
 
-TransferThread::TransferThread() : self_(std::make_shared<TransferThread *>(this))
+TransferThread::TransferThread(int64_t sendRate) : self_(std::make_shared<TransferThread *>(this))
 {
     static std::once_flag once;
     std::call_once(once, [] { curl_global_init(CURL_GLOBAL_DEFAULT); });
-    loop_ = std::make_unique<Loop>(self_);
+    loop_ = std::make_unique<Loop>(self_, sendRate);
 }
 
 TransferThread::~TransferThread() = default;

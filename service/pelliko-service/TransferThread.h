@@ -12,7 +12,8 @@ namespace pelliko::service
 class TransferThread : public HttpSender
 {
 public:
-    TransferThread();
+    /** @param sendRate most bytes a second of one transfer, 0 for no limit */
+    explicit TransferThread(int64_t sendRate);
     ~TransferThread() override;
 
     uint64_t send(HttpRequest request, Progress progress, Done done) override;

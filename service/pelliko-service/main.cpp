@@ -26,6 +26,11 @@ void addSettings(CLI::App &app, Settings &settings)
     time("--longest-retry", settings.longestRetryMs, "Longest wait after a failed transfer (ms)");
     time("--give-up", settings.giveUpMs, "Time without success that ends a request (ms)");
     time("--chunk", settings.chunkBytes, "Most bytes of one append");
+    app.add_option("--rate", settings.sendRate,
+                   "Most bytes a second of one transfer, 0 for no limit")
+        ->check(CLI::NonNegativeNumber)
+        ->envname("PELLIKO_UPLOAD_RATE")
+        ->capture_default_str();
     time("--first-launch-retry", settings.firstLaunchRetryMs,
          "First wait after a failed launch of the application (ms)");
     time("--longest-launch-retry", settings.longestLaunchRetryMs,

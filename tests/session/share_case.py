@@ -25,11 +25,19 @@ class ShareCase(unittest.TestCase):
     def setUp(self):
         self.folder = os.path.join(os.environ["PELLIKO_STATE"], "files", self._testMethodName)
         os.makedirs(self.folder)
-        self.panel = world.Stream("quickpanel-tool", "watch")
+        screen.announce_reader()
+        self.panel = self._watch_panel()
         self.outbox = world.Follower(os.environ["PELLIKO_SMS_OUTBOX"])
         self.outbox.read()
         self.messages_before = len(self.outbox.lines)
         self.application = world.BusName(world.APP)
+
+    @staticmethod
+    def _watch_panel():
+        """The panel's events from now on; reading starts before anything is launched."""
+        past = [world.json.loads(line) for line in world.run("quickpanel-tool", "history", "--json").splitlines()]
+        last = past[-1]["seq"] if past else 0
+        return world.Stream("quickpanel-tool", "watch", "--since", str(last))
 
     def tearDown(self):
         self.panel.close()

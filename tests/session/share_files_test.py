@@ -14,7 +14,7 @@ class ShareFiles(share_case.ShareCase):
         world.share([path], ids)
         self.confirm()
         sent = self.wait_sent_and_gone()
-        self.assertEqual("1 succeeded", sent["content"])
+        self.assertEqual("Succeeded: 1", sent["content"])
         messages = self.messages(2)
         self.assertEqual(["+447700900123", "+447700900456"], [m["to"] for m in messages])
         self.assertEqual(1, len({m["text"] for m in messages}), "every recipient gets the same text")
@@ -29,7 +29,7 @@ class ShareFiles(share_case.ShareCase):
         world.share(paths, [number_id])
         self.confirm()
         sent = self.wait_sent_and_gone()
-        self.assertEqual("100 succeeded", sent["content"])
+        self.assertEqual("Succeeded: 100", sent["content"])
         self.assert_downloads_equal(self.messages(1)[0], files)
         self.assertEqual([], self.pending_rows())
 
