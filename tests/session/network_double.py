@@ -1,10 +1,13 @@
 """A NetworkManager on the world's system bus whose state a test decides: online, metered or not."""
 
+import os
 import subprocess
+import sys
 
-from gi.repository import Gio, GLib
+sys.path.insert(0, os.path.join(os.path.dirname(os.path.abspath(__file__)), "..", "..", "scripts", "lib"))
 
-import world
+import world  # noqa: E402
+from gi.repository import Gio, GLib  # noqa: E402
 
 NAME = "org.freedesktop.NetworkManager"
 PATH = "/org/freedesktop/NetworkManager"

@@ -12,7 +12,7 @@ class Unsupported(share_case.ShareCase):
     def wait_refused(self):
         world.wait_for(lambda: [i for i in self.panel.items if i["event"] == "toast"], "the refusal")
         self.application.wait_gone()
-        self.assertEqual([REFUSAL], [i["content"] or i["title"] for i in self.panel.items if i["event"] == "toast"])
+        self.assertEqual([REFUSAL], [i["message"] for i in self.panel.items if i["event"] == "toast"])
         self.assertEqual([], self.posted())
         self.assertEqual([], self.messages(0))
 
