@@ -9,6 +9,7 @@ import html.parser
 import json
 import os
 import re
+import signal
 import subprocess
 import urllib.parse
 import urllib.request
@@ -261,6 +262,14 @@ def service(method, arguments=None):
 def requests():
     """The service's queue and history, oldest first."""
     return service("ListRequests")[0]
+
+
+def stop_service():
+    """Ends the background service; the next call starts it with the environment of then."""
+    running = BusName(SERVICE)
+    if running.owner:
+        os.kill(running.process_id(), signal.SIGTERM)
+        running.wait_gone()
 
 
 def activation_environment(**values):

@@ -16,6 +16,7 @@ def stored_bytes():
 
 class Cancel(share_case.ShareCase):
     def test_cancelling_while_files_go_up_takes_everything_back(self):
+        world.stop_service()
         world.activation_environment(PELLIKO_UPLOAD_RATE="1000000")
         before = stored_bytes()
         path = self.file("long film.mp4", share_case.random_bytes(40_000_000))

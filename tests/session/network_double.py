@@ -40,9 +40,9 @@ class NetworkDouble:
         self.bus.call_sync(NAME, PATH, interface, method, GLib.Variant("(sa{sv})", (NAME, properties)), None,
                            Gio.DBusCallFlags.NONE, 5000)
 
+    # Every change tells the whole state, as a listener that came with an earlier double knows nothing of it.
     def set_metered(self, metered):
-        self._call("org.freedesktop.DBus.Mock", "UpdateProperties",
-                   {"Metered": GLib.Variant("u", METERED_YES if metered else METERED_NO)})
+        self._call("org.freedesktop.DBus.Mock", "UpdateProperties", self._state(metered, True))
 
     def set_online(self, online):
         self._call("org.freedesktop.DBus.Mock", "UpdateProperties", self._state(False, online))

@@ -10,6 +10,7 @@ import world
 
 class Restart(share_case.ShareCase):
     def start_slow_share(self, name, size):
+        world.stop_service()
         world.activation_environment(PELLIKO_UPLOAD_RATE="2000000")
         data = share_case.random_bytes(size)
         world.share([self.file(name, data)], [world.add_contact("Ann Example", "+44 7700 900123")])
