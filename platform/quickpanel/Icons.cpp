@@ -14,10 +14,11 @@ struct Rule {
 };
 
 // The first word that occurs in the picture's name decides.
-constexpr std::array<Rule, 5> pictures{{
+constexpr std::array<Rule, 6> pictures{{
     {"fail", "dialog-error"},
     {"error", "dialog-error"},
-    {"upload", "document-send"},
+    {"upload_complete", "pelliko-upload-complete"},
+    {"upload", "pelliko-upload"},
     {"download", "document-save"},
     {"receiv", "document-save"},
 }};
@@ -45,10 +46,9 @@ bool exists(const std::string &path)
 
 std::string drawableIcon(const std::string &image)
 {
-    // What the panel animates is work in progress.
+    // A picture of the handset's panel, animated or not, stands for the still icon of the same name.
     if (startsWith(image, "reserved:"))
-        return image.find("/ani/") != std::string::npos ? "emblem-synchronizing"
-                                                        : lookUp(pictures, image);
+        return lookUp(pictures, image);
     if (image.empty() || image.find('/') == std::string::npos || exists(image))
         return image;
     return lookUp(pictures, std::filesystem::path(image).filename());

@@ -6,6 +6,8 @@ middle of their extents, so that a button that cannot be pressed fails here too.
 
 import subprocess
 
+import Xlib.display
+import Xlib.ext.damage
 import pyatspi
 from gi.repository import Gio, GLib
 
@@ -87,8 +89,40 @@ def key(name):
     run("xdotool", "key", name)
 
 
+def wait_still(quiet=0.4, limit=5.0):
+    """Waits until nothing was drawn on the screen for `quiet` seconds, so that a picture shows no half-drawn state."""
+    display = Xlib.display.Display()
+    display.damage_query_version()
+    display.screen().root.damage_create(Xlib.ext.damage.DamageReportRawRectangles)
+    display.sync()
+    loop = GLib.MainLoop()
+    timers = {"quiet": 0}
+
+    def settle():
+        loop.quit()
+        return False
+
+    def drawn(*_):
+        while display.pending_events():
+            display.next_event()
+        GLib.source_remove(timers["quiet"])
+        timers["quiet"] = GLib.timeout_add(int(quiet * 1000), settle)
+        return True
+
+    timers["quiet"] = GLib.timeout_add(int(quiet * 1000), settle)
+    timers["limit"] = GLib.timeout_add(int(limit * 1000), settle)
+    watch = GLib.io_add_watch(display.fileno(), GLib.PRIORITY_DEFAULT, GLib.IOCondition.IN, drawn)
+    loop.run()
+    GLib.source_remove(watch)
+    for timer in timers.values():
+        if GLib.MainContext.default().find_source_by_id(timer):
+            GLib.source_remove(timer)
+    display.close()
+
+
 def screenshot(path):
-    """Saves the whole screen as a PNG."""
+    """Saves the whole screen, once it stands still, as a PNG."""
+    wait_still()
     done = subprocess.run(["import", "-window", "root", path], capture_output=True, text=True)
     if done.returncode != 0:
         raise WorldError(f"no screenshot: {done.stderr.strip()}")

@@ -19,15 +19,15 @@ TEST(Icons, AHandsetsPicturesBecomeThemedIcons)
         const char *icon;
     } table[] = {
         {"/usr/apps/com.velmora.quickpanel/shared/res/noti_icons/Common/noti_upload_complete.png",
-         "document-send"},
+         "pelliko-upload-complete"},
         {"/usr/apps/com.velmora.indicator/res/icons/Processing/b03_processing_upload_complete.png",
-         "document-send"},
+         "pelliko-upload-complete"},
         {"/usr/apps/x/noti_upload_failed.png", "dialog-error"},
         {"/usr/apps/x/noti_download_complete.png", "document-save"},
         // The folder's name says nothing about the picture.
         {"/usr/apps/upload/other.png", "dialog-information"},
-        {"reserved://quickpanel/ani/uploading", "emblem-synchronizing"},
-        {"reserved://indicator/ani/uploading", "emblem-synchronizing"},
+        {"reserved://quickpanel/ani/uploading", "pelliko-upload"},
+        {"reserved://indicator/ani/uploading", "pelliko-upload"},
     };
     for (const auto &row : table)
         EXPECT_EQ(drawableIcon(row.image), row.icon) << row.image;
