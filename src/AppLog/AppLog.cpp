@@ -1,5 +1,7 @@
 #include "AppLog/AppLog.h"
 
+#include "PellikoApp/TextFormat.h"
+
 #include <cstdarg>
 #include <cstdio>
 #include <cstdlib>
@@ -7,8 +9,10 @@
 #include <ctime>
 #include <dlog.h>
 #include <ftw.h>
+#include <langinfo.h>
 #include <memory>
 #include <mutex>
+#include <optional>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -39,8 +43,12 @@ struct CFree {
 };
 using CText = std::unique_ptr<char, CFree>;
 
+// A trace reads the same in every language: "45.500000" also where people write a comma.
 CText _format(const char *format, va_list arguments)
 {
+    std::optional<PlainNumbers> plain;
+    if (strcmp(nl_langinfo(RADIXCHAR), ".") != 0)
+        plain.emplace();
     char *text = nullptr;
     if (vasprintf(&text, format, arguments) < 0)
         text = nullptr;

@@ -108,7 +108,6 @@ int _moveBar(notification_h notification, int progress_percent)
     const int err = notification_update(notification);
     if (err != NOTIFICATION_ERROR_NONE)
         LOG_ERROR("notification_update failed [%d]", err);
-    const PlainNumbers plain;
     LOG_DEBUG("Updating progress on notification = %d with percent = %f",
               g_current_node->request_id, part);
     return 1;

@@ -35,7 +35,6 @@ struct PopupData {
 
 void _logPopupData(const PopupData &data)
 {
-    const PlainNumbers plain;
     LOG_DEBUG("status = %d, progress_percent = %f, error_code = %d", data.status,
               data.progress_percent, data.error_code);
 }
@@ -119,7 +118,6 @@ void updatePreference()
 void _updateTimestamp()
 {
     const double now = periodSeconds();
-    const PlainNumbers plain;
     if (preference_set_double(shareTimeLastKey, now) != PREFERENCE_ERROR_NONE)
         LOG_ERROR("Error in setting PREFERENCE KEY SHARE_TIME_LAST");
     else
@@ -133,7 +131,6 @@ void _updateUploadedData()
     const auto added = static_cast<uint32_t>(g_current_node->total_size);
     const auto total = static_cast<int32_t>(before + added);
     const int p_err = preference_set_int(shareTotalSizeKey, total);
-    const PlainNumbers plain;
     if (p_err != PREFERENCE_ERROR_NONE)
         LOG_ERROR(
             "Error in setting PREFERENCE SHARE_TOTAL_SIZE with share_total_size = %f, p_err = %d",

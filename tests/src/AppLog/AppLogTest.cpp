@@ -2,6 +2,7 @@
 #include "support/FileLog.h"
 #include "support/FreshProcess.h"
 
+#include <clocale>
 #include <cstdlib>
 #include <filesystem>
 #include <future>
@@ -114,6 +115,40 @@ TEST_F(AppLog, MacrosWriteTheMessageWithTheCallersPlace)
         ASSERT_EQ(log.lines().size(), 2u);
         EXPECT_THAT(log.lines()[0], HasSubstr("AppLogTest.cpp: operator()("));
         EXPECT_THAT(log.messages(), ElementsAre("one 1", "two"));
+    }));
+}
+
+std::string halfInThisLanguage()
+{
+    char text[16];
+    snprintf(text, sizeof(text), "%.1f", 0.5);
+    return text;
+}
+
+TEST_F(AppLog, NumbersHaveAPointInEveryLanguage)
+{
+    EXPECT_TRUE(holdsInFreshProcess([] {
+        ASSERT_NE(setlocale(LC_ALL, "de_DE.UTF-8"), nullptr);
+        ASSERT_EQ(halfInThisLanguage(), "0,5");
+        const FileLog log;
+        LOG_DEBUG("percent = %f", 45.5);
+        appLogWrite("AppLogTest.cpp", "write", 1, tag, "part = %.2f", 0.25);
+        EXPECT_THAT(log.messages(), ElementsAre("percent = 45.500000", "part = 0.25"));
+        EXPECT_EQ(halfInThisLanguage(), "0,5");
+    }));
+}
+
+TEST_F(AppLog, MessagesGoToThePlatformLogWithErrorsMarked)
+{
+    EXPECT_TRUE(holdsInFreshProcess([] {
+        setenv("PELLIKO_LOG_STDERR", "1", 1);
+        ::testing::internal::CaptureStderr();
+        const std::string line = std::to_string(__LINE__ + 1);
+        LOG_DEBUG("one %d", 1), LOG_ERROR("two");
+        const std::string place = "(" + std::to_string(getpid()) + "): AppLogTest.cpp: operator()(";
+        EXPECT_EQ(::testing::internal::GetCapturedStderr(), "D/PELLIKO" + place + line +
+                                                                ") > one 1\n" + "E/PELLIKO" +
+                                                                place + line + ") > [ERROR]two\n");
     }));
 }
 
