@@ -2,7 +2,9 @@
 
 #include "AppLog/AppLog.h"
 
+#include <algorithm>
 #include <cstring>
+#include <iterator>
 #include <strings.h>
 
 namespace pelliko
@@ -11,9 +13,7 @@ namespace pelliko
 namespace
 {
 
-// The order is part of the design: the first match wins, and positions stand for kinds of content
-// (0-24 video and subtitles, 25-56 audio and playlists, 57-64 images, 65-76 documents, 77-79 cards
-// and calendars).
+// The order is part of the design: the first match wins, and positions stand for kinds of content.
 constexpr const char *supported_extensions[] = {
     "mpeg",   "mpg",  "mp4",  "m4v",  "3gp",  "3gpp",  "3g2",  "3gpp2", "mkv",  "webm", //
     "ts",     "avi",  "ram",  "rm",   "rmvb", "wmv",   "asf",  "divx",  "flv",  "tp",   //
@@ -27,6 +27,10 @@ constexpr const char *supported_extensions[] = {
 constexpr int extensionCount = sizeof(supported_extensions) / sizeof(supported_extensions[0]) - 1;
 constexpr size_t sentinelLength = 7;
 
+// Where each further kind begins: video and subtitles, then audio and playlists, images, documents,
+// cards and calendars.
+constexpr int kindStarts[] = {25, 57, 65, 77};
+
 // Only as many characters as the extension has are compared: "mp" is taken for "mpeg".
 bool _matches(const char *row, const char *extension, size_t length)
 {
@@ -38,8 +42,14 @@ bool _isSentinel(const char *row)
     return strncmp(row, "invalid", sentinelLength) == 0;
 }
 
-// The first row that the extension begins; but an extension that is a row itself is that row, so
-// that "fl" is not taken for the earlier "flv".
+// Which kind of content a row stands for, counted from 0.
+auto _kindOf(int row)
+{
+    return std::upper_bound(std::begin(kindStarts), std::end(kindStarts), row) - kindStarts;
+}
+
+// The first row that the extension begins. Only when that is content of another kind the extension
+// is the row of its own name: "fl" is music, though the film type "flv" stands before it.
 int _rowOf(const char *extension)
 {
     const size_t length = strlen(extension);
@@ -47,10 +57,11 @@ int _rowOf(const char *extension)
     for (int row = 0; !_isSentinel(supported_extensions[row]); ++row) {
         if (!_matches(supported_extensions[row], extension, length))
             continue;
-        if (supported_extensions[row][length] == '\0')
-            return row;
         if (first < 0)
             first = row;
+        const bool same_name = supported_extensions[row][length] == '\0';
+        if (same_name && _kindOf(row) != _kindOf(first))
+            return row;
     }
     return first;
 }

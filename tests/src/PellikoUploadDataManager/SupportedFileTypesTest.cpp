@@ -70,11 +70,29 @@ TEST(SupportedFileTypes, LongerExtensionIsNotTakenForAShorterRow)
     EXPECT_EQ(supportedExtensionPosition("/tmp/song.fl"), 55);
 }
 
-TEST(SupportedFileTypes, RowOfItsOwnWinsOverAnEarlierLongerRow)
+TEST(SupportedFileTypes, EarlierLongerRowOfTheSameKindWins)
 {
-    EXPECT_EQ(matchOf("a.htm"), "htm");
+    EXPECT_EQ(supportedExtensionPosition("a.htm"), 75);
+    EXPECT_EQ(supportedExtensionPosition("a.m2t"), 21);
     EXPECT_EQ(matchOf("a.ht"), "html");
     EXPECT_EQ(matchOf("a.f"), "flv");
+}
+
+TEST(SupportedFileTypes, RowOfItsOwnWinsOverAnEarlierLongerRowOfAnotherKind)
+{
+    EXPECT_EQ(supportedExtensionPosition("a.fl"), 55);
+    EXPECT_EQ(supportedExtensionPosition("a.FL"), 55);
+    EXPECT_EQ(supportedExtensionPosition("a.flv"), 18);
+}
+
+TEST(SupportedFileTypes, EveryOtherRowIsFoundUnderItsOwnName)
+{
+    for (int row = 0; row < 80; ++row) {
+        const std::string name = supportedExtensionAt(row);
+        if (name == "htm" || name == "m2t")
+            continue;
+        EXPECT_EQ(supportedExtensionPosition(("a." + name).c_str()), row) << name;
+    }
 }
 
 TEST(SupportedFileTypes, SentinelIsNeverMatched)
