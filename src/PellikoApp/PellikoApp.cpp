@@ -101,8 +101,12 @@ void _replyResume(app_control_h request, const char *value)
         return;
     LOG_DEBUG("resume_by_app:%s", value);
     app_control_add_extra_data(reply, resumeReplyKey, value);
-    app_control_reply_to_launch_request(reply, request, APP_CONTROL_RESULT_SUCCEEDED);
-    LOG_DEBUG("app_control_reply_to_launch_request success");
+    const int error =
+        app_control_reply_to_launch_request(reply, request, APP_CONTROL_RESULT_SUCCEEDED);
+    if (error == APP_CONTROL_ERROR_NONE)
+        LOG_DEBUG("app_control_reply_to_launch_request success");
+    else
+        LOG_ERROR("app_control_reply_to_launch_request failed : error = %d", error);
     app_control_destroy(reply);
 }
 

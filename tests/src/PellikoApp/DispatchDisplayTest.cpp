@@ -1,5 +1,6 @@
 // The dispatcher inside the test's own process, where the record and the window can be looked at.
 #include "PellikoApp/AppData.h"
+#include "PellikoApp/Operation.h"
 #include "PellikoApp/PellikoApp.h"
 #include "PellikoUploadManager/ExitPolicy.h"
 #include "support/FileLog.h"
@@ -17,6 +18,8 @@ namespace
 
 using test::LaunchRequest;
 using ::testing::ElementsAre;
+using ::testing::IsEmpty;
+using ::testing::StartsWith;
 
 struct OpenApp : PellikoApp {
     using PellikoApp::onAppControl;
@@ -123,6 +126,40 @@ TEST_F(Dispatch, ShareEndsAResumeAndReshareIsForgottenByTheNextShare)
     EXPECT_EQ(ad->action_type, ACTION_UPLOAD);
     EXPECT_EQ(ad->operation_type, OPERATION_SHARE);
     EXPECT_EQ(ad->req_id_to_reshare, 5);
+}
+
+TEST_F(Dispatch, OperationsWithoutAMeaningDoNothing)
+{
+    for (const int32_t operation : {3, 7, 1000, -1}) {
+        ad->operation_type = operation;
+        doOperation(ad);
+    }
+    ad->operation_type = OPERATION_DEFAULT;
+    EXPECT_THAT(log.messages(), IsEmpty());
+}
+
+TEST_F(Dispatch, AcceptedPushLeavesTheWorkToItsWorker)
+{
+    ad->operation_type = OPERATION_PUSH;
+    doOperation(ad);
+    ad->operation_type = OPERATION_DEFAULT;
+    EXPECT_THAT(log.messages(), ElementsAre("Push notification."));
+}
+
+TEST_F(Dispatch, AnswerToARequestOfNobodyIsNoSuccess)
+{
+    freeUploadData(ad->upload_item);
+    ad->upload_item = nullptr;
+    LaunchRequest request; // made here: nobody waits for its answer
+    app_control_set_operation(request, APP_CONTROL_OPERATION_DEFAULT);
+    app->onAppControl(request, false);
+    EXPECT_THAT(
+        log.messages(),
+        ElementsAre(StartsWith("operation = "), "Default operation, check upload/download resume",
+                    StartsWith("data/to array len = 0, ret = "), "resume_by_app:1",
+                    StartsWith("app_control_reply_to_launch_request failed : error = -"),
+                    "Default Case...", "Resume By Reboot", "There is no resume case after reboot"));
+    ad->is_resume_by_reboot = 0;
 }
 
 TEST_F(Dispatch, EndReleasesTheTables)

@@ -120,6 +120,32 @@ TEST_F(PellikoApp, StartSaysWhatItSetsUpInOrder)
     EXPECT_EQ(messages[8], "Default Case...");
 }
 
+TEST_F(PellikoApp, StartGoesOnWithoutPreferencesAndContacts)
+{
+    const std::string state = std::string(getenv("XDG_DATA_HOME")) + "/pelliko-platform/";
+    const std::string preferences = state + "preferences", contacts = state + "contacts.db";
+    // A file where a folder is needed, a folder where a file is needed.
+    fs::rename(contacts, contacts + ".away");
+    fs::create_directory(contacts);
+    const bool had_preferences = fs::exists(preferences);
+    if (had_preferences)
+        fs::rename(preferences, preferences + ".away");
+    std::ofstream(preferences) << "no folder";
+    EXPECT_EQ(app.launch("unheard_of").status, 0);
+    fs::remove(contacts);
+    fs::rename(contacts + ".away", contacts);
+    fs::remove(preferences);
+    if (had_preferences)
+        fs::rename(preferences + ".away", preferences);
+
+    const std::vector<std::string> messages = log.messages();
+    EXPECT_EQ(
+        std::count(messages.begin(), messages.end(), "Error in preference key initialization."), 2);
+    EXPECT_THAT(messages, Contains(StartsWith("contacts_connect failed : error = -")));
+    EXPECT_EQ(messages.back(), "No need to action for operation default");
+    EXPECT_TRUE(app.running());
+}
+
 TEST_F(PellikoApp, UnknownOperationOfAFreshProcessDoesNothingAndStays)
 {
     ASSERT_EQ(app.launch("unheard_of").status, 0);

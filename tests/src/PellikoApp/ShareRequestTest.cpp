@@ -327,6 +327,28 @@ TEST_F(ShareRequest, MemoThatCannotBeWrittenIsToldAndLeaves)
                                             "Unsupported memo type. Exiting App.", exiting));
 }
 
+TEST_F(ShareRequest, MemoOnAFullDiskIsToldAndLeaves)
+{
+    // Wherever the memo of these seconds goes, nothing can be written.
+    std::vector<std::string> memos;
+    for (const int later : {0, 1, 2, 3}) {
+        const time_t then = time(nullptr) + later;
+        struct tm local = {};
+        localtime_r(&then, &local);
+        char stamp[64];
+        strftime(stamp, sizeof(stamp), "/shared/data/memo_%Y%m%d_%H%M%S.txt", &local);
+        memos.push_back(test::applicationHome + std::string(stamp));
+        fs::remove(memos.back());
+        fs::create_symlink("/dev/full", memos.back());
+    }
+    EXPECT_EQ(memo(ad, "text"), "(null)");
+    EXPECT_THAT(log.messages(), ElementsAre("memo = text", "fd write failed",
+                                            "Unsupported memo type. Exiting App.", exiting));
+    EXPECT_EQ(test::toasts().back(), deviceError);
+    for (const std::string &path : memos)
+        fs::remove(path);
+}
+
 // Recipients and ids to resume
 
 TEST_F(ShareRequest, NumberIdEndsAtTheBar)

@@ -1,8 +1,10 @@
 #include "PellikoUploadManager/ShareFailPopup.h"
 
+#include "PellikoUploadManager/UploadStatus.h"
 #include "support/PopupScene.h"
 
 #include <gmock/gmock.h>
+#include <pelliko_client.h>
 
 namespace pelliko
 {
@@ -69,6 +71,16 @@ TEST_F(ShareFailPopup, PendingUploadKeepsTheApplication)
     ASSERT_TRUE(closes());
     EXPECT_EQ(log.messages().back(), stays);
     EXPECT_FALSE(evas_object_visible_get(ad->win));
+}
+
+TEST_F(ShareFailPopup, EndOfTheLastUploadBehindItLeavesWithoutWaiting)
+{
+    addUploadNotiDataNode()->request_id = 3;
+    open();
+    uploadResponseStatusCb(PELLIKO_UPLOAD_STATUS_SHARE_FINISHED, nullptr, 100, 0, 0, 0, 3, ad);
+    EXPECT_EQ(g_upload_noti_data_list, nullptr);
+    EXPECT_THAT(log.messages(), ::testing::Contains(leaves));
+    EXPECT_THAT(log.messages(), ::testing::Not(::testing::Contains("Popup is open.. can't exit")));
 }
 
 TEST_F(ShareFailPopup, IsRetextedByALanguageChange)
