@@ -35,14 +35,20 @@ function(pelliko_program name)
   install(TARGETS ${name} RUNTIME DESTINATION ${CMAKE_INSTALL_BINDIR})
 endfunction()
 
-# pelliko_activatable(BUS_NAME PROGRAM): the bus starts PROGRAM when somebody calls BUS_NAME.
+# pelliko_activatable(BUS_NAME PROGRAM [UNIT unit]): the bus starts PROGRAM when somebody calls BUS_NAME.
+# A bus that systemd runs leaves that to the user unit, where systemd would find the installed one.
 # The build tree's file (for sessions) names the program where it was built, the installed one where it goes.
 function(pelliko_activatable bus_name program)
+  cmake_parse_arguments(arg "" "UNIT" "" ${ARGN})
+  set(SYSTEMD_SERVICE "")
   set(EXEC "${CMAKE_RUNTIME_OUTPUT_DIRECTORY}/${program}")
   set(BUS_NAME "${bus_name}")
   configure_file("${PROJECT_SOURCE_DIR}/dbus/activation.service.in"
                  "${CMAKE_BINARY_DIR}/dbus-services/${bus_name}.service" @ONLY)
   set(EXEC "${CMAKE_INSTALL_FULL_BINDIR}/${program}")
+  if(arg_UNIT AND CMAKE_INSTALL_PREFIX MATCHES "^/usr(/local)?/?$")
+    set(SYSTEMD_SERVICE "SystemdService=${arg_UNIT}\n")
+  endif()
   configure_file("${PROJECT_SOURCE_DIR}/dbus/activation.service.in"
                  "${CMAKE_CURRENT_BINARY_DIR}/${bus_name}.service" @ONLY)
   install(FILES "${CMAKE_CURRENT_BINARY_DIR}/${bus_name}.service"

@@ -19,7 +19,6 @@ public:
 
     void launchSms(const SmsLaunch &launch, std::function<void(LaunchResult)> done) override;
     void launchResume(const std::vector<int32_t> &ids, std::function<void(bool)> done) override;
-    bool applicationRuns() const override { return runs_; }
 
 private:
     static void onAppeared(GDBusConnection *, const char *, const char *, gpointer self);

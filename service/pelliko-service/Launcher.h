@@ -35,9 +35,6 @@ public:
 
     /** @param done receives whether the application answered that it takes the ids over */
     virtual void launchResume(const std::vector<int32_t> &ids, std::function<void(bool)> done) = 0;
-
-    /** Whether the application runs now. */
-    virtual bool applicationRuns() const = 0;
 };
 
 } // namespace pelliko::service

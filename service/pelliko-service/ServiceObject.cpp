@@ -9,6 +9,8 @@ namespace pelliko::service
 {
 namespace
 {
+using Invocation = GDBusMethodInvocation;
+
 constexpr const char *objectPath = "/com/velmora/pelliko/Service";
 constexpr const char *interfaceName = "com.velmora.pelliko.Service1";
 constexpr const char *initializingError = "com.velmora.pelliko.Service.Error.Initializing";
@@ -47,7 +49,8 @@ std::vector<std::string> textsOf(const char *const *texts)
 ServiceObject::ServiceObject(GDBusConnection *bus)
     : bus_(bus), skeleton_(pelliko_service1_skeleton_new())
 {
-    connect();
+    connectRequests();
+    connectReports();
     g_autoptr(GError) error = nullptr;
     if (!g_dbus_interface_skeleton_export(G_DBUS_INTERFACE_SKELETON(skeleton_), bus, objectPath,
                                           &error)) {
@@ -66,46 +69,53 @@ ServiceObject::~ServiceObject()
     g_object_unref(skeleton_);
 }
 
-void ServiceObject::connect()
+void ServiceObject::on(const char *signal, GCallback handler)
 {
-    using Self = ServiceObject;
-    using Invocation = GDBusMethodInvocation;
-    const auto on = [this](const char *signal, GCallback handler) {
-        g_signal_connect(skeleton_, signal, handler, this);
-    };
+    g_signal_connect(skeleton_, signal, handler, this);
+}
+
+void ServiceObject::connectRequests()
+{
     on("handle-request-upload",
        G_CALLBACK(+[](PellikoService1 *, Invocation *call, GVariant *, GVariant *recipients,
-                      const char *const *paths, gboolean wifiOnly, Self *self) {
+                      const char *const *paths, gboolean wifiOnly, ServiceObject *self) {
            return self->hold(call, [=, list = textsOf(paths)] {
                self->requestUpload(call, recipients, list, wifiOnly != FALSE);
            });
        }));
     on("handle-request-reshare",
        G_CALLBACK(+[](PellikoService1 *, Invocation *call, GVariant *, GVariant *recipients,
-                      gint earlier, gboolean wifiOnly, Self *self) {
+                      gint earlier, gboolean wifiOnly, ServiceObject *self) {
            return self->hold(
                call, [=] { self->requestReshare(call, recipients, earlier, wifiOnly != FALSE); });
        }));
-    on("handle-cancel", G_CALLBACK(+[](PellikoService1 *, Invocation *call, gint id, Self *self) {
+    on("handle-cancel",
+       G_CALLBACK(+[](PellikoService1 *, Invocation *call, gint id, ServiceObject *self) {
            return self->hold(call, [=] {
                pelliko_service1_complete_cancel(self->skeleton_, call, self->uploads_->cancel(id));
            });
        }));
-    on("handle-resume", G_CALLBACK(+[](PellikoService1 *, Invocation *call, gint id, Self *self) {
+}
+
+void ServiceObject::connectReports()
+{
+    on("handle-resume",
+       G_CALLBACK(+[](PellikoService1 *, Invocation *call, gint id, ServiceObject *self) {
            return self->hold(call, [=] { self->resume(call, id); });
        }));
     on("handle-confirm-end",
-       G_CALLBACK(+[](PellikoService1 *, Invocation *call, gint id, Self *self) {
+       G_CALLBACK(+[](PellikoService1 *, Invocation *call, gint id, ServiceObject *self) {
            return self->hold(call, [=] {
                self->uploads_->confirmEnd(callerOf(call), id);
                pelliko_service1_complete_confirm_end(self->skeleton_, call);
            });
        }));
     on("handle-get-upload-info",
-       G_CALLBACK(+[](PellikoService1 *, Invocation *call, gint id, Self *self) {
+       G_CALLBACK(+[](PellikoService1 *, Invocation *call, gint id, ServiceObject *self) {
            return self->hold(call, [=] { self->uploadInfo(call, id); });
        }));
-    on("handle-list-requests", G_CALLBACK(+[](PellikoService1 *, Invocation *call, Self *self) {
+    on("handle-list-requests",
+       G_CALLBACK(+[](PellikoService1 *, Invocation *call, ServiceObject *self) {
            return self->hold(call, [=] { self->listRequests(call); });
        }));
 }

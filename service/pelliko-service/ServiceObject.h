@@ -33,7 +33,9 @@ private:
         Call call;
     };
 
-    void connect();
+    void on(const char *signal, GCallback handler);
+    void connectRequests();
+    void connectReports();
     gboolean hold(GDBusMethodInvocation *invocation, Call call);
     void refuseHeld();
     void watch(const std::string &client);

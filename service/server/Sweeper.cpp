@@ -3,6 +3,7 @@
 #include <boost/asio/as_tuple.hpp>
 #include <boost/asio/use_awaitable.hpp>
 
+#include <algorithm>
 #include <chrono>
 #include <cstdio>
 #include <vector>
@@ -36,6 +37,11 @@ void Sweeper::stop()
 
 Task<void> Sweeper::run()
 {
+    try {
+        co_await removeStrays();
+    } catch (const std::exception &error) {
+        std::fprintf(stderr, "pelliko-server: looking for strays: %s\n", error.what());
+    }
     while (!m_stopped) {
         m_woken = false;
         bool failed = false;
@@ -53,6 +59,27 @@ Task<void> Sweeper::run()
     }
 }
 
+/// Bytes that the database does not know are needed by nobody: a copy of it that was put back may
+/// be older than the blobs. A blob's key is in the database before there is a file, so uploads that
+/// run meanwhile are safe. A database without accounts is rather one that still has to be put back.
+Task<void> Sweeper::removeStrays()
+{
+    const std::size_t removed = co_await m_context.pool.run([&]() -> std::size_t {
+        if (m_context.metadata.listAccounts().empty())
+            return 0;
+        std::size_t count = 0;
+        for (const std::string &key : m_context.blobs.keys()) {
+            if (!m_context.metadata.knowsBlob(key)) {
+                m_context.blobs.remove(key);
+                ++count;
+            }
+        }
+        return count;
+    });
+    if (removed > 0)
+        std::fprintf(stderr, "pelliko-server: removed %zu stray blobs\n", removed);
+}
+
 Task<void> Sweeper::sweep()
 {
     const Seconds now = m_context.now();
@@ -60,6 +87,9 @@ Task<void> Sweeper::sweep()
         co_await m_context.pool.run([&] { return m_context.metadata.expireShares(now); });
     for (const std::string &blob : ended)
         m_context.writes.stop(blob);
+    const Limits &limits = m_context.limits;
+    co_await m_context.pool.run(
+        [&] { m_context.metadata.forgetEnded(now - limits.endedKept, now - limits.dailyWindow); });
     co_await removeDoomed();
 }
 
@@ -83,8 +113,14 @@ Task<void> Sweeper::removeDoomed()
 
 Task<void> Sweeper::sleep()
 {
-    const auto next =
-        co_await m_context.pool.run([&] { return m_context.metadata.nextDeadline(); });
+    const auto next = co_await m_context.pool.run([&] {
+        const auto deadline = m_context.metadata.nextDeadline();
+        const auto ended = m_context.metadata.earliestEnd();
+        if (!ended)
+            return deadline;
+        const Seconds forget = *ended + m_context.limits.endedKept;
+        return std::optional(deadline ? std::min(*deadline, forget) : forget);
+    });
     // No suspension between this look and the wait: a wake in between cannot be lost.
     if (m_woken || m_stopped)
         co_return;

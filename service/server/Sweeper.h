@@ -22,6 +22,7 @@ public:
     void stop();
 
 private:
+    Task<void> removeStrays();
     Task<void> sweep();
     Task<void> removeDoomed();
     Task<void> sleep();

@@ -82,6 +82,11 @@ void addServe(CLI::App &app, ServeOptions &options)
                      "Seconds until an unfinished share is given up")
         ->check(CLI::PositiveNumber)
         ->capture_default_str();
+    command
+        ->add_option("--keep-ended", limits.endedKept,
+                     "Seconds for which an ended share is remembered")
+        ->check(CLI::PositiveNumber)
+        ->capture_default_str();
     command->add_option("--share-limit", limits.shareBytes, "Bytes in one share")
         ->capture_default_str();
     command->add_option("--daily-limit", limits.dailyBytes, "Bytes per account in 24 hours")
@@ -142,6 +147,8 @@ int main(int argc, char **argv)
     // Names in archives are written in the locale's encoding.
     std::setlocale(LC_CTYPE, "C.UTF-8");
     std::signal(SIGPIPE, SIG_IGN);
+    // A limit on the size of files is one more way of having no space, not a reason to die.
+    std::signal(SIGXFSZ, SIG_IGN);
     umask(077);
     CLI::App app("Share server of Pelliko: resumable uploads, links with an end, downloads.");
     app.require_subcommand(1);

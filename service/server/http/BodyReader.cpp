@@ -1,5 +1,7 @@
 #include "http/BodyReader.h"
 
+#include "http/Errors.h"
+
 #include <boost/asio/as_tuple.hpp>
 #include <boost/asio/buffer.hpp>
 #include <boost/asio/use_awaitable.hpp>
@@ -207,6 +209,11 @@ Task<std::size_t> BodyReader::readChunked(std::span<char> into)
         if (error && error != http::error::need_buffer) {
             if (state.interrupted)
                 throw Interrupted();
+            const bool malformed =
+                error.category() == http::make_error_code(http::error{}).category();
+            if (malformed && error != http::error::end_of_stream &&
+                error != http::error::partial_message)
+                throw Refusal(Error::badRequest, "The body's chunks are malformed.");
             throw Disconnected();
         }
     }

@@ -17,6 +17,8 @@ struct Limits {
     std::int64_t shareLifetime = 2 * 86400;
     /// From making a share to giving it up when it is not finished.
     std::int64_t unfinishedLifetime = 7 * 86400;
+    /// From the end of a share to the moment when its names and numbers are forgotten.
+    std::int64_t endedKept = 30 * 86400;
 };
 
 } // namespace pelliko::server

@@ -6,6 +6,7 @@
 #include <span>
 #include <string>
 #include <string_view>
+#include <vector>
 
 namespace pelliko::server
 {
@@ -18,6 +19,9 @@ public:
 
     /// Writes all of `bytes` at `offset`, which is at most the end of what is stored.
     virtual void write(std::uint64_t offset, std::string_view bytes) = 0;
+
+    /// Drops the bytes from `size` on and gives their space back.
+    virtual void truncate(std::uint64_t size) = 0;
 
     /// Returns once everything written before is on stable storage, the blob's name included.
     virtual void sync() = 0;
@@ -48,6 +52,9 @@ public:
 
     /// Null when there is no such blob.
     virtual std::unique_ptr<BlobReader> openForReading(const std::string &key) = 0;
+
+    /// The keys of all blobs that there are.
+    virtual std::vector<std::string> keys() = 0;
 
     /// Removes the blob; one that is absent is as good as removed.
     virtual void remove(const std::string &key) = 0;

@@ -85,6 +85,12 @@ public:
         }
     }
 
+    void truncate(std::uint64_t size) override
+    {
+        if (ftruncate(m_file.get(), static_cast<off_t>(size)) != 0)
+            fail("cannot shorten", m_file.path());
+    }
+
     void sync() override
     {
         if (fdatasync(m_file.get()) != 0)
@@ -164,6 +170,22 @@ std::unique_ptr<BlobReader> DirectoryBlobs::openForReading(const std::string &ke
     if (file.get() < 0)
         fail("cannot open", path);
     return std::make_unique<FileReader>(std::move(file));
+}
+
+std::vector<std::string> DirectoryBlobs::keys()
+{
+    std::vector<std::string> found;
+    try {
+        for (const auto &entry : fs::recursive_directory_iterator(m_root)) {
+            std::string name = entry.path().filename().string();
+            // What stands elsewhere, or is named otherwise, was put there by somebody else.
+            if (looksLikeToken(name) && entry.path() == pathOf(name))
+                found.push_back(std::move(name));
+        }
+    } catch (const fs::filesystem_error &error) {
+        throw StorageFailure(StorageFailure::Kind::broken, error.what());
+    }
+    return found;
 }
 
 void DirectoryBlobs::remove(const std::string &key)

@@ -17,6 +17,7 @@ public:
 
     std::unique_ptr<BlobWriter> openForWriting(const std::string &key) override;
     std::unique_ptr<BlobReader> openForReading(const std::string &key) override;
+    std::vector<std::string> keys() override;
     void remove(const std::string &key) override;
 
 private:

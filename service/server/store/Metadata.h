@@ -152,8 +152,15 @@ public:
     virtual std::vector<std::string> expireShares(Seconds now) = 0;
     /// The earliest deadline of a live share.
     virtual std::optional<Seconds> nextDeadline() = 0;
+    /// Forgets the shares that ended at or before `ended`, with their names and numbers, and uses
+    /// at or before `used`, which no limit counts any more.
+    virtual void forgetEnded(Seconds ended, Seconds used) = 0;
+    /// When the first share that is still remembered ended.
+    virtual std::optional<Seconds> earliestEnd() = 0;
     /// Keys of blobs that no live share needs, some of them, oldest first.
     virtual std::vector<std::string> doomedBlobs() = 0;
+    /// Whether the blob is needed, or doomed and not yet forgotten.
+    virtual bool knowsBlob(const std::string &blob) = 0;
     /// The blob's bytes are gone: forgets its key.
     virtual void forgetBlob(const std::string &blob) = 0;
 

@@ -87,8 +87,8 @@ struct SqliteMetadata::Connection {
     std::optional<ShareRow> findShare(std::int64_t account, const std::string &key, Seconds now);
     ShareRow shareById(std::int64_t id, Seconds now);
     void addParts(ShareRow &share);
-    /// Makes the share end in `state`; returns the keys of the blobs it had.
-    std::vector<std::string> endShare(const ShareRow &share, ShareState state);
+    /// Makes the share end in `state` at `now`; returns the keys of the blobs it had.
+    std::vector<std::string> endShare(const ShareRow &share, ShareState state, Seconds now);
 
     /// Seconds until the share fits the account's limit; nothing when it fits now.
     std::optional<Seconds> waitForLimit(const NewShare &share);
@@ -106,7 +106,8 @@ private:
     template <class Work>
     auto transact(SQLite::TransactionBehavior behavior, Work work) -> std::invoke_result_t<Work>;
     SQLite::Statement &prepared(const char *sql);
-    [[noreturn]] static void fail(const SQLite::Exception &error);
+    void migrate(const std::filesystem::path &file);
+    [[noreturn]] void fail(const SQLite::Exception &error);
 
     std::mutex m_mutex;
     std::unordered_map<const char *, std::unique_ptr<SQLite::Statement>> m_statements;

@@ -2,15 +2,17 @@
 
 #include <sqlite3.h>
 
+#include <array>
+#include <cerrno>
+
 namespace pelliko::server
 {
 namespace
 {
 
 constexpr int busyMilliseconds = 10000;
-constexpr int schemaVersion = 1;
 
-constexpr const char *schema = R"sql(
+constexpr const char *firstLayout = R"sql(
 CREATE TABLE accounts (
   id INTEGER PRIMARY KEY AUTOINCREMENT,
   number TEXT NOT NULL UNIQUE,
@@ -59,6 +61,21 @@ CREATE INDEX usage_by_time ON usage (account, at);
 CREATE INDEX usage_by_share ON usage (share);
 )sql";
 
+// A share that ended before its end was noted counts as ended at its deadline.
+constexpr const char *withEnds = R"sql(
+ALTER TABLE shares ADD COLUMN ended INTEGER;
+UPDATE shares SET ended = deadline WHERE state IN (2, 3);
+CREATE INDEX shares_by_end ON shares (ended) WHERE ended IS NOT NULL;
+)sql";
+
+/// The way from each version of the layout to the next; a fresh file goes all of it.
+constexpr std::array layouts{firstLayout, withEnds};
+
+bool meansFull(int systemError)
+{
+    return systemError == ENOSPC || systemError == EDQUOT || systemError == EFBIG;
+}
+
 } // namespace
 
 SqliteMetadata::Connection::Connection(const std::filesystem::path &file)
@@ -66,18 +83,25 @@ try : database(file.string(), SQLite::OPEN_READWRITE | SQLite::OPEN_CREATE, busy
     database.exec("PRAGMA journal_mode = WAL");
     database.exec("PRAGMA synchronous = FULL");
     database.exec("PRAGMA foreign_keys = ON");
+    migrate(file);
+} catch (const SQLite::Exception &error) {
+    throw StorageFailure(StorageFailure::Kind::broken, std::string("metadata: ") + error.what());
+}
+
+void SqliteMetadata::Connection::migrate(const std::filesystem::path &file)
+{
     SQLite::Transaction transaction(database, SQLite::TransactionBehavior::IMMEDIATE);
     const int version = database.execAndGet("PRAGMA user_version").getInt();
-    if (version > schemaVersion)
+    const int newest = static_cast<int>(layouts.size());
+    if (version > newest)
         throw StorageFailure(StorageFailure::Kind::broken,
                              file.string() + " was made by a newer server");
-    if (version == 0) {
-        database.exec(schema);
-        database.exec("PRAGMA user_version = " + std::to_string(schemaVersion));
-    }
+    if (version == newest)
+        return;
+    for (auto step = static_cast<std::size_t>(version); step < layouts.size(); ++step)
+        database.exec(layouts[step]);
+    database.exec("PRAGMA user_version = " + std::to_string(newest));
     transaction.commit();
-} catch (const SQLite::Exception &error) {
-    fail(error);
 }
 
 SQLite::Statement &SqliteMetadata::Connection::prepared(const char *sql)
@@ -90,7 +114,9 @@ SQLite::Statement &SqliteMetadata::Connection::prepared(const char *sql)
 
 void SqliteMetadata::Connection::fail(const SQLite::Exception &error)
 {
-    const bool full = error.getErrorCode() == SQLITE_FULL;
+    const bool full = error.getErrorCode() == SQLITE_FULL ||
+                      (error.getErrorCode() == SQLITE_IOERR &&
+                       meansFull(sqlite3_system_errno(database.getHandle())));
     throw StorageFailure(full ? StorageFailure::Kind::full : StorageFailure::Kind::broken,
                          std::string("metadata: ") + error.what());
 }

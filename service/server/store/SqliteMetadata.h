@@ -40,7 +40,10 @@ public:
 
     std::vector<std::string> expireShares(Seconds now) override;
     std::optional<Seconds> nextDeadline() override;
+    void forgetEnded(Seconds ended, Seconds used) override;
+    std::optional<Seconds> earliestEnd() override;
     std::vector<std::string> doomedBlobs() override;
+    bool knowsBlob(const std::string &blob) override;
     void forgetBlob(const std::string &blob) override;
     void ping() override;
 

@@ -112,7 +112,7 @@ FinishResult SqliteMetadata::finishShare(std::int64_t account, const std::string
 }
 
 std::vector<std::string> SqliteMetadata::Connection::endShare(const ShareRow &share,
-                                                              ShareState state)
+                                                              ShareState state, Seconds now)
 {
     // Bytes that were announced and never came do not count against the account.
     if (share.stored == ShareState::uploading) {
@@ -126,7 +126,9 @@ std::vector<std::string> SqliteMetadata::Connection::endShare(const ShareRow &sh
           share.id)
         .run();
     query("UPDATE files SET blob = NULL WHERE share = ?", share.id).run();
-    query("UPDATE shares SET state = ? WHERE id = ?", static_cast<int>(state), share.id).run();
+    query("UPDATE shares SET state = ?, ended = ? WHERE id = ?", static_cast<int>(state), now,
+          share.id)
+        .run();
     std::vector<std::string> blobs;
     for (const FileRecord &file : share.record.files) {
         if (!file.blob.empty())
@@ -146,7 +148,7 @@ SqliteMetadata::withdrawShare(std::int64_t account, const std::string &key, Seco
         const ShareState state = share->record.state;
         if (state != ShareState::uploading && state != ShareState::finished)
             return std::vector<std::string>{};
-        return db.endShare(*share, ShareState::withdrawn);
+        return db.endShare(*share, ShareState::withdrawn, now);
     });
 }
 

@@ -91,7 +91,7 @@ std::vector<std::string> SqliteMetadata::expireShares(Seconds now)
         }
         std::vector<std::string> blobs;
         for (std::int64_t id : due) {
-            for (std::string &blob : db.endShare(db.shareById(id, now), ShareState::expired))
+            for (std::string &blob : db.endShare(db.shareById(id, now), ShareState::expired, now))
                 blobs.push_back(std::move(blob));
         }
         return blobs;
@@ -107,6 +107,32 @@ std::optional<Seconds> SqliteMetadata::nextDeadline()
             return std::nullopt;
         return row.integer(0);
     });
+}
+
+void SqliteMetadata::forgetEnded(Seconds ended, Seconds used)
+{
+    auto &db = *m_connection;
+    db.write([&] {
+        db.query("DELETE FROM shares WHERE ended <= ?", ended).run();
+        db.query("DELETE FROM usage WHERE at <= ?", used).run();
+    });
+}
+
+std::optional<Seconds> SqliteMetadata::earliestEnd()
+{
+    auto &db = *m_connection;
+    return db.read([&]() -> std::optional<Seconds> {
+        Query row = db.query("SELECT min(ended) FROM shares WHERE ended IS NOT NULL");
+        if (!row.next() || row.isNull(0))
+            return std::nullopt;
+        return row.integer(0);
+    });
+}
+
+bool SqliteMetadata::knowsBlob(const std::string &blob)
+{
+    auto &db = *m_connection;
+    return db.read([&] { return db.query("SELECT 1 FROM blobs WHERE key = ?", blob).next(); });
 }
 
 std::vector<std::string> SqliteMetadata::doomedBlobs()

@@ -21,6 +21,8 @@ struct ActiveWrite {
     std::shared_ptr<BlobWriter> writer;
     /// The end of what was handed to the writer; durable only after its sync.
     std::uint64_t written = 0;
+    /// The end of what may have been noted as durable; nothing before it is dropped.
+    std::uint64_t kept = 0;
 };
 
 /// Who writes which blob right now. Network thread only.

@@ -2,6 +2,7 @@
 
 #include "http/Errors.h"
 #include "shares/ShareRules.h"
+#include "store/StorageFailure.h"
 #include "tus/TusHeaders.h"
 
 #include <algorithm>
@@ -60,6 +61,26 @@ Task<void> copyBody(Exchange &exchange, Context &context, std::shared_ptr<Active
     }
 }
 
+bool isFull(const std::exception_ptr &ending)
+{
+    try {
+        std::rethrow_exception(ending);
+    } catch (const StorageFailure &failure) {
+        return failure.kind() == StorageFailure::Kind::full;
+    } catch (...) {
+        return false;
+    }
+}
+
+/// Gives back the space of bytes that no offset counts: with a full store, even noting that
+/// something else was deleted needs some.
+Task<void> dropUnnoted(Context &context, std::shared_ptr<ActiveWrite> write)
+{
+    write->written = write->kept;
+    if (write->writer)
+        co_await context.pool.run([&] { write->writer->truncate(write->kept); });
+}
+
 void checkAppend(const Request &request, const UploadRecord &upload, std::uint64_t offset)
 {
     if (offset != upload.file.offset)
@@ -87,7 +108,7 @@ Task<void> checkpoint(Context &context, std::shared_ptr<ActiveWrite> write)
 {
     if (!write->writer)
         co_return;
-    const std::uint64_t upTo = write->written;
+    const std::uint64_t upTo = write->kept = write->written;
     const bool wanted = co_await context.pool.run([&] {
         write->writer->sync();
         return context.metadata.recordOffset(write->key, upTo);
@@ -109,13 +130,15 @@ Task<std::uint64_t> appendBody(Exchange &exchange, Context &context, std::int64_
         throw Refusal(Error::conflict, "The upload was dropped meanwhile.");
     checkAppend(exchange.request(), current, offset);
     const std::shared_ptr<ActiveWrite> write = lease.write();
-    write->written = offset;
+    write->written = write->kept = offset;
     std::exception_ptr ending;
     try {
         co_await copyBody(exchange, context, write, current.file.size);
     } catch (const std::exception &) {
         ending = std::current_exception();
     }
+    if (ending && isFull(ending))
+        co_await dropUnnoted(context, write);
     co_await checkpoint(context, write);
     if (ending)
         rethrowEnding(ending);

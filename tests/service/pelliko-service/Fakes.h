@@ -113,7 +113,6 @@ public:
         resumes.push_back(ids);
         answerResume = std::move(done);
     }
-    bool applicationRuns() const override { return true; }
 
     std::vector<SmsLaunch> launches;
     std::function<void(LaunchResult)> answer;

@@ -192,6 +192,9 @@ void World::startService(std::vector<std::string> options)
                                    "--claim",
                                    "700"};
     words.insert(words.end(), options.begin(), options.end());
+    // The bus notices a killed owner a moment later; a call in between would go to the dead one.
+    service_.reset();
+    ASSERT_TRUE(waitForName(G_BUS_TYPE_SESSION, serviceName, false));
     service_ = std::make_unique<Process>(words);
     ASSERT_TRUE(waitForName(G_BUS_TYPE_SESSION, serviceName, true));
 }

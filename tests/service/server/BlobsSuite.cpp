@@ -3,6 +3,7 @@
 #include "store/StorageFailure.h"
 #include "text/Secrets.h"
 
+#include <algorithm>
 #include <array>
 
 namespace pelliko::server
@@ -77,6 +78,31 @@ TEST_P(BlobsSuite, ARemovedBlobIsStillReadByWhoHasIt)
     EXPECT_EQ(contentOf(*m_store, key), "(absent)");
     std::array<char, 5> part;
     EXPECT_EQ(reader->read(0, part), 5U);
+}
+
+TEST_P(BlobsSuite, AShortenedBlobGoesOnFromThere)
+{
+    const std::string key = randomToken();
+    const auto writer = m_store->openForWriting(key);
+    writer->write(0, "hello wxxx");
+    writer->truncate(7);
+    EXPECT_EQ(contentOf(*m_store, key), "hello w");
+    writer->write(7, "orld");
+    EXPECT_EQ(contentOf(*m_store, key), "hello world");
+}
+
+TEST_P(BlobsSuite, TellsWhichBlobsThereAre)
+{
+    EXPECT_TRUE(m_store->keys().empty());
+    std::vector<std::string> made{randomToken(), randomToken(), randomToken()};
+    for (const std::string &key : made)
+        m_store->openForWriting(key)->sync();
+    m_store->remove(made.back());
+    made.pop_back();
+    std::vector<std::string> found = m_store->keys();
+    std::sort(found.begin(), found.end());
+    std::sort(made.begin(), made.end());
+    EXPECT_EQ(found, made);
 }
 
 TEST_P(BlobsSuite, KeysAreNoPaths)

@@ -290,4 +290,48 @@ TEST_P(MetadataSuite, ARemovedAccountTakesItsSharesAlong)
     EXPECT_FALSE(m_store->recordOffset(share.files[0].blob, 11));
 }
 
+TEST_P(MetadataSuite, EndedSharesAreForgottenAfterTheirTime)
+{
+    const ShareRecord expired = makeFinished(10, linkHash);
+    const ShareRecord withdrawn = make({20}, 1100);
+    const ShareRecord live = make({30}, 1100);
+    EXPECT_EQ(m_store->earliestEnd(), std::nullopt);
+    m_store->withdrawShare(m_account, withdrawn.key, 1150);
+    m_store->expireShares(1200);
+    EXPECT_EQ(m_store->earliestEnd(), 1150);
+    m_store->forgetEnded(1149, 0);
+    EXPECT_TRUE(m_store->findShare(m_account, withdrawn.key, 1200));
+    m_store->forgetEnded(1150, 0);
+    EXPECT_FALSE(m_store->findShare(m_account, withdrawn.key, 1200));
+    EXPECT_TRUE(m_store->findLink(linkHash, 1200));
+    EXPECT_EQ(m_store->earliestEnd(), 1200);
+    m_store->forgetEnded(1300, 0);
+    EXPECT_FALSE(m_store->findLink(linkHash, 1300));
+    EXPECT_FALSE(m_store->findShare(m_account, expired.key, 1300));
+    EXPECT_TRUE(m_store->findShare(m_account, live.key, 1300));
+    EXPECT_EQ(m_store->earliestEnd(), std::nullopt);
+    // The bytes are doomed all the same until they are gone.
+    EXPECT_THAT(m_store->doomedBlobs(), SizeIs(2));
+}
+
+TEST_P(MetadataSuite, OldUsesAreForgottenApartFromTheirShares)
+{
+    make({10}, 1000);
+    make({20}, 1050);
+    m_store->forgetEnded(0, 1000);
+    EXPECT_EQ(m_store->usedBytes(m_account, 0), 20U);
+}
+
+TEST_P(MetadataSuite, ABlobIsKnownUntilItIsForgotten)
+{
+    const ShareRecord share = make({10});
+    const std::string blob = share.files[0].blob;
+    EXPECT_TRUE(m_store->knowsBlob(blob));
+    EXPECT_FALSE(m_store->knowsBlob(std::string(22, 'A')));
+    m_store->withdrawShare(m_account, share.key, 1000);
+    EXPECT_TRUE(m_store->knowsBlob(blob));
+    m_store->forgetBlob(blob);
+    EXPECT_FALSE(m_store->knowsBlob(blob));
+}
+
 } // namespace pelliko::server

@@ -4,6 +4,7 @@
 #include "store/SqliteMetadata.h"
 #include "store/StorageFailure.h"
 
+#include <SQLiteCpp/SQLiteCpp.h>
 #include <sys/resource.h>
 #include <unistd.h>
 
@@ -74,6 +75,32 @@ TEST(SqliteMetadata, AFileThatIsNoDatabaseIsAFailure)
     scratch().fresh();
     std::ofstream(database()) << std::string(4096, 'x');
     EXPECT_THROW(SqliteMetadata{database()}, StorageFailure);
+}
+
+TEST(SqliteMetadata, AFileOfTheFirstLayoutIsTakenOver)
+{
+    scratch().fresh();
+    const std::string token(32, 'x');
+    std::string key;
+    {
+        SqliteMetadata metadata(database());
+        metadata.addAccount("+491", "Anna", token, 900);
+        NewShare share;
+        share.account = metadata.findAccount(token)->id;
+        share.files = {{"a", "", 1}};
+        share.now = 1000;
+        share.deadline = 1500;
+        share.dailyLimit = 2000;
+        key = metadata.createShare(share).share.key;
+        metadata.withdrawShare(share.account, key, 1100);
+    }
+    SQLite::Database(database().string(), SQLite::OPEN_READWRITE)
+        .exec("DROP INDEX shares_by_end; ALTER TABLE shares DROP COLUMN ended;"
+              "PRAGMA user_version = 1");
+    SqliteMetadata metadata(database());
+    EXPECT_EQ(metadata.earliestEnd(), 1500);
+    const auto account = metadata.findAccount(token)->id;
+    EXPECT_EQ(metadata.findShare(account, key, 1500)->state, ShareState::withdrawn);
 }
 
 TEST(DirectoryBlobs, AFullStoreIsToldFromABrokenOne)

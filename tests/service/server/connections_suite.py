@@ -38,6 +38,26 @@ class Connections(ServerCase):
             self.assertTrue(received.startswith(b"HTTP/1.1 400 "), (head, received))
         self.assertEqual(self.get("/healthz").status, 200)
 
+    def test_malformed_chunks_are_refused_and_keep_what_came_before(self):
+        upload = self.make_share(10)["files"][0]["upload"]
+        head = self.patch_head(upload, 0, 0).replace(b"Content-Length: 0", b"Transfer-Encoding: chunked")
+        received = self.ask(head + b"4\r\n1234\r\n" + b"zz\r\n12\r\n0\r\n\r\n")
+        self.assertTrue(received.startswith(b"HTTP/1.1 400 "), received)
+        self.assertIn(b"bad_request", received)
+        self.assertEqual(self.offset(upload), 4)
+        json = (b"POST /api/v1/shares HTTP/1.1\r\nHost: x\r\nAuthorization: Bearer " + self.token.encode() +
+                b"\r\nIdempotency-Key: k\r\nTransfer-Encoding: chunked\r\n\r\n5\r\n{1234\r\nzz\r\n")
+        self.assertTrue(self.ask(json).startswith(b"HTTP/1.1 400 "))
+
+    def test_chunks_that_end_too_early_keep_what_came(self):
+        upload = self.make_share(10)["files"][0]["upload"]
+        head = self.patch_head(upload, 0, 0).replace(b"Content-Length: 0", b"Transfer-Encoding: chunked")
+        connection = self.connect()
+        connection.sendall(head + b"9\r\n1234")
+        connection.shutdown(socket.SHUT_WR)
+        self.assertEqual(read_until_closed(connection), b"")
+        self.assertEqual(self.offset(upload), 4)
+
     def test_pipelined_requests_are_answered_in_order(self):
         share = self.make_share(5)
         upload = share["files"][0]["upload"]

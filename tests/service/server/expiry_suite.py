@@ -48,6 +48,45 @@ class Expiry(WatchingCase):
         deletions.wait(10)
 
 
+class Strays(WatchingCase):
+    def put_stray(self):
+        """A blob as a copy of the database leaves it that is older than the blobs."""
+        folder = os.path.join(self.data, "blobs", "AA")
+        os.makedirs(folder, exist_ok=True)
+        self.stray = os.path.join(folder, "A" * 22)
+        with open(self.stray, "wb") as file:
+            file.write(b"12345")
+        watch = Watch(folder, DELETED)
+        self.addCleanup(watch.__exit__)
+        return watch
+
+    def test_bytes_that_the_database_does_not_know_are_removed_at_the_start(self):
+        _, link = self.make_finished(b"12345")
+        unfinished = self.make_share(10)["files"][0]["upload"]
+        self.patch(unfinished, 0, b"1234")
+        self.assertEqual(self.stop(), 0)
+        deletions = self.put_stray()
+        foreign = os.path.join(self.data, "blobs", "AA", "README")
+        open(foreign, "w", encoding="ascii").close()
+        self.start()
+        deletions.wait(10)
+        self.assertFalse(os.path.exists(self.stray))
+        self.assertTrue(os.path.exists(foreign))
+        self.assertEqual(self.get(link + "/0").body, b"12345")
+        self.assertEqual(self.patch(unfinished, 4, b"567890").status, 204)
+
+    def test_a_database_that_is_still_to_be_put_back_costs_no_bytes(self):
+        self.assertEqual(self.stop(), 0)
+        self.put_stray()
+        for end in ["", "-wal", "-shm"]:
+            if os.path.exists(self.data + "/metadata.db" + end):
+                os.remove(self.data + "/metadata.db" + end)
+        self.start()
+        self.assertEqual(self.get("/healthz").status, 200)
+        self.assertEqual(self.stop(), 0)
+        self.assertTrue(os.path.exists(self.stray))
+
+
 class Unfinished(WatchingCase):
     options = ["--unfinished-lifetime", "2"]
 
