@@ -9,6 +9,7 @@ import html.parser
 import json
 import os
 import re
+import select
 import signal
 import subprocess
 import urllib.parse
@@ -278,3 +279,38 @@ def activation_environment(**values):
     bus.call_sync("org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DBus",
                   "UpdateActivationEnvironment", GLib.Variant("(a{ss})", (values,)), None,
                   Gio.DBusCallFlags.NONE, 5000)
+
+
+# --- the share server -------------------------------------------------------------------------------
+
+_SERVER_PID = os.path.join(os.environ.get("XDG_RUNTIME_DIR", ""), "pelliko-server.pid")
+
+
+def kill_server():
+    """Kills the share server as a crash would and returns once it is gone."""
+    with open(_SERVER_PID, encoding="ascii") as file:
+        process = int(file.read())
+    handle = os.pidfd_open(process)
+    try:
+        os.kill(process, signal.SIGKILL)
+        if not select.select([handle], [], [], LIMIT)[0]:
+            raise WorldError("the share server does not die")
+    finally:
+        os.close(handle)
+
+
+def start_server():
+    """Starts the share server on the world's data and address; returns once it accepts connections."""
+    state = os.environ["PELLIKO_STATE"]
+    address = urllib.parse.urlsplit(os.environ["PELLIKO_SERVER_URL"]).netloc
+    ready, tell = os.pipe()
+    with open(os.path.join(state, "log", "pelliko-server.log"), "ab") as log:
+        server = subprocess.Popen(["pelliko-server", "serve", "--listen", address, "--data",
+                                   os.path.join(state, "server"), "--ready-fd", str(tell)],
+                                  pass_fds=[tell], stdout=log, stderr=log)
+    os.close(tell)
+    with os.fdopen(ready) as line:
+        if not line.readline():
+            raise WorldError("the share server did not start again")
+    with open(_SERVER_PID, "w", encoding="ascii") as file:
+        file.write(f"{server.pid}\n")
