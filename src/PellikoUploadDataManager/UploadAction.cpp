@@ -55,11 +55,22 @@ void _showProgress(UploadNotiData *node)
     }
 }
 
-// The upload's node is missing when there was no memory for it: then nothing was sent either.
-void _onStarted(UploadNotiData *node)
+const UploadNotiData *_lastNode()
 {
-    if (node)
-        _showProgress(node);
+    const UploadNotiData *node = g_upload_noti_data_list;
+    while (node && node->next)
+        node = node->next;
+    return node;
+}
+
+// Without memory for a node nothing was sent and the list is as before; the id is then that of an
+// earlier upload, which must not be shown as starting again.
+void _onStarted(const UploadNotiData *last_before, int32_t request_id)
+{
+    if (_lastNode() != last_before) {
+        if (UploadNotiData *node = getUploadNotiDataNode(request_id))
+            _showProgress(node);
+    }
     _uploadListPrintUploadNotiDataList();
 }
 
@@ -68,11 +79,12 @@ int _startUpload(PellikoAppData *ad)
 {
     LOG_DEBUG("Action type is ACTION_UPLOAD");
     _populateExtraData(ad);
+    const UploadNotiData *last = _lastNode();
     const int result = uploadStart(ad);
     if (result != PELLIKO_ERROR_NONE)
         _onStartError(ad, result);
     else
-        _onStarted(getUploadNotiDataNode(ad->upload_item->request_id));
+        _onStarted(last, ad->upload_item->request_id);
     LOG_DEBUG("uploadStart ret = %d", result);
     return result;
 }
@@ -81,13 +93,14 @@ int _startReshare(PellikoAppData *ad)
 {
     LOG_DEBUG("Action type is ACTION_RESHARE_UPLOAD");
     _populateExtraData(ad);
+    const UploadNotiData *last = _lastNode();
     const int result = reshareUploadStart(ad);
     if (result != PELLIKO_ERROR_NONE) {
         _onStartError(ad, result);
     } else {
         if (g_upload_noti_data_list)
             g_upload_noti_data_list->total_files = ad->upload_item->files_count;
-        _onStarted(getUploadNotiDataNode(ad->reshared_request_id));
+        _onStarted(last, ad->reshared_request_id);
     }
     LOG_DEBUG("reshareUploadStart ret = %d", result);
     return result;

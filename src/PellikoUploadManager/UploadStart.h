@@ -12,7 +12,7 @@ namespace pelliko
 /// this share (_populateExtraData).
 /// @return 0; the service's negative error code, then the new node stays in the list with request
 ///         id 0; -1 without a record or an item. Also 0 when no node could be made: the service is
-///         not called then, and no node has the item's request id.
+///         not called then, the list is as before and the item keeps an earlier request id.
 int uploadStart(PellikoAppData *ad);
 
 /// Sends the upload ad->req_id_to_reshare to the recipients of ad->upload_item without uploading it

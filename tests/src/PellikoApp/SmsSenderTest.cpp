@@ -1,9 +1,11 @@
 #include "PellikoApp/SmsSender.h"
 #include "PellikoApp/Workers.h"
+#include "PellikoUploadManager/UsagePreferences.h"
 #include "support/AppWorld.h"
 #include "support/Catalogue.h"
 
 #include <app_control.h>
+#include <app_preference.h>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
@@ -26,7 +28,7 @@ protected:
     {
         setenv("TZ", "UTC", 1);
         tzset();
-        std::filesystem::remove(outbox());
+        std::filesystem::remove_all(outbox());
         app_control_create(&request);
     }
     ~SmsSender() override { app_control_destroy(request); }
@@ -218,10 +220,12 @@ TEST_F(SmsSender, ANegativeFileCountMakesAnEmptyText)
     job.file_count = -1;
     log.restart();
     _sendSms(job);
-    EXPECT_TRUE(log.has("invalid file_count -1")) << log.text();
-    EXPECT_TRUE(log.has("to_msisdn_count=1"));
-    for (const auto &message : sent())
-        EXPECT_EQ(message["text"], "");
+    EXPECT_EQ(log.text(), "expired_time=1777982400\n"
+                          "invalid file_count -1\n"
+                          "to_msisdn_count=1\n"
+                          "SIM index = 0\n");
+    ASSERT_EQ(sent().size(), 1u);
+    EXPECT_EQ(sent()[0]["text"], "");
 }
 
 TEST_F(SmsSender, OneRefusedMessageDoesNotStopTheOthers)
@@ -234,6 +238,49 @@ TEST_F(SmsSender, OneRefusedMessageDoesNotStopTheOthers)
     ASSERT_EQ(sent().size(), 1u);
     EXPECT_EQ(sent()[0]["to"], "+4479002");
     EXPECT_TRUE(log.has("msg_sms_send_message Failed")) << log.text();
+}
+
+TEST_F(SmsSender, AFailedSendGoesOnWithTheNext)
+{
+    fullRequest({"+4479001", "+4479002", "+4479003"});
+    std::filesystem::create_directory(outbox()); // nothing can be written to it
+    log.restart();
+    _sendSms(makeSmsJob(ad));
+    EXPECT_EQ(log.text(), "expired_time=1777982400\n"
+                          "to_msisdn_count=3\n"
+                          "SIM index = 0\n"
+                          "msg_sms_send_message Failed\n"
+                          "SIM index = 0\n"
+                          "msg_sms_send_message Failed\n"
+                          "SIM index = 0\n"
+                          "msg_sms_send_message Failed\n");
+}
+
+TEST_F(SmsSender, TheMessagesAreDoneEvenWhenEverySendFailed)
+{
+    fullRequest({"+4479001"});
+    std::filesystem::create_directory(outbox());
+    preference_set_int(shareSmsDoneKey, 0);
+    log.restart();
+    runSmsJob(makeSmsJob(ad));
+    ASSERT_TRUE(loop.runUntil([this] { return log.has("req_id = 7"); }));
+    EXPECT_TRUE(log.has("msg_sms_send_message Failed")) << log.text();
+    int done = 0;
+    ASSERT_EQ(preference_get_int(shareSmsDoneKey, &done), PREFERENCE_ERROR_NONE);
+    EXPECT_EQ(done, 1);
+}
+
+TEST_F(SmsSender, ARequestWithNothingSendsWhatTheRequestBeforeBrought)
+{
+    fullRequest({"+4479001", "+4479002"});
+    app_control_h empty = nullptr;
+    app_control_create(&empty);
+    _getSmsData(empty, ad);
+    app_control_destroy(empty);
+    _sendSms(makeSmsJob(ad));
+    ASSERT_EQ(sent().size(), 2u);
+    for (const auto &message : sent())
+        EXPECT_EQ(message["text"], "Shared: http://host/s/abc until 2026/05/05");
 }
 
 TEST_F(SmsSender, AWorkerKeepsItsDataWhenTheNextRequestArrives)
