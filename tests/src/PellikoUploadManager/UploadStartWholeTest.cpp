@@ -8,6 +8,7 @@
 #include <glib.h>
 #include <pelliko_client.h>
 #include <regex>
+#include <sqlite3.h>
 
 namespace pelliko::test
 {
@@ -54,6 +55,7 @@ protected:
         ASSERT_EQ(_performAction(ad), 0) << log.text();
         ASSERT_NE(g_upload_noti_data_list, nullptr);
         id = std::to_string(g_upload_noti_data_list->request_id);
+        row = onlyRow();
         ASSERT_TRUE(loop.runUntil([] { return g_upload_noti_data_list == nullptr; }, 60.0));
         split(replaced(replaced(log.text(), "(share_time_last with value = )[0-9.]+", "$1now"),
                        "(node->request_id = \\d+\nnode->noti_priv_id = )-?\\d+(\nnode->notif = "
@@ -178,10 +180,30 @@ protected:
 
     RecordingApplication application;
     std::string id;
+    std::string row;   ///< of the table of pending uploads, once the request was accepted
     std::string start; ///< what was written before the first report
     std::vector<Report> reports;
 
 private:
+    static std::string onlyRow()
+    {
+        std::string text;
+        sqlite3 *database = nullptr;
+        sqlite3_open_v2("/opt/usr/apps/com.velmora.pelliko/data/.pelliko.db", &database,
+                        SQLITE_OPEN_READONLY, nullptr);
+        sqlite3_exec(
+            database, "SELECT * FROM 'UPLOAD_INFO';",
+            [](void *data, int count, char **values, char **) {
+                for (int i = 0; i < count; ++i)
+                    *static_cast<std::string *>(data) +=
+                        std::string(i ? "|" : "") + (values[i] ? values[i] : "NULL");
+                return 0;
+            },
+            &text, nullptr);
+        sqlite3_close(database);
+        return text;
+    }
+
     void split(const std::string &text)
     {
         static const std::regex head("Request id found = \\d+\n"
@@ -230,6 +252,7 @@ TEST_F(WholeUpload, AShareWritesTheseLinesUntilItIsSent)
                          "node->recipient_list = %p\n"
                          "node->recipient_index_list = %p\n"
                          "uploadStart ret = 0\n");
+    EXPECT_EQ(row, id + "|1|2000|/tmp/b.jpg?|Ann?|31?");
     expectSending(1, 2000);
     ASSERT_GE(reports.size(), 2u);
     expectNotified(reports[reports.size() - 2], 1, 2000);
@@ -281,6 +304,7 @@ TEST_F(WholeUpload, AReshareOfAFinishedShareWritesTheseLinesUntilItIsSent)
                          "node->recipient_list = %p\n"
                          "node->recipient_index_list = %p\n"
                          "reshareUploadStart ret = 0\n");
+    EXPECT_EQ(row, id + "|3|5000||Ann?|31?");
     expectSending(3, 5000);
     ASSERT_GE(reports.size(), 2u);
     expectNotified(reports[reports.size() - 2], 3, 5000);
