@@ -21,6 +21,8 @@ class ShareFiles(share_case.ShareCase):
         for message in messages:
             self.assert_downloads_equal(message, {"holiday photo.jpg": data})
         self.assertEqual([], self.pending_rows())
+        with open(path, "rb") as own:
+            self.assertEqual(data, own.read(), "the person's own file stays")
 
     def test_a_hundred_files_arrive_as_one_share(self):
         files = {f"page {n:03}.txt": share_case.random_bytes(1_000 + 37 * n, seed=n) for n in range(100)}

@@ -5,6 +5,7 @@
 #include "PellikoUploadManager/UsagePreferences.h"
 #include "PellikoUploadingDataManager/PressedNotification.h"
 #include "support/AppWorld.h"
+#include "support/RefusingStore.h"
 
 #include <app_preference.h>
 #include <filesystem>
@@ -433,6 +434,37 @@ TEST_F(UploadStatus, ThePeriodIsStampedAtItsFirstShareOnly)
     preference_get_double(shareTimeLastKey, &second);
     EXPECT_EQ(first, second);
     EXPECT_EQ(totalSize(), 4000);
+}
+
+TEST_F(UploadStatus, AStoreThatRefusesTheDaysTotalsDoesNotStopTheEnd)
+{
+    start();
+    const RefusingStore full;
+    report(7);
+    const std::string text = std::regex_replace(written(), std::regex("p_err = -[0-9]+"), "p_err");
+    EXPECT_NE(text.find(rowDeleted +
+                        "Error in setting PREFERENCE KEY SHARE_TIME_LAST, p_err\n"
+                        "Error in setting PREFERENCE KEY SHARE_TIME_LAST\n"
+                        "Error in setting PREFERENCE KEY SHARE_TOTAL_SIZE, p_err\n"
+                        "Error in setting PREFERENCE SHARE_TOTAL_SIZE with share_total_size = "
+                        "2000.000000, p_err\n" +
+                        historyAbsent),
+              std::string::npos)
+        << text;
+    EXPECT_EQ(posted("7")->extras.at("upload_status"), "6");
+    EXPECT_FALSE(inList(7));
+}
+
+TEST_F(UploadStatus, APeriodStartOfAnotherTypeIsStampedAnew)
+{
+    preference_set_int(shareTimeLastKey, 5);
+    start();
+    report(7);
+    const std::string text = std::regex_replace(written(), std::regex("p_err = -[0-9]+"), "p_err");
+    EXPECT_NE(text.find("Error in getting PREFERENCE KEY SHARE_TIME_LAST, p_err\n"
+                        "Updating preference for share_time_last with value = now\n"),
+              std::string::npos)
+        << text;
 }
 
 TEST_F(UploadStatus, AReshareTellsItsNewRequestId)

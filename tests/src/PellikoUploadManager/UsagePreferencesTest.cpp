@@ -1,10 +1,12 @@
 #include "PellikoUploadManager/UsagePreferences.h"
 #include "PellikoUploadManager/PeriodClock.h"
 #include "support/AppWorld.h"
+#include "support/RefusingStore.h"
 
 #include <app_preference.h>
 #include <clocale>
 #include <glib.h>
+#include <regex>
 
 namespace pelliko::test
 {
@@ -178,6 +180,28 @@ TEST_F(UsagePreferences, ThePeriodStartsNow)
     char line[128];
     snprintf(line, sizeof(line), "Updating preference for share_time_last with value = %f", stored);
     EXPECT_EQ(log.text(), std::string(line) + "\n");
+}
+
+TEST_F(UsagePreferences, WhatTheStoreRefusesIsLoggedByItsName)
+{
+    const RefusingStore full;
+    nodeOfSize(2000);
+    log.restart();
+    updatePreference();
+    _updateTimestamp();
+    _updateUploadedData();
+    _updatePopupPreference(2, 45.0, 0);
+    EXPECT_EQ(std::regex_replace(log.text(), std::regex("p_err = -[0-9]+"), "p_err = E"),
+              "Error in setting PREFERENCE SHARE_SMS_DONE with sms_done = 1, p_err = E\n"
+              "Error in setting PREFERENCE KEY SHARE_TIME_LAST\n"
+              "Error in setting PREFERENCE KEY SHARE_TOTAL_SIZE, p_err = E\n"
+              "Error in setting PREFERENCE SHARE_TOTAL_SIZE with share_total_size = 2000.000000, "
+              "p_err = E\n"
+              "status = 2, progress_percent = 45.000000, error_code = 0\n"
+              "Error in setting PREFERENCE KEY SHARE_UPDATE_POPUP_DATA\n"
+              "previous update_popup_data = (null)\n"
+              "new update_popup_data = 2+45.000000+0\n"
+              "Error in getting PREFERENCE KEY SHARE_UPDATE_POPUP_DATA\n");
 }
 
 TEST_F(UsagePreferences, TheMessagesFirstRemembersThemInTheNode)
