@@ -1,8 +1,13 @@
 #pragma once
 
 #include <csignal>
+#include <filesystem>
+#include <fstream>
 #include <gio/gio.h>
+#include <poll.h>
 #include <string>
+#include <sys/syscall.h>
+#include <unistd.h>
 #include <vector>
 
 namespace pelliko::test
@@ -55,44 +60,15 @@ public:
 
     bool running() const { return process() != 0; }
 
-    /// False when the application has not ended within 20 seconds.
-    bool waitForExit()
-    {
-        GMainContext *context = g_main_context_new();
-        g_main_context_push_thread_default(context);
-        State state;
-        const guint watch = g_bus_watch_name_on_connection(
-            bus_, pellikoName, G_BUS_NAME_WATCHER_FLAGS_NONE, nullptr,
-            [](GDBusConnection *, const char *, void *data) {
-                static_cast<State *>(data)->gone = true;
-            },
-            &state, nullptr);
-        GSource *bound = g_timeout_source_new_seconds(20);
-        g_source_set_callback(
-            bound,
-            [](void *data) -> gboolean {
-                static_cast<State *>(data)->late = true;
-                return G_SOURCE_REMOVE;
-            },
-            &state, nullptr);
-        g_source_attach(bound, context);
-        while (!state.gone && !state.late)
-            g_main_context_iteration(context, TRUE);
-        g_source_destroy(bound);
-        g_source_unref(bound);
-        g_bus_unwatch_name(watch);
-        g_main_context_pop_thread_default(context);
-        g_main_context_unref(context);
-        return state.gone;
-    }
+    /// False when the application has not ended within 20 seconds. It leaves the bus first and then
+    /// waits for its workers, so both ends are waited for.
+    bool waitForExit() { return waitForName() && waitForProcesses(); }
 
     /// Ends a running application and waits for it.
     void end()
     {
-        const pid_t pid = process();
-        if (pid == 0)
-            return;
-        kill(pid, SIGTERM);
+        if (const pid_t pid = process())
+            kill(pid, SIGTERM);
         waitForExit();
     }
 
@@ -116,6 +92,61 @@ private:
         bool gone = false;
         bool late = false;
     };
+    static constexpr unsigned int bound_seconds = 20;
+
+    bool waitForName()
+    {
+        GMainContext *context = g_main_context_new();
+        g_main_context_push_thread_default(context);
+        State state;
+        const guint watch = g_bus_watch_name_on_connection(
+            bus_, pellikoName, G_BUS_NAME_WATCHER_FLAGS_NONE, nullptr,
+            [](GDBusConnection *, const char *, void *data) {
+                static_cast<State *>(data)->gone = true;
+            },
+            &state, nullptr);
+        GSource *bound = g_timeout_source_new_seconds(bound_seconds);
+        g_source_set_callback(
+            bound,
+            [](void *data) -> gboolean {
+                static_cast<State *>(data)->late = true;
+                return G_SOURCE_REMOVE;
+            },
+            &state, nullptr);
+        g_source_attach(bound, context);
+        while (!state.gone && !state.late)
+            g_main_context_iteration(context, TRUE);
+        g_source_destroy(bound);
+        g_source_unref(bound);
+        g_bus_unwatch_name(watch);
+        g_main_context_pop_thread_default(context);
+        g_main_context_unref(context);
+        return state.gone;
+    }
+
+    // The world has process ids of its own: every process of that name is the application.
+    static bool waitForProcesses()
+    {
+        for (const auto &entry : std::filesystem::directory_iterator("/proc")) {
+            std::string name;
+            std::getline(std::ifstream(entry.path() / "comm"), name);
+            if (name == "pelliko" && !waitForProcess(std::stoi(entry.path().filename())))
+                return false;
+        }
+        return true;
+    }
+
+    static bool waitForProcess(pid_t pid)
+    {
+        const int fd = static_cast<int>(syscall(SYS_pidfd_open, pid, 0));
+        if (fd < 0)
+            return true; // gone meanwhile
+        pollfd ended = {fd, POLLIN, 0};
+        const int ready = poll(&ended, 1, static_cast<int>(bound_seconds) * 1000);
+        close(fd);
+        return ready == 1;
+    }
+
     GDBusConnection *bus_;
 };
 
