@@ -4,6 +4,7 @@
 #include "app.h"
 
 #include <Elementary.h>
+#include <KeyRelay.h>
 
 #include <algorithm>
 #include <cstdio>
@@ -54,6 +55,7 @@ int WApp::onStart(int argc, char **argv)
     // Detached workers of the application may still use the toolkit when the loop has ended, so it
     // is never shut down here: the end of the process does that.
     elm_init(argc, argv);
+    pelliko::ui::relayKeysPastReader();
     elm_policy_set(ELM_POLICY_QUIT, ELM_POLICY_QUIT_NONE);
     ui_app_lifecycle_callback_s callbacks{Impl::create, Impl::terminate, nullptr, nullptr,
                                           Impl::control};

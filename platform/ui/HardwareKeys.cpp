@@ -1,7 +1,8 @@
 #include "HardwareKeys.h"
 
+#include "KeyRelay.h"
+
 #include <Ecore_Evas.h>
-#include <Ecore_Input.h>
 
 #include <algorithm>
 #include <array>
@@ -90,17 +91,11 @@ std::optional<Registration> topmostListener(HardwareKey key, Ecore_Window window
 }
 
 // Keys are read before the canvas gets them, so that a focused widget cannot swallow the back key.
-Eina_Bool keyDown(void *, int, void *event_info)
+Eina_Bool keyDown(void *, int type, void *event_info)
 {
-    const auto *event = static_cast<Ecore_Event_Key *>(event_info);
-    const auto key = keyNamed(event->keyname);
-    if (!key)
-        return ECORE_CALLBACK_PASS_ON;
-    const auto listener = topmostListener(*key, event->event_window);
-    if (!listener)
-        return ECORE_CALLBACK_PASS_ON;
-    listener->function(listener->data, listener->object, nullptr);
-    return ECORE_CALLBACK_DONE;
+    const auto &key = *static_cast<const Ecore_Event_Key *>(event_info);
+    keyArrived(type, key);
+    return pressHardwareKey(key) ? ECORE_CALLBACK_DONE : ECORE_CALLBACK_PASS_ON;
 }
 
 void objectDeleted(void *, Evas *, Evas_Object *object, void *)
@@ -115,6 +110,16 @@ bool isListening(const Evas_Object *object)
 }
 
 } // namespace
+
+bool pressHardwareKey(const Ecore_Event_Key &event)
+{
+    const auto key = keyNamed(event.keyname);
+    const auto listener = key ? topmostListener(*key, event.event_window) : std::nullopt;
+    if (!listener)
+        return false;
+    listener->function(listener->data, listener->object, nullptr);
+    return true;
+}
 
 void addKeyCallback(Evas_Object *object, HardwareKey key, KeyCallback function, void *data)
 {

@@ -1,6 +1,7 @@
 // The registry behind the back- and menu-key callbacks of both extension headers.
 #pragma once
 
+#include <Ecore_Input.h>
 #include <Elementary.h>
 
 namespace pelliko::ui
@@ -15,5 +16,8 @@ void addKeyCallback(Evas_Object *object, HardwareKey key, KeyCallback function, 
 
 /// Data of the removed registration, null when there was none.
 void *removeKeyCallback(Evas_Object *object, HardwareKey key, KeyCallback function);
+
+/// Calls the topmost listener of the event's window; false when nobody listens for this key.
+bool pressHardwareKey(const Ecore_Event_Key &event);
 
 } // namespace pelliko::ui

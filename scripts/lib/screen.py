@@ -42,19 +42,24 @@ def _walk(node, depth=0):
         yield from _walk(child, depth + 1)
 
 
+def nodes():
+    """Everything that every program shows to assistive programs."""
+    for application in pyatspi.Registry.getDesktop(0):
+        yield from _walk(application)
+
+
 def controls():
     """Every control of every program on the screen that is showing and enabled: (name, role, extents)."""
     found = []
-    for application in pyatspi.Registry.getDesktop(0):
-        for node in _walk(application):
-            try:
-                states = node.getState()
-                if not states.contains(pyatspi.STATE_SHOWING):
-                    continue
-                extents = node.queryComponent().getExtents(pyatspi.DESKTOP_COORDS)
-                found.append((node.name, node.getRoleName(), extents, states.contains(pyatspi.STATE_ENABLED)))
-            except Exception:
+    for node in nodes():
+        try:
+            states = node.getState()
+            if not states.contains(pyatspi.STATE_SHOWING):
                 continue
+            extents = node.queryComponent().getExtents(pyatspi.DESKTOP_COORDS)
+            found.append((node.name, node.getRoleName(), extents, states.contains(pyatspi.STATE_ENABLED)))
+        except Exception:
+            continue
     return found
 
 

@@ -1,6 +1,7 @@
 #include "PellikoUploadDataManager/ConfirmationContents.h"
 
 #include "AppLog/AppLog.h"
+#include "PellikoApp/AccessibleName.h"
 #include "PellikoApp/AppData.h"
 #include "PellikoApp/TextFormat.h"
 #include "PellikoApp/ThemeLayout.h"
@@ -9,6 +10,8 @@
 #include "PellikoUploadDataManager/RecipientsRow.h"
 
 #include <Elementary.h>
+#include <cstdlib>
+#include <memory>
 #include <pelliko_client.h>
 
 namespace pelliko
@@ -66,13 +69,18 @@ void _addCheckBox(PellikoAppData *ad, Evas_Object *layout, bool wifi_only)
 
 void _setHeading(PellikoAppData *ad, Evas_Object *layout)
 {
-    const unsigned int recipients = _recipientCount(ad);
-    if (recipients <= 1)
-        return;
     char heading[popupTextSize];
     formatTranslated(heading, sizeof(heading), translated("IDS_RSH_HEADER_RECIPIENTS_HPD_ABB"), "d",
-                     static_cast<int>(recipients));
+                     static_cast<int>(_recipientCount(ad)));
     elm_object_part_text_set(layout, "elm.swallow.label.text", heading);
+    setAccessibleName(layout, heading);
+}
+
+void _setSummary(Evas_Object *layout, const char *summary)
+{
+    elm_object_part_text_set(layout, "elm.text.info", summary);
+    const std::unique_ptr<char, decltype(&free)> plain(elm_entry_markup_to_utf8(summary), free);
+    setAccessibleName(layout, plain.get());
 }
 
 } // namespace
@@ -98,9 +106,13 @@ void setConfirmationTexts(PellikoAppData *ad, Evas_Object *layout)
     elm_object_part_text_set(layout, "elm.text", wifi_only);
     // Not shown: assistive programs find the check box by it.
     elm_object_text_set(ad->wifi_check_box, wifi_only);
+    // The layout would pass for the row's text, and with it for a second check box, if it had no
+    // name of its own.
+    setAccessibleName(layout, "");
     if (_recipientCount(ad) == 1)
-        elm_object_part_text_set(layout, "elm.text.info", summary);
-    _setHeading(ad, layout);
+        _setSummary(layout, summary);
+    else if (_recipientCount(ad) > 1)
+        _setHeading(ad, layout);
 }
 
 } // namespace pelliko

@@ -98,8 +98,6 @@ Evas_Object *_addRecipient(Evas_Object *box, PellikoAppData *ad, const UploadRec
     if (recipient.is_sms == 1)
         _setBadge(item);
     elm_object_signal_emit(item, "elm,state,disabled", "elm");
-    if (eina_list_count(ad->upload_item->recipient_list) > 1) // one name may use the whole width
-        evas_object_size_hint_weight_set(item, 0.0, EVAS_HINT_EXPAND);
     evas_object_show(item);
     return item;
 }

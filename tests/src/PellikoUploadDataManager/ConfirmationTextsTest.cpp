@@ -14,7 +14,7 @@ namespace pelliko
 namespace
 {
 
-constexpr const char *wifiAdvice = "To avoid additional charges, share your files via Wi-Fi only.";
+constexpr const char *wifiAdvice = "To avoid extra charges, share via Wi-Fi only.";
 constexpr const char *reshareAdvice =
     "Tap Share to share again. The files are already on the server, so there are no data charges.";
 
@@ -134,8 +134,8 @@ TEST_F(ConfirmationTexts, GermanHasItsOwnTextsAndDecimalComma)
     speak("de_DE.UTF-8");
     share(2, 1572864, 2);
     EXPECT_EQ(body(),
-              "2 Dateien (1,50MB)<br><br>Teilen Sie Ihre Dateien nur über WLAN, um zusätzliche "
-              "Kosten zu vermeiden.");
+              "2 Dateien (1,50MB)<br><br>Nur über WLAN teilen, um Zusatzkosten zu "
+              "vermeiden.");
 }
 
 TEST_F(ConfirmationTexts, BothTextsAndTheExpiryDateAreLogged)
