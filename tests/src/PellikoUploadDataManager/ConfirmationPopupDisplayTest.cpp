@@ -70,7 +70,7 @@ TEST_F(ConfirmationPopup, OneRecipientGetsTheSingleLayoutWithASummary)
     EXPECT_THAT(log.messages(), Contains("Setting confirmation_popup_share_view_single"));
     EXPECT_THAT(log.messages(), Contains("ad->operation_type =4,g_total_recipients =1"));
     EXPECT_STREQ(elm_object_part_text_get(ad->popup, "title,text"), "Share files via Pelliko");
-    EXPECT_EQ(body(), "To avoid extra charges, share via Wi-Fi only.");
+    EXPECT_EQ(body(), "To avoid extra charges, share via Wi‑Fi only.");
     EXPECT_EQ(layoutText("elm.text.info"), "1 file <br>(1.00KB)");
     EXPECT_EQ(layoutText("elm.text"), "Share via Wi-Fi only");
     EXPECT_STREQ(elm_object_text_get(button("button1")), "Cancel");
@@ -97,7 +97,7 @@ TEST_F(ConfirmationPopup, SeveralRecipientsGetAHeadingAndARow)
     EXPECT_EQ(layoutText("elm.swallow.label.text"), "Recipients (6)");
     EXPECT_EQ(body(),
               "4 files (3.00MB)<br><br>2 files are not supported and will not be shared. To "
-              "avoid extra charges, share via Wi-Fi only.");
+              "avoid extra charges, share via Wi‑Fi only.");
     const auto lines = log.messages();
     EXPECT_THAT(lines, Contains("Setting confirmation_popup_share_view_multiple"));
     EXPECT_THAT(lines, Contains("Adding recipient- name = Zoë & <b>Co</b>"));
@@ -157,9 +157,8 @@ TEST_F(ConfirmationPopup, LanguageChangeRetextsTheOpenPopup)
     photograph("confirmation-german");
     EXPECT_EQ(ad->popup, popup);
     EXPECT_STREQ(elm_object_part_text_get(ad->popup, "title,text"), "Dateien über Pelliko teilen");
-    EXPECT_EQ(body(),
-              "1 Datei wird nicht unterstützt und nicht geteilt. Nur über WLAN teilen, um "
-              "Zusatzkosten zu vermeiden.");
+    EXPECT_EQ(body(), "1 Datei wird nicht unterstützt und nicht geteilt. Nur über WLAN teilen, um "
+                      "Zusatzkosten zu vermeiden.");
     EXPECT_EQ(layoutText("elm.text.info"), "2 Dateien <br>(1,43MB)");
     EXPECT_EQ(layoutText("elm.text"), "Nur über WLAN teilen");
     EXPECT_STREQ(elm_object_text_get(button("button1")), "Abbrechen");

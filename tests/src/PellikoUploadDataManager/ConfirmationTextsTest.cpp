@@ -14,7 +14,7 @@ namespace pelliko
 namespace
 {
 
-constexpr const char *wifiAdvice = "To avoid extra charges, share via Wi-Fi only.";
+constexpr const char *wifiAdvice = "To avoid extra charges, share via Wi‑Fi only.";
 constexpr const char *reshareAdvice =
     "Tap Share to share again. The files are already on the server, so there are no data charges.";
 
@@ -133,9 +133,8 @@ TEST_F(ConfirmationTexts, GermanHasItsOwnTextsAndDecimalComma)
 {
     speak("de_DE.UTF-8");
     share(2, 1572864, 2);
-    EXPECT_EQ(body(),
-              "2 Dateien (1,50MB)<br><br>Nur über WLAN teilen, um Zusatzkosten zu "
-              "vermeiden.");
+    EXPECT_EQ(body(), "2 Dateien (1,50MB)<br><br>Nur über WLAN teilen, um Zusatzkosten zu "
+                      "vermeiden.");
 }
 
 TEST_F(ConfirmationTexts, BothTextsAndTheExpiryDateAreLogged)
