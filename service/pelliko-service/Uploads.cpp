@@ -154,10 +154,11 @@ void Uploads::tellPresent(int32_t id)
 void Uploads::confirmEnd(const std::string &listener, int32_t id)
 {
     const auto found = listeners_.find(id);
-    if (found == listeners_.end() || found->second != listener || undelivered_.count(id) == 0) {
-        return;
+    // A confirmation may come after a restart that forgot who listened: who confirms has heard.
+    const bool fromAnother = found != listeners_.end() && found->second != listener;
+    if (!fromAnother && undelivered_.count(id) != 0) {
+        setDelivered(id);
     }
-    setDelivered(id);
 }
 
 void Uploads::setDelivered(int32_t id)

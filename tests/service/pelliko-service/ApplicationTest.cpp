@@ -32,6 +32,21 @@ protected:
         return nlohmann::json::parse(askServer("GET", "/api/v1/shares"))["shares"][0]["state"];
     }
 
+    // What the service answers, as text; empty when it does not.
+    static std::string callService(const char *method, GVariant *arguments = nullptr)
+    {
+        g_autoptr(GDBusConnection) bus = g_bus_get_sync(G_BUS_TYPE_SESSION, nullptr, nullptr);
+        g_autoptr(GVariant) answer = g_dbus_connection_call_sync(
+            bus, "com.velmora.pelliko.Service", "/com/velmora/pelliko/Service",
+            "com.velmora.pelliko.Service1", method, arguments, nullptr, G_DBUS_CALL_FLAGS_NONE, -1,
+            nullptr, nullptr);
+        if (!answer) {
+            return {};
+        }
+        g_autofree char *text = g_variant_print(answer, FALSE);
+        return text;
+    }
+
     static size_t count(const RecordingApplication &application, const char *operation)
     {
         return static_cast<size_t>(std::count_if(
@@ -124,6 +139,26 @@ TEST_F(ApplicationLaunch, anEndThatNobodyHeardIsKeptUntilItIsAskedFor)
     ASSERT_TRUE(waitForEnd(id));
     EXPECT_EQ(reportsOf(id).back().status, 7);
     ASSERT_TRUE(runUntil([&] { return resume(id) != 0; })) << "a delivered end is told once";
+}
+
+TEST_F(ApplicationLaunch, anEndThatIsConfirmedAfterARestartIsNotToldAgain)
+{
+    startServer();
+    makeAccount();
+    startService();
+    RecordingApplication application;
+    application.resumes = false;
+    server_->signal(SIGSTOP);
+    auto first = client("request", makeFile("photo.jpg", 1000));
+    const int32_t id = idOf(*first);
+    first->end(SIGKILL);
+    server_->signal(SIGCONT);
+    ASSERT_TRUE(runUntil(
+        [&] { return callService("ListRequests").find("'shared'") != std::string::npos; }));
+    service_->end(SIGKILL);
+    startService();
+    callService("ConfirmEnd", g_variant_new("(i)", id));
+    EXPECT_NE(resume(id), 0) << "it counts as told";
 }
 
 TEST_F(ApplicationLaunch, aLaunchWithoutReceiptIsRepeatedAndOneWithIsNot)
