@@ -410,6 +410,18 @@ TEST_F(ConfirmationPopup, StartingServiceOpensTheShareFailurePopupAndOkLeaves)
     }));
 }
 
+TEST_F(ConfirmationPopup, WithoutAShareTheNumberOfRecipientsStays)
+{
+    share(1, 1500, {{"Anna"}});
+    _createPopupView(ad);
+    freeUploadData(ad->upload_item);
+    ad->upload_item = nullptr;
+    log.restart();
+    _createPopupView(ad);
+    EXPECT_EQ(log.messages().front(), "ad->operation_type =4,g_total_recipients =1");
+    EXPECT_EQ(body(), "");
+}
+
 TEST_F(ConfirmationPopup, NullRecordMeansTheApplicationsOwn)
 {
     share(1, 1500, {{"Anna"}});
