@@ -1,8 +1,24 @@
 # Tests run by ctest. A test that needs more than its own files runs in a private world
 # (scripts/session), so that several may run at the same time and nothing is left behind.
 
+# The thread option is for all alike, or the headers compiled beforehand would not fit every program.
+set(pelliko_test_options ${PELLIKO_FEWER_CHECKS} -pthread)
+
 if(PELLIKO_TESTS)
   enable_testing()
+
+  # What nearly every test file begins with, compiled once for all test programs. Only headers of ready-made
+  # parts belong here: a change of our own then never rebuilds it, and each file still includes what it uses.
+  set(pelliko_test_headers_source "${CMAKE_BINARY_DIR}/test-headers.cpp")
+  file(CONFIGURE OUTPUT "${pelliko_test_headers_source}" CONTENT "")
+  add_library(pelliko_test_headers OBJECT "${pelliko_test_headers_source}")
+  set_target_properties(pelliko_test_headers PROPERTIES POSITION_INDEPENDENT_CODE OFF)
+  target_compile_options(pelliko_test_headers PRIVATE -fPIE ${pelliko_test_options})
+  target_link_libraries(pelliko_test_headers PRIVATE pelliko_options GTest::gmock)
+  target_precompile_headers(pelliko_test_headers PRIVATE
+    <gmock/gmock.h> <gtest/gtest.h> <nlohmann/json.hpp>
+    <algorithm> <array> <chrono> <filesystem> <fstream> <functional> <map> <memory> <optional> <string>
+    <string_view> <vector>)
 endif()
 
 # How a world is asked for: what scripts/session is to start beside the two buses.
@@ -18,6 +34,8 @@ function(pelliko_test name)
   add_executable(${name} ${arg_SOURCES})
   set_target_properties(${name} PROPERTIES RUNTIME_OUTPUT_DIRECTORY "${CMAKE_BINARY_DIR}/tests")
   target_link_libraries(${name} PRIVATE pelliko_options ${arg_LIBS} GTest::gmock GTest::gtest_main)
+  target_compile_options(${name} PRIVATE ${pelliko_test_options})
+  target_precompile_headers(${name} REUSE_FROM pelliko_test_headers)
   target_compile_definitions(${name} PRIVATE PELLIKO_SOURCE_DIR="${PROJECT_SOURCE_DIR}"
                                              PELLIKO_BUILD_DIR="${CMAKE_BINARY_DIR}")
   if(NOT arg_SESSION)

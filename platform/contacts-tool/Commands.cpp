@@ -75,7 +75,8 @@ void printJson(const std::vector<ListedNumber> &numbers)
                         {"number", row.number},
                         {"joined", row.joined}});
     constexpr int indentation = 2;
-    std::cout << rows.dump(indentation, ' ', false, nlohmann::ordered_json::error_handler_t::replace)
+    std::cout << rows.dump(indentation, ' ', false,
+                           nlohmann::ordered_json::error_handler_t::replace)
               << '\n';
 }
 

@@ -46,7 +46,8 @@ bool exists(const std::string &path)
 
 std::string drawableIcon(const std::string &image)
 {
-    // A picture of the handset's panel, animated or not, stands for the still icon of the same name.
+    // A picture of the handset's panel, animated or not, stands for the still icon of the same
+    // name.
     if (startsWith(image, "reserved:"))
         return lookUp(pictures, image);
     if (image.empty() || image.find('/') == std::string::npos || exists(image))
