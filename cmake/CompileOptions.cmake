@@ -19,7 +19,7 @@ if(PELLIKO_CCACHE)
   # Without these it never stores what was compiled with a precompiled header.
   set(CMAKE_CXX_COMPILER_LAUNCHER "${CMAKE_COMMAND}" -E env
       CCACHE_SLOPPINESS=pch_defines,time_macros "${PELLIKO_CCACHE}")
-  if(CMAKE_CXX_COMPILER_ID STREQUAL GNU)
+  if(PELLIKO_TESTS AND CMAKE_CXX_COMPILER_ID STREQUAL GNU)
     add_compile_options($<$<COMPILE_LANGUAGE:CXX>:-fpch-preprocess>)
   endif()
 endif()
