@@ -59,7 +59,7 @@ int _countArchiveCb(const char *path, const struct stat *, int type)
 {
     const char *slash = strrchr(path, '/');
     const char *name = slash ? slash + 1 : path;
-    if (type == FTW_F && strncmp(name, "app", 7) == 0)
+    if (type == FTW_F && strcmp(name, "app") == 0)
         ++archive_count;
     return archive_count >= maxCountedArchives ? 1 : 0;
 }

@@ -182,6 +182,8 @@ class Trace(share_case.ShareCase):
                          trace)
         # The known one ends well; the other stays in the table and keeps the application.
         self.wait_posted("Files sent")
+        self.log.wait(lambda lines: any(line.endswith("> Records deleted successfully...")
+                                        for line in lines[self.lines_before:]), "the row to go")
         self.assertEqual([str(other)], self.pending_rows())
         self.assertIsNotNone(self.application.owner)
         os.kill(self.application.process_id(), signal.SIGTERM)

@@ -19,7 +19,7 @@ class FileLog
 public:
     FileLog()
     {
-        std::ofstream(logPath, std::ios::app);
+        const std::ofstream created(logPath, std::ios::app);
         restart();
     }
 
