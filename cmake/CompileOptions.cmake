@@ -48,8 +48,8 @@ if(PELLIKO_SANITIZE)
   add_compile_options(-fsanitize=${PELLIKO_SANITIZE} -fno-omit-frame-pointer -fno-sanitize-recover=undefined)
   add_link_options(-fsanitize=${PELLIKO_SANITIZE})
 endif()
-# For tests and for files that hold little but command-line parsing: these two checks take a third of the
-# time in which template code is compiled. All other code keeps every check.
+# For the test sources themselves: these two checks take a third of the time in which the test framework's
+# templates are compiled. What is tested keeps every check.
 if(PELLIKO_SANITIZE MATCHES undefined)
   set(PELLIKO_FEWER_CHECKS -fno-sanitize=null,alignment)
 endif()

@@ -17,8 +17,6 @@ pkg_check_modules(openssl REQUIRED IMPORTED_TARGET openssl)
 find_package(SQLiteCpp REQUIRED)
 find_package(nlohmann_json REQUIRED)
 find_package(CLI11 REQUIRED)
-# Only the programs' own main files link it.
-set_property(TARGET CLI11::CLI11 APPEND PROPERTY INTERFACE_COMPILE_OPTIONS ${PELLIKO_FEWER_CHECKS})
 find_package(Boost 1.81 REQUIRED)
 find_program(GDBUS_CODEGEN gdbus-codegen REQUIRED)
 if(PELLIKO_TESTS)
