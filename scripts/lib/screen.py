@@ -87,7 +87,7 @@ def press(label, role=None, limit=LIMIT):
     """Waits for a control and presses it with the pointer."""
     extents = wait_for_control(label, role, limit)
     x, y = extents.x + extents.width // 2, extents.y + extents.height // 2
-    run("xdotool", "mousemove", "--sync", str(x), str(y), "click", "1")
+    run("xdotool", "mousemove", str(x), str(y), "click", "1")
 
 
 def key(name):

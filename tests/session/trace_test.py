@@ -62,7 +62,7 @@ This is a joined user. Returning TRUE
 recipient_list is valid
 ad->operation_type =4,g_total_recipients =1
 Setting confirmation_popup_share_view_single
-dget_text = To avoid additional charges, share your files via Wi-Fi only. and dget_text1 = 1 file <br>(1.00KB)
+dget_text = To avoid extra charges, share via Wi\u2011Fi\u00a0only. and dget_text1 = 1 file <br>(1.00KB)
 current_time + 2days=DATE
 Adding recipient- name = Ann Example
 Setting default contact image = /opt/usr/apps/com.velmora.pelliko/res/images/sender-images/WVGA/\
