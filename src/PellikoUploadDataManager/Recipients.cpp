@@ -110,14 +110,14 @@ void _markSmsReceiver(UploadRecipient &recipient)
 
 Step _appendRecipient(UploadItem &item, int32_t number_id, RecipientRecords &records)
 {
-    auto *recipient = new (std::nothrow) UploadRecipient;
+    std::unique_ptr<UploadRecipient> recipient(new (std::nothrow) UploadRecipient);
     if (!recipient) {
         LOG_ERROR("Malloc error");
         return Step::stop;
     }
     _fillRecipient(*recipient, number_id, records);
     _markSmsReceiver(*recipient);
-    item.recipient_list = eina_list_append(item.recipient_list, recipient);
+    item.recipient_list = eina_list_append(item.recipient_list, recipient.release());
     if (item.recipient_list)
         LOG_DEBUG("recipient_list is valid");
     else

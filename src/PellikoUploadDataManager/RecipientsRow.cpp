@@ -5,6 +5,7 @@
 #include "PellikoApp/ThemeLayout.h"
 
 #include <Elementary.h>
+#include <cmath>
 #include <efl_assist.h>
 #include <string>
 #include <uxt_theme.h>
@@ -82,7 +83,7 @@ void _setBadge(Evas_Object *item)
     }
     _tint(badge, "AO004");
     const double scale = elm_config_scale_get() / elm_app_base_scale_get();
-    const int size = static_cast<int>(badgeSize * scale + 0.5);
+    const int size = static_cast<int>(std::lround(badgeSize * scale));
     evas_object_size_hint_min_set(badge, size, size);
     evas_object_size_hint_max_set(badge, size, size);
     elm_object_part_content_set(item, "sms.badge", badge);
