@@ -1,16 +1,15 @@
 #include "AppLog/AppLog.h"
 
+#include "PellikoApp/CText.h"
 #include "PellikoApp/TextFormat.h"
 
 #include <cstdarg>
 #include <cstdio>
-#include <cstdlib>
 #include <cstring>
 #include <ctime>
 #include <dlog.h>
 #include <ftw.h>
 #include <langinfo.h>
-#include <memory>
 #include <mutex>
 #include <optional>
 #include <sys/stat.h>
@@ -37,11 +36,6 @@ constexpr size_t commandSize = 4351;
 std::mutex g_mutex;
 int archive_count = 0;
 bool initialised = false;
-
-struct CFree {
-    void operator()(char *text) const { free(text); }
-};
-using CText = std::unique_ptr<char, CFree>;
 
 // A trace reads the same in every language: "45.500000" also where people write a comma.
 CText _format(const char *format, va_list arguments)

@@ -2,6 +2,7 @@
 
 #include "AppLog/AppLog.h"
 #include "PellikoApp/AppData.h"
+#include "PellikoApp/CText.h"
 #include "PellikoUploadDataManager/PopupLanguage.h"
 
 #include <Elementary.h>
@@ -10,7 +11,6 @@
 #include <cstdlib>
 #include <cstring>
 #include <libintl.h>
-#include <memory>
 #include <string>
 #include <vconf-keys.h>
 #include <vconf.h>
@@ -26,8 +26,6 @@ constexpr const char *domain = "pelliko";
 constexpr const char *defaultEnvironment = "en_GB.utf8";
 constexpr const char *defaultLanguage = "en_GB.UTF-8";
 
-using CText = std::unique_ptr<char, decltype(&free)>;
-
 void _setEnvironment(const char *language)
 {
     setenv("LANG", language, 1);
@@ -38,7 +36,7 @@ void _setEnvironment(const char *language)
 
 std::string _deviceLanguage()
 {
-    const CText language(vconf_get_str(VCONFKEY_LANGSET), free);
+    const CText language(vconf_get_str(VCONFKEY_LANGSET));
     _setEnvironment(language ? language.get() : defaultEnvironment);
     return language ? language.get() : defaultLanguage;
 }
@@ -81,7 +79,7 @@ void _langChanged(app_event_info_h, void *data)
     auto *ad = static_cast<PellikoAppData *>(data);
     const std::string language = _deviceLanguage();
     LOG_DEBUG("Current Lang : %s", language.c_str());
-    const CText resources(app_get_resource_path(), free);
+    const CText resources(app_get_resource_path());
     const std::string dir = std::string(resources ? resources.get() : "") + "locale";
     _initI18n(domain, dir.c_str(), language.c_str());
     _translateWithoutLocale(dir.c_str(), language);

@@ -2,6 +2,7 @@
 
 #include "AppLog/AppLog.h"
 #include "PellikoApp/AppData.h"
+#include "PellikoApp/CText.h"
 #include "PellikoApp/Decimal.h"
 #include "PellikoApp/Language.h"
 #include "PellikoApp/Operation.h"
@@ -19,9 +20,7 @@
 #include <app_preference.h>
 #include <contacts.h>
 #include <cstdio>
-#include <cstdlib>
 #include <cstring>
-#include <memory>
 
 namespace pelliko
 {
@@ -33,11 +32,6 @@ constexpr const char *reshareKey = "pk_reshare";
 constexpr const char *resumeReplyKey = "resume_by_app";
 constexpr double scale = 1.8;
 constexpr size_t themePathSize = 128;
-
-struct CFree {
-    void operator()(char *text) const { free(text); }
-};
-using CText = std::unique_ptr<char, CFree>;
 
 // What the dispatcher reads of every request.
 struct Launch {

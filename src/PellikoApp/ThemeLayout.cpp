@@ -1,11 +1,10 @@
 #include "PellikoApp/ThemeLayout.h"
 
 #include "AppLog/AppLog.h"
+#include "PellikoApp/CText.h"
 
 #include <Elementary.h>
 #include <app_common.h>
-#include <cstdlib>
-#include <memory>
 #include <string>
 
 namespace pelliko
@@ -16,7 +15,7 @@ namespace
 
 std::string _themeFile()
 {
-    const std::unique_ptr<char, decltype(&free)> resources(app_get_resource_path(), free);
+    const CText resources(app_get_resource_path());
     return std::string(resources ? resources.get() : "") + "/edje/pelliko.edj";
 }
 

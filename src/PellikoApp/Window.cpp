@@ -2,6 +2,7 @@
 
 #include "AppLog/AppLog.h"
 #include "PellikoApp/AppData.h"
+#include "PellikoApp/CText.h"
 #include "PellikoApp/ThemeLayout.h"
 
 #include <Ecore_X.h>
@@ -9,10 +10,8 @@
 #include <WApp.h>
 #include <WWindowController.h>
 #include <app_common.h>
-#include <cstdlib>
 #include <efl_util.h>
 #include <iterator>
-#include <memory>
 #include <string>
 #include <uxt_theme.h>
 
@@ -142,7 +141,7 @@ void showMainWindow(PellikoAppData *ad)
 void _changeableGuiInit(app_assist::WApp *, PellikoAppData *ad)
 {
     uxt_theme_set_changeable_ui_enabled(EINA_TRUE);
-    const std::unique_ptr<char, decltype(&free)> resources(app_get_shared_resource_path(), free);
+    const CText resources(app_get_shared_resource_path());
     if (!resources)
         return;
     releaseChangeableGui(ad);

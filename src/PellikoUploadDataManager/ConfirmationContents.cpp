@@ -3,6 +3,7 @@
 #include "AppLog/AppLog.h"
 #include "PellikoApp/AccessibleName.h"
 #include "PellikoApp/AppData.h"
+#include "PellikoApp/CText.h"
 #include "PellikoApp/TextFormat.h"
 #include "PellikoApp/ThemeLayout.h"
 #include "PellikoUploadDataManager/ConfirmationTexts.h"
@@ -10,8 +11,6 @@
 #include "PellikoUploadDataManager/RecipientsRow.h"
 
 #include <Elementary.h>
-#include <cstdlib>
-#include <memory>
 #include <pelliko_client.h>
 
 namespace pelliko
@@ -79,7 +78,7 @@ void _setHeading(PellikoAppData *ad, Evas_Object *layout)
 void _setSummary(Evas_Object *layout, const char *summary)
 {
     elm_object_part_text_set(layout, "elm.text.info", summary);
-    const std::unique_ptr<char, decltype(&free)> plain(elm_entry_markup_to_utf8(summary), free);
+    const CText plain(elm_entry_markup_to_utf8(summary));
     setAccessibleName(layout, plain.get());
 }
 

@@ -2,6 +2,7 @@
 
 #include "AppLog/AppLog.h"
 #include "PellikoApp/AppData.h"
+#include "PellikoApp/CText.h"
 #include "PellikoApp/Decimal.h"
 #include "PellikoApp/TextFormat.h"
 #include "PellikoUploadDataManager/UploadNotiData.h"
@@ -12,7 +13,6 @@
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
-#include <memory>
 
 namespace pelliko
 {
@@ -21,11 +21,6 @@ namespace
 {
 
 constexpr size_t popupDataSize = 20; ///< bytes of the hand-over text with its terminator
-
-struct CFree {
-    void operator()(char *text) const { free(text); }
-};
-using CText = std::unique_ptr<char, CFree>;
 
 struct PopupData {
     int status = 0;
