@@ -1,34 +1,18 @@
 #pragma once
 
+#include <kor_account.h>
+
 #include <optional>
-#include <string>
 
 namespace pelliko::service
 {
 
-/** The user's account at a share server. */
-struct Account {
-    std::string server; ///< base address without a slash at its end
-    std::string number; ///< the user's own phone number
-    std::string token;  ///< secret
-};
-
-/** Where the account is kept when nothing else is said. */
-std::string defaultAccountFile();
+using korrin::Account;
 
 /**
- * Reads the account; PELLIKO_SERVER_URL replaces the server's address.
+ * The account as it is now, for one call to the server; PELLIKO_SERVER_URL replaces its address.
  * @return nothing, with a line in the log, when there is no usable account
  */
-std::optional<Account> readAccount(const std::string &file);
-
-/**
- * Writes the account for the user alone, at once or not at all, and onto the disk.
- * @return empty, or what went wrong as one sentence
- */
-std::string writeAccount(const std::string &file, const Account &account);
-
-/** Why the three parts cannot be an account, as one sentence; empty when they can. */
-std::string accountFault(const Account &account);
+std::optional<Account> usableAccount(const std::string &file);
 
 } // namespace pelliko::service

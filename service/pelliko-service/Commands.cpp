@@ -1,7 +1,5 @@
 #include "Commands.h"
 
-#include "Account.h"
-
 #include "com.velmora.pelliko.Service1.h"
 
 #include <nlohmann/json.hpp>
@@ -81,17 +79,13 @@ void printJson(GVariant *requests)
 }
 } // namespace
 
-int accountCommand(const std::string &file, const std::string &server, const std::string &number)
+int accountCommand(const std::string &file, Account account)
 {
-    Account account{server, number, {}};
     if (!std::getline(std::cin, account.token)) {
         std::fprintf(stderr, "pelliko-service: no token came on standard input\n");
         return 1;
     }
-    std::string fault = accountFault(account);
-    if (fault.empty()) {
-        fault = writeAccount(file, account);
-    }
+    const std::string fault = korrin::writeAccount(file, account);
     if (!fault.empty()) {
         std::fprintf(stderr, "pelliko-service: %s\n", fault.c_str());
         return 1;

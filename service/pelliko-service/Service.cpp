@@ -30,7 +30,7 @@ public:
                    gate_,
                    launcher_,
                    settings,
-                   [&settings] { return readAccount(settings.accountFile); },
+                   [&settings] { return usableAccount(settings.accountFile); },
                    randomFraction},
           uploads_(
               context_,

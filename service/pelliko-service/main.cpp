@@ -48,15 +48,15 @@ int main(int argc, char **argv)
                  "pelliko-service"};
     Settings settings;
     settings.queueFile = UploadQueue::defaultFile();
-    settings.accountFile = defaultAccountFile();
+    settings.accountFile = pelliko::korrin::defaultAccountFile();
     addSettings(app, settings);
 
-    std::string server;
-    std::string number;
+    Account typed;
     CLI::App *account =
         app.add_subcommand("account", "Write the account; the token is read from standard input");
-    account->add_option("--server", server, "Address of the share server")->required();
-    account->add_option("--number", number, "The user's own phone number")->required();
+    account->add_option("--server", typed.server, "Address of the share server")->required();
+    account->add_option("--number", typed.number, "The user's own phone number")->required();
+    account->add_option("--imsi", typed.imsi, "The SIM that the account belongs to");
 
     bool json = false;
     CLI::App *status = app.add_subcommand("status", "Print the requests of the running service");
@@ -65,7 +65,7 @@ int main(int argc, char **argv)
     CLI11_PARSE(app, argc, argv);
 
     if (account->parsed()) {
-        return accountCommand(settings.accountFile, server, number);
+        return accountCommand(settings.accountFile, typed);
     }
     if (status->parsed()) {
         return statusCommand(json);
