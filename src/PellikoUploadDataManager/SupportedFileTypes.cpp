@@ -71,9 +71,14 @@ int _rowOf(const char *extension)
 int supportedExtensionPosition(const char *path)
 {
     const char *dot = path ? strrchr(path, '.') : nullptr;
-    const int row = dot ? _rowOf(dot + 1) : -1;
+    return supportedExtensionRow(dot ? dot + 1 : nullptr);
+}
+
+int supportedExtensionRow(const char *extension)
+{
+    const int row = extension ? _rowOf(extension) : -1;
     if (row >= 0)
-        LOG_DEBUG("extension[%s], match[%s]", dot + 1, supported_extensions[row]);
+        LOG_DEBUG("extension[%s], match[%s]", extension, supported_extensions[row]);
     return row;
 }
 

@@ -8,6 +8,9 @@ namespace pelliko
 /// A match is logged. The file is not touched; null has no extension. Any thread.
 int supportedExtensionPosition(const char *path);
 
+/// The same for an extension that stands alone, "jpg" or "JPG"; null has no row.
+int supportedExtensionRow(const char *extension);
+
 /// The row at a position given by supportedExtensionPosition, for example "jpg"; null outside the
 /// table.
 const char *supportedExtensionAt(int position);
