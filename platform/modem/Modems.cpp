@@ -1,6 +1,7 @@
 #include "Modems.h"
 
 #include "AccountSim.h"
+#include "ModemManagerService.h"
 #include "OfonoService.h"
 #include "SystemBus.h"
 
@@ -25,6 +26,7 @@ ModemList accountStandIn()
 std::vector<std::unique_ptr<ModemService>> knownServices()
 {
     std::vector<std::unique_ptr<ModemService>> services;
+    services.push_back(std::make_unique<ModemManagerService>());
     services.push_back(makeOfonoService());
     return services;
 }

@@ -1,0 +1,91 @@
+#include "ModemManagerSender.h"
+
+#include "ModemManagerSession.h"
+#include "ModemManagerSim.h"
+
+namespace pelliko::modem
+{
+namespace
+{
+
+constexpr size_t longestCharacter = 4;
+
+// A text that was cut at a number of bytes may end inside a character, which the bus does not
+// carry. What is left of it goes: a sign in its place would cost every other character half of its
+// room.
+std::string wholeCharacters(const std::string &text)
+{
+    const auto length = static_cast<gssize>(text.size());
+    const gchar *end = nullptr;
+    if (g_utf8_validate_len(text.c_str(), text.size(), &end))
+        return text;
+    const auto valid = static_cast<size_t>(end - text.c_str());
+    const bool cut = text.size() - valid < longestCharacter &&
+                     g_utf8_get_char_validated(end, length - static_cast<gssize>(valid)) ==
+                         static_cast<gunichar>(-2);
+    if (cut)
+        return text.substr(0, valid);
+    g_autofree gchar *readable = g_utf8_make_valid(text.c_str(), length);
+    return readable;
+}
+
+std::string whyUnusable(SimState sim)
+{
+    switch (sim) {
+    case SimState::Ready:
+        return {};
+    case SimState::Missing:
+        return "there is no SIM in the modem";
+    case SimState::Locked:
+        return "the SIM is locked";
+    case SimState::Unknown:
+        break;
+    }
+    return "the modem is not ready";
+}
+
+MMSms *create(MMModemMessaging *messaging, const std::string &to, const std::string &text,
+              GCancellable *cancellable, GError **error)
+{
+    g_autoptr(MMSmsProperties) properties = mm_sms_properties_new();
+    mm_sms_properties_set_number(properties, to.c_str());
+    mm_sms_properties_set_text(properties, wholeCharacters(text).c_str());
+    return mm_modem_messaging_create_sync(messaging, properties, cancellable, error);
+}
+
+// A store full of old messages would refuse the next one. The message's own fate is decided by
+// then.
+void forget(MMModemMessaging *messaging, MMSms *sms, GCancellable *cancellable)
+{
+    g_autoptr(GError) error = nullptr;
+    if (!mm_modem_messaging_delete_sync(messaging, mm_sms_get_path(sms), cancellable, &error))
+        g_printerr("modem: %s\n", sentence("delete a message from the modem", error).c_str());
+}
+
+} // namespace
+
+std::string sendThrough(MMObject *modem, const std::string &to, const std::string &text,
+                        GCancellable *cancellable)
+{
+    if (std::string reason = whyUnusable(simAccess(mm_object_peek_modem(modem))); !reason.empty())
+        return reason;
+    MMModemMessaging *messaging = mm_object_peek_modem_messaging(modem);
+    if (!messaging)
+        return "the modem cannot send messages";
+    if (to.empty() || !g_utf8_validate_len(to.c_str(), to.size(), nullptr))
+        return "the number cannot be a phone number";
+
+    g_autoptr(GError) error = nullptr;
+    g_autoptr(MMSms) sms = create(messaging, to, text, cancellable, &error);
+    if (!sms)
+        return sentence("make the message", error);
+    // The bus's own limit is shorter than a slow network takes; the cancellable holds the real one.
+    g_dbus_proxy_set_default_timeout(G_DBUS_PROXY(sms), G_MAXINT);
+    const bool sent = mm_sms_send_sync(sms, cancellable, &error);
+    const std::string result = sent ? std::string() : sentence("send the message", error);
+    if (!g_cancellable_is_cancelled(cancellable))
+        forget(messaging, sms, cancellable);
+    return result;
+}
+
+} // namespace pelliko::modem
