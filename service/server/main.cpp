@@ -91,6 +91,10 @@ void addServe(CLI::App &app, ServeOptions &options)
         ->capture_default_str();
     command->add_option("--daily-limit", limits.dailyBytes, "Bytes per account in 24 hours")
         ->capture_default_str();
+    command
+        ->add_option("--daily-numbers", limits.dailyNumbers,
+                     "Numbers per account in 24 hours in questions about who has joined")
+        ->capture_default_str();
     command->add_option("--head-timeout", options.headTimeout, "Seconds for a whole request head")
         ->check(CLI::PositiveNumber)
         ->capture_default_str();

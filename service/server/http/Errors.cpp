@@ -28,6 +28,8 @@ constexpr ErrorEntry table[] = {
     {Error::rangeNotSatisfiable, "range_not_satisfiable", 416,
      "The file does not have the wanted bytes."},
     {Error::dailyLimit, "daily_limit", 429, "The account's limit for 24 hours is used up."},
+    {Error::numbersLimit, "numbers_limit", 429,
+     "The account has asked for too many numbers within 24 hours."},
     {Error::headerTooLarge, "header_too_large", 431, "The request's head is over 16 KiB."},
     {Error::internal, "internal", 500, "The server failed."},
     {Error::noSpace, "no_space", 507, "The store is full."},

@@ -24,6 +24,7 @@ enum class Error {
     unsupportedMediaType,
     rangeNotSatisfiable,
     dailyLimit,
+    numbersLimit,
     headerTooLarge,
     internal,
     noSpace,

@@ -1,6 +1,7 @@
 #include "http/Router.h"
 
 #include "accounts/Accounts.h"
+#include "accounts/Joined.h"
 #include "http/Errors.h"
 #include "pages/Download.h"
 #include "pages/LandingPage.h"
@@ -109,6 +110,10 @@ Task<void> routeApi(Exchange &exchange, Context &context, Parts parts)
     } else if (room == "account" && parts.empty()) {
         requireGet(exchange.request());
         co_await showAccount(exchange, context);
+    } else if (room == "joined" && parts.empty()) {
+        if (exchange.request().method != "POST")
+            refuseMethod("POST");
+        co_await showJoined(exchange, context);
     } else {
         throw Refusal(Error::notFound);
     }

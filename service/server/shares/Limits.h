@@ -13,6 +13,10 @@ struct Limits {
     std::uint64_t shareBytes = std::uint64_t{1} << 30;
     std::uint64_t dailyBytes = std::uint64_t{2} << 30;
     std::int64_t dailyWindow = 86400;
+    /// Numbers in one question about who has joined, and in all questions of an account within
+    /// the daily window. Numbers of one country are tens of millions: asking for all takes decades.
+    std::size_t numbersPerQuestion = 100;
+    std::uint64_t dailyNumbers = 2000;
     /// From the finish to the end of the link.
     std::int64_t shareLifetime = 2 * 86400;
     /// From making a share to giving it up when it is not finished.

@@ -92,6 +92,26 @@ struct FinishResult {
     ShareRecord share;
 };
 
+/// Which of these numbers have accounts, asked by an account that may ask for so many a day.
+struct JoinedQuestion {
+    std::int64_t account = 0;
+    /// Each once.
+    std::vector<std::string> numbers;
+    Seconds now = 0;
+    /// Numbers that the account may name within `limitWindow`, those of this question included.
+    std::uint64_t dailyLimit = 0;
+    Seconds limitWindow = 86400;
+};
+
+struct JoinedAnswer {
+    /// False when the limit is used up: nothing was looked up, nothing counted.
+    bool allowed = true;
+    /// Those of the numbers that have accounts, in the question's order.
+    std::vector<std::string> joined;
+    /// When not allowed: seconds after which the same question fits.
+    Seconds retryAfter = 0;
+};
+
 /// One file as its upload address sees it.
 struct UploadRecord {
     std::string share;
@@ -124,6 +144,10 @@ public:
     /// Bytes that the account announced after `since`.
     virtual std::uint64_t usedBytes(std::int64_t account, Seconds since) = 0;
 
+    /// Counts the numbers towards the account's limit, then tells which of them have accounts. Only
+    /// how many were asked for is kept, never which.
+    virtual JoinedAnswer askJoined(const JoinedQuestion &question) = 0;
+
     virtual CreateResult createShare(const NewShare &share) = 0;
     virtual std::optional<ShareRecord> findShare(std::int64_t account, const std::string &key,
                                                  Seconds now) = 0;
@@ -153,7 +177,7 @@ public:
     /// The earliest deadline of a live share.
     virtual std::optional<Seconds> nextDeadline() = 0;
     /// Forgets the shares that ended at or before `ended`, with their names and numbers, and uses
-    /// at or before `used`, which no limit counts any more.
+    /// and questions at or before `used`, which no limit counts any more.
     virtual void forgetEnded(Seconds ended, Seconds used) = 0;
     /// When the first share that is still remembered ended.
     virtual std::optional<Seconds> earliestEnd() = 0;

@@ -92,6 +92,8 @@ struct SqliteMetadata::Connection {
 
     /// Seconds until the share fits the account's limit; nothing when it fits now.
     std::optional<Seconds> waitForLimit(const NewShare &share);
+    /// Seconds until the question fits the account's limit; nothing when it fits now.
+    std::optional<Seconds> waitForNumbers(const JoinedQuestion &question);
     std::optional<std::int64_t> shareOfKey(const NewShare &share);
     std::int64_t addShareRow(const NewShare &share);
     /// With `blob` the file has bytes that are stored already.

@@ -68,8 +68,17 @@ UPDATE shares SET ended = deadline WHERE state IN (2, 3);
 CREATE INDEX shares_by_end ON shares (ended) WHERE ended IS NOT NULL;
 )sql";
 
+// How many numbers an account has asked for, and when; not which.
+constexpr const char *withQuestions = R"sql(
+CREATE TABLE questions (
+  account INTEGER NOT NULL REFERENCES accounts (id) ON DELETE CASCADE,
+  at INTEGER NOT NULL,
+  numbers INTEGER NOT NULL,
+  PRIMARY KEY (account, at)) WITHOUT ROWID;
+)sql";
+
 /// The way from each version of the layout to the next; a fresh file goes all of it.
-constexpr std::array layouts{firstLayout, withEnds};
+constexpr std::array layouts{firstLayout, withEnds, withQuestions};
 
 bool meansFull(int systemError)
 {

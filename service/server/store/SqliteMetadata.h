@@ -23,6 +23,8 @@ public:
     std::optional<Account> findAccount(const std::string &tokenHash) override;
     std::uint64_t usedBytes(std::int64_t account, Seconds since) override;
 
+    JoinedAnswer askJoined(const JoinedQuestion &question) override;
+
     CreateResult createShare(const NewShare &share) override;
     std::optional<ShareRecord> findShare(std::int64_t account, const std::string &key,
                                          Seconds now) override;

@@ -115,6 +115,7 @@ void SqliteMetadata::forgetEnded(Seconds ended, Seconds used)
     db.write([&] {
         db.query("DELETE FROM shares WHERE ended <= ?", ended).run();
         db.query("DELETE FROM usage WHERE at <= ?", used).run();
+        db.query("DELETE FROM questions WHERE at <= ?", used).run();
     });
 }
 

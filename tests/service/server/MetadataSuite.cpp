@@ -72,6 +72,53 @@ TEST_P(MetadataSuite, ANumberHasOneAccount)
     EXPECT_THAT(m_store->listAccounts(), SizeIs(2));
 }
 
+TEST_P(MetadataSuite, WhoHasJoinedIsToldForExactlyTheNumbersAskedFor)
+{
+    ASSERT_TRUE(m_store->addAccount("+4915112345678", "Berta", std::string(32, '\x05'), 950));
+    ASSERT_TRUE(m_store->addAccount("+447700900123", "Carl", std::string(32, '\x06'), 950));
+    const JoinedQuestion question{
+        m_account, {"+15550000001", "+447700900123", "+4915112345678", "+491511234567"}, 1000, 10};
+    const JoinedAnswer answer = m_store->askJoined(question);
+    EXPECT_TRUE(answer.allowed);
+    EXPECT_THAT(answer.joined, ElementsAre("+447700900123", "+4915112345678"));
+    m_store->removeAccount("+447700900123");
+    EXPECT_THAT(m_store->askJoined(question).joined, ElementsAre("+4915112345678"));
+}
+
+TEST_P(MetadataSuite, QuestionsAboutNumbersAreCountedWithinTheWindow)
+{
+    const auto ask = [&](std::size_t count, Seconds now, std::int64_t account) {
+        return m_store->askJoined(
+            {account, std::vector<std::string>(count, "+15550000001"), now, 5, 100});
+    };
+    EXPECT_TRUE(ask(2, 1000, m_account).allowed);
+    EXPECT_TRUE(ask(1, 1000, m_account).allowed) << "in the same second";
+    m_store.reset();
+    m_store = GetParam().again();
+    EXPECT_TRUE(ask(2, 1040, m_account).allowed) << "up to the limit";
+    const JoinedAnswer refused = ask(1, 1050, m_account);
+    EXPECT_FALSE(refused.allowed);
+    EXPECT_THAT(refused.joined, IsEmpty());
+    EXPECT_EQ(refused.retryAfter, 50);
+    EXPECT_EQ(ask(4, 1050, m_account).retryAfter, 90) << "needs the second question's end too";
+    EXPECT_EQ(ask(6, 1050, m_account).retryAfter, 100) << "never fits";
+    ASSERT_TRUE(m_store->addAccount("+492", "Berta", std::string(32, '\x05'), 950));
+    EXPECT_TRUE(ask(5, 1050, m_store->findAccount(std::string(32, '\x05'))->id).allowed)
+        << "each account has a limit of its own";
+    EXPECT_FALSE(ask(1, 1099, m_account).allowed);
+    EXPECT_TRUE(ask(3, 1100, m_account).allowed) << "refused questions did not count";
+}
+
+TEST_P(MetadataSuite, OldQuestionsAreForgotten)
+{
+    const JoinedQuestion question{m_account, {"+15550000001"}, 1000, 1, 100};
+    EXPECT_TRUE(m_store->askJoined(question).allowed);
+    m_store->forgetEnded(0, 999);
+    EXPECT_FALSE(m_store->askJoined(question).allowed);
+    m_store->forgetEnded(0, 1000);
+    EXPECT_TRUE(m_store->askJoined(question).allowed);
+}
+
 TEST_P(MetadataSuite, EverythingIsThereAfterARestart)
 {
     const ShareRecord share = makeFinished(10, linkHash);

@@ -11,7 +11,7 @@ import harness  # noqa: E402
 
 if __name__ == "__main__":
     harness.PROGRAM = sys.argv.pop(1)
-    suites = ["refusals_suite", "shares_suite", "uploads_suite", "downloads_suite",
+    suites = ["refusals_suite", "shares_suite", "joined_suite", "uploads_suite", "downloads_suite",
               "connections_suite", "expiry_suite", "commands_suite",
               "space_suite"]
     names = sys.argv[1:] or suites
