@@ -1,3 +1,4 @@
+// Which phone numbers have accounts
 #pragma once
 
 #include "http/Context.h"
