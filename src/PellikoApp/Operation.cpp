@@ -6,6 +6,7 @@
 #include "PellikoDatabaseManager/UploadInfoDatabase.h"
 #include "PellikoNotificationManager/UploadNotifications.h"
 #include "PellikoUploadDataManager/ConfirmationPopup.h"
+#include "PellikoUploadDataManager/UploadLimits.h"
 #include "PellikoUploadDataManager/UploadNotiData.h"
 #include "PellikoUploadManager/ExitPolicy.h"
 #include "PellikoUploadManager/UploadStatus.h"
@@ -111,11 +112,24 @@ void _doSendSms(PellikoAppData *ad)
         LOG_DEBUG("operation_type=[%d]", ad->operation_type);
 }
 
+void _leaveRefusedShare(PellikoAppData *ad)
+{
+    ad->wifi_check = 0;
+    if (ad->popup) {
+        evas_object_del(ad->popup);
+        ad->popup = nullptr;
+    }
+    safeExit();
+}
+
 void _doShare(PellikoAppData *ad)
 {
     LOG_DEBUG("Operation Share/Multiple Share");
     ad->is_resume_by_reboot = 0;
-    bypassContactView(ad);
+    if (ad->action_type != ACTION_RESHARE_UPLOAD && checkMaximumTotalUploadExceeded(ad) == -1)
+        _leaveRefusedShare(ad);
+    else
+        bypassContactView(ad);
 }
 
 } // namespace

@@ -7,8 +7,10 @@
 #include "PellikoApp/Dispatch.h"
 #include "PellikoApp/Language.h"
 #include "PellikoApp/Operation.h"
+#include "PellikoApp/Telephony.h"
 #include "PellikoApp/Window.h"
 #include "PellikoDatabaseManager/UploadInfoDatabase.h"
+#include "PellikoKorrinManager/KorrinAccount.h"
 #include "PellikoNotificationManager/NotificationPrimitives.h"
 #include "PellikoUploadManager/ExitPolicy.h"
 #include "PellikoUploadManager/UsagePreferences.h"
@@ -81,6 +83,20 @@ bool _readReshare(PellikoAppData *ad, const char *reshare)
     return true;
 }
 
+// A share needs the account. While the user signs in, nothing of ours may lie above that screen.
+void _runWithAccount(PellikoAppData *ad)
+{
+    const bool share =
+        ad->operation_type == OPERATION_SHARE || ad->operation_type == OPERATION_MULTI_SHARE;
+    if (!share || isKorAccountExist()) {
+        doOperation(ad);
+        return;
+    }
+    const int launched = launchKorLoginScreen(ad);
+    LOG_DEBUG("launchKorLoginScreen return %d", launched);
+    _hideWindow(ad);
+}
+
 } // namespace
 
 bool PellikoApp::onCreate()
@@ -89,6 +105,7 @@ bool PellikoApp::onCreate()
     _resetPreferences();
     elm_app_base_scale_set(scale);
     PellikoAppData *ad = getAppData();
+    initKor();
     app_event_handler_h language_handler = nullptr;
     ui_app_add_event_handler(&language_handler, APP_EVENT_LANGUAGE_CHANGED, _langChanged, ad);
     _langChanged(nullptr, ad);
@@ -97,7 +114,7 @@ bool PellikoApp::onCreate()
     const int error = contacts_connect();
     if (error != CONTACTS_ERROR_NONE)
         LOG_ERROR("contacts_connect failed : error = %d", error);
-    ad->sim_index = 0;
+    startTelephony(ad);
     createTableUploadInfoDb();
     return true;
 }
@@ -123,7 +140,7 @@ void PellikoApp::onAppControl(app_control_h request, bool)
     LOG_DEBUG("operation = %s, mime = %s, reshare = %s", textOrNull(launch.operation.get()),
               textOrNull(launch.mime.get()), textOrNull(reshare.get()));
     if (dispatch(launch, ad) == Next::run)
-        doOperation(ad);
+        _runWithAccount(ad);
     else if (!ad->popup)
         _hideWindow(ad); // the clear window lies above everything and would swallow every touch
 }

@@ -17,7 +17,7 @@ sys.dont_write_bytecode = True
 import source_tree  # noqa: E402
 
 # The platform's own header names; all its other headers begin with a lower-case letter.
-PUBLIC_NAMES = {"WApp.h", "WWindowController.h"}
+PUBLIC_NAMES = {"ITapiNetwork.h", "ITapiSim.h", "WApp.h", "WWindowController.h"}
 
 # Beginning of the include, the files that may have it, and what to use instead.
 LIBRARIES = [

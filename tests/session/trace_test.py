@@ -16,6 +16,7 @@ Current Lang : L
 _initI18n setlocale = L
 _initI18n bindtextdomain domain = pelliko
 _initI18n textdomain domain = pelliko
+tapi_ready_state isn't yet ready !!
 DB Opened Successfully.
 SQL query framed is = CREATE TABLE IF NOT EXISTS 'UPLOAD_INFO' (req_id INT PRIMARY KEY NOT NULL, \
 total_files INT, total_size INT, file_list VARCHAR, recipient_list VARCHAR, recipient_index_list VARCHAR);
@@ -49,7 +50,9 @@ files_list exists, count = 1
 Upload item: file_count = 1, files_size = 2000, before_files_size = 2000
 data/to array len = 1, ret = 0\x20
 number_id_list[0]={ann}
+enhanced feature registered
 Operation Share/Multiple Share
+nothing exceeded, can upload!
 phone number case
 **************************
 number_id = {ann}

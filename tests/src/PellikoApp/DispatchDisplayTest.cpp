@@ -5,6 +5,7 @@
 #include "PellikoUploadManager/ExitPolicy.h"
 #include "support/FileLog.h"
 #include "support/LaunchRequest.h"
+#include "support/SignedIn.h"
 
 #include <Elementary.h>
 #include <fstream>
@@ -56,6 +57,7 @@ protected:
     bool windowIsShown() const { return ad->win && evas_object_visible_get(ad->win); }
 
     static inline OpenApp *app = nullptr;
+    test::SignedIn account;
     PellikoAppData *ad = getAppData();
     test::FileLog log;
 };
@@ -126,6 +128,33 @@ TEST_F(Dispatch, ShareEndsAResumeAndReshareIsForgottenByTheNextShare)
     EXPECT_EQ(ad->action_type, ACTION_UPLOAD);
     EXPECT_EQ(ad->operation_type, OPERATION_SHARE);
     EXPECT_EQ(ad->req_id_to_reshare, 5);
+}
+
+TEST_F(Dispatch, ShareBeyondALimitTakesThePopupAwayAndLetsTheApplicationGo)
+{
+    share("/tmp/a.jpg");
+    ad->wifi_check = 1;
+    std::ofstream("/tmp/empty.jpg");
+    log.restart();
+    share("/tmp/empty.jpg");
+    EXPECT_EQ(ad->popup, nullptr);
+    EXPECT_EQ(ad->wifi_check, 0);
+    const std::vector<std::string> messages = log.messages();
+    ASSERT_GE(messages.size(), 2u);
+    EXPECT_EQ(messages.end()[-2], "Operation Share/Multiple Share");
+    EXPECT_EQ(messages.back(), "No upload_data request id exist so app is exiting");
+}
+
+// Its files are at the server already.
+TEST_F(Dispatch, ReshareIsNotHeldAgainstTheLimits)
+{
+    std::ofstream("/tmp/empty.jpg");
+    share("/tmp/empty.jpg");
+    LaunchRequest reshare;
+    app_control_set_operation(reshare, APP_CONTROL_OPERATION_SHARE);
+    reshare.text("pk_reshare", "5");
+    app->onAppControl(reshare, false);
+    EXPECT_NE(ad->popup, nullptr);
 }
 
 TEST_F(Dispatch, OperationsWithoutAMeaningDoNothing)
