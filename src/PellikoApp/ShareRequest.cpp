@@ -5,6 +5,7 @@
 #include "PellikoApp/TextFormat.h"
 #include "PellikoUploadDataManager/SupportedFileTypes.h"
 #include "PellikoUploadManager/ExitPolicy.h"
+#include "PellikoVelmoraLog/PellikoVelmoraLog.h"
 
 #include <Ecore_File.h>
 #include <algorithm>
@@ -29,6 +30,7 @@ constexpr const char *uploadResumeKey = "upload_resume";
 constexpr const char *typeNotSupportedId = "IDS_RSH_TPOP_CANT_SHARE_FILES_FILE_TYPE_NOT_SUPPORTED";
 constexpr const char *deviceErrorId =
     "IDS_RSH_BODY_UNABLE_TO_UPLOAD_FILES_A_DEVICE_ERROR_HAS_OCCURRED_ABB";
+constexpr int notSupportedReason = 2; ///< of a refused share in the usage log
 constexpr size_t toastSize = 512;
 constexpr size_t memoPathSize = 128;
 constexpr size_t pathSize = 1025;
@@ -74,6 +76,7 @@ void _refuseUnsupportedType(const char *message)
 {
     LOG_DEBUG("%s", message);
     _postToast(typeNotSupportedId);
+    PellikoVelmoraLog::getInstance()->insertVelmoraLogShareReject(notSupportedReason);
     safeExit();
 }
 

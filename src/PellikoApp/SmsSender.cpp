@@ -4,6 +4,7 @@
 #include "PellikoApp/Decimal.h"
 #include "PellikoApp/TextFormat.h"
 #include "PellikoUploadManager/UsagePreferences.h"
+#include "PellikoVelmoraLog/PellikoVelmoraLog.h"
 
 #include <cstdlib>
 #include <cstring>
@@ -182,6 +183,7 @@ void _sendSms(const SmsJob &job)
         _sendOne(handle, number.c_str(), text, job.sim_index);
     if (msg_close_msg_handle(&handle) != MSG_SUCCESS)
         LOG_ERROR("msg_close_msg_handle Failed");
+    PellikoVelmoraLog::getInstance()->insertVelmoraLogSendSms();
 }
 
 void runSmsJob(const SmsJob &job)

@@ -7,6 +7,7 @@
 #include "PellikoUploadDataManager/SupportedFileTypes.h"
 #include "PellikoUploadDataManager/UploadNotiData.h"
 #include "PellikoUploadManager/UploadStatus.h"
+#include "PellikoVelmoraLog/PellikoVelmoraLog.h"
 
 #include <cstdio>
 #include <glib.h>
@@ -81,11 +82,15 @@ struct StrvFree {
 };
 using PathArray = std::unique_ptr<char *, StrvFree>;
 
+// Bytes of the files of the last new upload that exist. A reshare, whose files are not read, is
+// counted with it.
+uint32_t g_total_size = 0;
+
 // The files of a share as the service and, later, the node keep them.
 struct FileArrays {
     PathArray paths; ///< null-terminated
     int count = 0;
-    uint32_t total_size = 0; ///< bytes of the files that exist
+    std::vector<const char *> types; ///< for the usage log, one per file, null when there is none
 };
 
 FileArrays _collectFiles(const Eina_List *files)
@@ -94,15 +99,17 @@ FileArrays _collectFiles(const Eina_List *files)
     arrays.count = static_cast<int>(eina_list_count(files));
     LOG_DEBUG("Files count = %d", arrays.count);
     arrays.paths.reset(g_new0(char *, static_cast<gsize>(arrays.count) + 1));
+    g_total_size = 0;
     const char *type = nullptr;
     int index = 0;
     for (const Eina_List *l = files; l; l = eina_list_next(l)) {
         const auto *path = static_cast<const char *>(eina_list_data_get(l));
         arrays.paths.get()[index++] = g_strdup(path);
         type = _uploadFileType(path, type);
+        arrays.types.push_back(type);
         struct stat info;
         if (stat(path, &info) == 0)
-            arrays.total_size += static_cast<uint32_t>(info.st_size);
+            g_total_size += static_cast<uint32_t>(info.st_size);
     }
     return arrays;
 }
@@ -162,9 +169,12 @@ int uploadStart(PellikoAppData *ad)
 
     node->total_files = files.count;
     node->file_list = files.paths.release();
-    node->total_size = static_cast<int32_t>(files.total_size);
+    node->total_size = static_cast<int32_t>(g_total_size);
     ad->upload_item->request_id = node->request_id;
     _recordRequest(node);
+    PellikoVelmoraLog::getInstance()->insertVelmoraLogShareVia(
+        ad, recipients.count(), files.types.data(), files.count, static_cast<uint8_t>(wifi_only),
+        files.count, g_total_size);
     return 0;
 }
 
@@ -192,6 +202,8 @@ int reshareUploadStart(PellikoAppData *ad)
         node->total_size = ad->upload_item->files_size;
     }
     _recordRequest(node);
+    PellikoVelmoraLog::getInstance()->insertVelmoraLogShareVia(
+        ad, recipients.count(), nullptr, 0, static_cast<uint8_t>(wifi_only), 0, g_total_size);
     return 0;
 }
 

@@ -79,6 +79,19 @@ extension[jpg], match[jpg]
 Is upload wifi only = 0
 upload_noti_data_new_node->noti_priv_id = {request}
 Records created successfully...
+type: 0, feature: PK01 [Pelliko_Share via], extra: (null), value: (null)
+recipient_count = 1, ct_app_id = (null)
+share_via_to: Recent_personal
+type: 0, feature: PK02 [Pelliko_Share via_to], extra: Recent_personal, value: (null)
+contents_types_length = 1
+content_type[0] = jpg
+extension[jpg], match[jpg]
+### share_via_contents_type: Photo
+type: 0, feature: PK03 [Pelliko_Share via_Contents type], extra: Photo, value: (null)
+file_count: 1 [1_10]
+type: 0, feature: PK05 [Pelliko_Share via_filecount], extra: 1_10, value: (null)
+file_size: 2000 [0_100MB]
+type: 0, feature: PK06 [Pelliko_Share via_filesize], extra: 0_100MB, value: (null)
 """ + PREPARING + """\
 node->request_id = {request}
 node->noti_priv_id = %p

@@ -233,8 +233,11 @@ TEST_F(PellikoApp, UnsupportedFileEndsTheApplication)
     ASSERT_EQ(share({"--uri", "/tmp/a.zip"}).status, 0);
     EXPECT_TRUE(app.waitForExit());
     EXPECT_THAT(messagesFrom("Unsupported file type. Exiting App."),
-                ElementsAre("Unsupported file type. Exiting App.", noUploads,
-                            "_parseSingleDataPath failed!"));
+                ElementsAre("Unsupported file type. Exiting App.",
+                            "reject_reason: not_supported_files",
+                            "type: 0, feature: PK07 [Pelliko_Share_reject], extra: "
+                            "not_supported_files, value: (null)",
+                            noUploads, "_parseSingleDataPath failed!"));
 }
 
 TEST_F(PellikoApp, ShareWithoutAUriIsRefusedAndTheProcessStays)
@@ -328,6 +331,8 @@ TEST_F(PellikoApp, MessagesAreSentAndTheProcessLeaves)
                       std::string("sms to msisdn array len = 1, ret = 0 "),
                       std::string("Send SMS to receiver"), std::string("operation_type=[2]"),
                       std::string("to_msisdn_count=1"), std::string("SIM index = 0"),
+                      std::string("type: 0, feature: PK09 [Pelliko_Send_SMS notification], extra: "
+                                  "(null), value: (null)"),
                       std::string("Updating preference for sms_done with value = 1"),
                       std::string("req_id = 9"), std::string(noUploads)}));
 }

@@ -2,6 +2,7 @@
 #include "support/FileLog.h"
 #include "support/LaunchRequest.h"
 #include "support/PanelHistory.h"
+#include "support/UsageRecords.h"
 
 #include <Ecore.h>
 #include <filesystem>
@@ -30,6 +31,9 @@ constexpr const char *typeNotSupported = "IDS_RSH_TPOP_CANT_SHARE_FILES_FILE_TYP
 constexpr const char *deviceError =
     "IDS_RSH_BODY_UNABLE_TO_UPLOAD_FILES_A_DEVICE_ERROR_HAS_OCCURRED_ABB";
 constexpr const char *exiting = "No upload_data request id exist so app is exiting";
+constexpr const char *reason = "reject_reason: not_supported_files";
+constexpr const char *refused =
+    "type: 0, feature: PK07 [Pelliko_Share_reject], extra: not_supported_files, value: (null)";
 const std::string keyNotFound = std::to_string(APP_CONTROL_ERROR_KEY_NOT_FOUND);
 
 class ShareRequest : public ::testing::Test
@@ -81,6 +85,7 @@ protected:
     const std::string folder = "/tmp/share-request";
     PellikoAppData ad;
     FileLog log;
+    const test::UsageRecords usage;
 };
 
 // One file
@@ -120,7 +125,9 @@ TEST_F(ShareRequest, UnsupportedTypeIsToldAndLeaves)
 {
     EXPECT_EQ(single("file://" + file("a.zip")), -1);
     EXPECT_THAT(files(), IsEmpty());
-    EXPECT_THAT(log.messages(), ElementsAre("Unsupported file type. Exiting App.", exiting));
+    EXPECT_THAT(log.messages(),
+                ElementsAre("Unsupported file type. Exiting App.", reason, refused, exiting));
+    EXPECT_THAT(usage.features(), ElementsAre("PK07 not_supported_files"));
     EXPECT_EQ(test::toasts().back(), typeNotSupported);
 }
 
@@ -234,9 +241,11 @@ TEST_F(ShareRequest, FileUriInAListIsTakenWhateverItsTypeAndSize)
 TEST_F(ShareRequest, ListWithoutAnySupportedFileIsToldAndLeaves)
 {
     EXPECT_EQ(multiple({file("a.zip")}), -1);
-    EXPECT_THAT(log.messages(), ElementsAre("array len = 1, ret = 0 ",
-                                            "Total unsupported files are = 1", "files list empty",
-                                            "All files are unsupported. Exiting App.", exiting));
+    EXPECT_THAT(log.messages(),
+                ElementsAre("array len = 1, ret = 0 ", "Total unsupported files are = 1",
+                            "files list empty", "All files are unsupported. Exiting App.", reason,
+                            refused, exiting));
+    EXPECT_THAT(usage.features(), ElementsAre("PK07 not_supported_files"));
     EXPECT_EQ(test::toasts().back(), typeNotSupported);
 }
 

@@ -3,6 +3,7 @@
 #include "PellikoUploadManager/UsagePreferences.h"
 #include "support/AppWorld.h"
 #include "support/Catalogue.h"
+#include "support/UsageRecords.h"
 
 #include <app_control.h>
 #include <app_preference.h>
@@ -19,6 +20,7 @@ namespace
 
 constexpr const char *textId =
     "IDS_RSH_BODY_FILES_HAVE_BEEN_SHARED_VIA_PELLIKO_C_NP1SS_HEXPIRES_C_P2SS_ABB";
+constexpr const char *sendSms = "PK09 [Pelliko_Send_SMS notification]";
 constexpr const char *may5 = "1777982400"; // 2026-05-05 12:00 UTC
 
 class SmsSender : public AppWorld
@@ -76,6 +78,7 @@ protected:
     }
 
     app_control_h request = nullptr;
+    const UsageRecords usage;
 
 private:
     Catalogue texts_;
@@ -144,7 +147,9 @@ TEST_F(SmsSender, ThreeRecipientsGetThreeMessagesWithTheSameText)
                           "to_msisdn_count=3\n"
                           "SIM index = 0\n"
                           "SIM index = 0\n"
-                          "SIM index = 0\n");
+                          "SIM index = 0\n" +
+                              usageLine(sendSms));
+    EXPECT_EQ(usage.features(), std::vector<std::string>{"PK09"});
 }
 
 TEST_F(SmsSender, TheSecondSimSendsFromTheSecondSlot)
@@ -211,6 +216,7 @@ TEST_F(SmsSender, WithoutWhatIsNeededNothingIsSent)
         EXPECT_EQ(log.text(), "Fail:Invalid Input Parameter\n");
     }
     EXPECT_TRUE(sent().empty());
+    EXPECT_TRUE(usage.features().empty());
 }
 
 TEST_F(SmsSender, ANegativeFileCountMakesAnEmptyText)
@@ -223,7 +229,8 @@ TEST_F(SmsSender, ANegativeFileCountMakesAnEmptyText)
     EXPECT_EQ(log.text(), "expired_time=1777982400\n"
                           "invalid file_count -1\n"
                           "to_msisdn_count=1\n"
-                          "SIM index = 0\n");
+                          "SIM index = 0\n" +
+                              usageLine(sendSms));
     ASSERT_EQ(sent().size(), 1u);
     EXPECT_EQ(sent()[0]["text"], "");
 }
@@ -253,7 +260,9 @@ TEST_F(SmsSender, AFailedSendGoesOnWithTheNext)
                           "SIM index = 0\n"
                           "msg_sms_send_message Failed\n"
                           "SIM index = 0\n"
-                          "msg_sms_send_message Failed\n");
+                          "msg_sms_send_message Failed\n" +
+                              usageLine(sendSms));
+    EXPECT_EQ(usage.features(), std::vector<std::string>{"PK09"});
 }
 
 TEST_F(SmsSender, TheMessagesAreDoneEvenWhenEverySendFailed)
@@ -318,8 +327,8 @@ TEST_F(SmsSender, TheWorkerAnnouncesThatTheMessagesAreDone)
     EXPECT_EQ(worker, "expired_time=1777982400\n"
                       "to_msisdn_count=2\n"
                       "SIM index = 0\n"
-                      "SIM index = 0\n"
-                      "Updating preference for sms_done with value = 1\n");
+                      "SIM index = 0\n" +
+                          usageLine(sendSms) + "Updating preference for sms_done with value = 1\n");
     EXPECT_EQ(onLoop, "req_id = 7\n"
                       "No upload_data request id exist so app is exiting\n");
 }

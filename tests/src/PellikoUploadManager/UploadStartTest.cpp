@@ -1,6 +1,7 @@
 #include "PellikoUploadManager/UploadStart.h"
 #include "PellikoUploadManager/UploadStatus.h"
 #include "support/AppWorld.h"
+#include "support/UsageRecords.h"
 
 #include <cstdlib>
 #include <filesystem>
@@ -61,6 +62,8 @@ protected:
         return path;
     }
 
+    const UsageRecords usage;
+
     static std::string fileType(const std::string &path, const char *previous = nullptr)
     {
         const char *type = _uploadFileType(path.c_str(), previous);
@@ -104,7 +107,39 @@ TEST_F(UploadStart, AnAcceptedShareIsInTheListTheTableAndTheService)
                           "extension[MP4], match[mp4]\n"
                           "Is upload wifi only = 0\n"
                           "upload_noti_data_new_node->noti_priv_id = " +
-                              id + "\nRecords created successfully...\n");
+                              id + "\nRecords created successfully...\n" +
+                              usageLine("PK01 [Pelliko_Share via]") +
+                              "recipient_count = 2, ct_app_id = (null)\n"
+                              "share_via_to: Recent_group\n" +
+                              usageLine("PK02 [Pelliko_Share via_to]", "Recent_group") +
+                              "contents_types_length = 2\n"
+                              "content_type[0] = jpg\n"
+                              "extension[jpg], match[jpg]\n"
+                              "### share_via_contents_type: Photo\n" +
+                              usageLine("PK03 [Pelliko_Share via_Contents type]", "Photo") +
+                              "content_type[1] = mp4\n"
+                              "extension[mp4], match[mp4]\n"
+                              "### share_via_contents_type: Video\n" +
+                              usageLine("PK03 [Pelliko_Share via_Contents type]", "Video") +
+                              "file_count: 2 [1_10]\n" +
+                              usageLine("PK05 [Pelliko_Share via_filecount]", "1_10") +
+                              "file_size: 2000 [0_100MB]\n" +
+                              usageLine("PK06 [Pelliko_Share via_filesize]", "0_100MB"));
+    EXPECT_EQ(usage.features(),
+              (std::vector<std::string>{"PK01", "PK02 Recent_group", "PK03 Photo", "PK03 Video",
+                                        "PK05 1_10", "PK06 0_100MB"}));
+}
+
+TEST_F(UploadStart, ATypeCarriedOverIsCountedWithItsKind)
+{
+    shareInHand({file("first.xyz", 1), file("a.txt", 1), file("b.xyz", 1)});
+    ad->wifi_check = 1;
+    ASSERT_EQ(uploadStart(ad), 0);
+    EXPECT_EQ(usage.features(),
+              (std::vector<std::string>{"PK01", "PK02 Recent_personal", "PK03 Memo", "PK04",
+                                        "PK05 1_10", "PK06 0_100MB"}));
+    EXPECT_TRUE(log.has("content_type[0] = (null)"));
+    EXPECT_TRUE(log.has("content_type[2] = txt"));
 }
 
 TEST_F(UploadStart, WithoutACountryCodeTheUploadGoesOn)
@@ -207,6 +242,7 @@ TEST_F(UploadStart, ARefusedReshareLeavesANodeWithoutId)
     ASSERT_NE(g_upload_noti_data_list, nullptr);
     EXPECT_EQ(g_upload_noti_data_list->request_id, 0);
     EXPECT_EQ(ad->reshared_request_id, 0);
+    EXPECT_TRUE(usage.features().empty());
 }
 
 TEST_F(UploadStart, ACancelledUploadReportsItsEndToTheStatusCallback)

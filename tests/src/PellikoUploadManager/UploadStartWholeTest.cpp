@@ -2,6 +2,7 @@
 #include "PellikoUploadManager/UploadStart.h"
 #include "platform/quickpanel/support/RecordingApplication.h"
 #include "support/AppWorld.h"
+#include "support/UsageRecords.h"
 
 #include <ctime>
 #include <fstream>
@@ -78,6 +79,22 @@ protected:
                "\nAdding status = " + std::to_string(state) + "\nAdding request id = " + request +
                "\nAdding total size = " + std::to_string(size) + "\nPopulating tag from " + from +
                "...\nRequest id found = " + id + "\nnode->noti_priv_id = " + id + "\n";
+    }
+
+    static std::string usageStart()
+    {
+        return usageLine("PK01 [Pelliko_Share via]") +
+               "recipient_count = 1, ct_app_id = (null)\n"
+               "share_via_to: Recent_personal\n" +
+               usageLine("PK02 [Pelliko_Share via_to]", "Recent_personal");
+    }
+
+    static std::string usageEnd(const std::string &count, const std::string &bucket, int size)
+    {
+        return "file_count: " + count + "\n" +
+               usageLine("PK05 [Pelliko_Share via_filecount]", bucket) +
+               "file_size: " + std::to_string(size) + " [0_100MB]\n" +
+               usageLine("PK06 [Pelliko_Share via_filesize]", "0_100MB");
     }
 
     std::string ofNode(int state, int files, long size)
@@ -234,10 +251,14 @@ TEST_F(WholeUpload, AShareWritesTheseLinesUntilItIsSent)
                      "extension[jpg], match[jpg]\n"
                      "Is upload wifi only = 0\n"
                      "upload_noti_data_new_node->noti_priv_id = " +
-                         id +
-                         "\nRecords created successfully...\n"
-                         "Request id found = " +
-                         id + "\nAdding new notification with title = <Preparing to upload>\n" +
+                         id + "\nRecords created successfully...\n" + usageStart() +
+                         "contents_types_length = 1\n"
+                         "content_type[0] = jpg\n"
+                         "extension[jpg], match[jpg]\n"
+                         "### share_via_contents_type: Photo\n" +
+                         usageLine("PK03 [Pelliko_Share via_Contents type]", "Photo") +
+                         usageEnd("1 [1_10]", "1_10", 2000) + "Request id found = " + id +
+                         "\nAdding new notification with title = <Preparing to upload>\n" +
                          ofItem(1, id, 2000) +
                          "_notificationInsert success\n"
                          "node->request_id = " +
@@ -268,6 +289,10 @@ TEST_F(WholeUpload, AReshareOfAFinishedShareWritesTheseLinesUntilItIsSent)
     run(ACTION_UPLOAD);
     const int earlier = atoi(id.c_str());
     EXPECT_EQ(ad->reshared_request_id, 0);
+    // A reshare reads no files: it is counted with the size of the last upload of this process.
+    constexpr int earlier_size = 6;
+    shareInHand({file("d.txt", earlier_size)});
+    run(ACTION_UPLOAD);
 
     shareInHand({});
     pelliko_upload_info_h info = nullptr;
@@ -287,9 +312,9 @@ TEST_F(WholeUpload, AReshareOfAFinishedShareWritesTheseLinesUntilItIsSent)
                      "Is reshare upload wifi only = 0\n"
                      "Calling Service Api to start reshare upload...\n"
                      "upload_noti_data_new_node->noti_priv_id = " +
-                         id +
-                         "\nRecords created successfully...\n"
-                         "Request id found = " +
+                         id + "\nRecords created successfully...\n" + usageStart() +
+                         "contents_types_length = 0\n" +
+                         usageEnd("0 [(null)]", "(null)", earlier_size) + "Request id found = " +
                          id + "\nAdding new notification with title = <Preparing to upload>\n" +
                          ofItem(0, "0", 5000) +
                          "_notificationInsert success\n"
@@ -309,8 +334,8 @@ TEST_F(WholeUpload, AReshareOfAFinishedShareWritesTheseLinesUntilItIsSent)
     ASSERT_GE(reports.size(), 2u);
     expectNotified(reports[reports.size() - 2], 3, 5000);
     expectSent(reports.back(), 3, 5000,
-               "Updating preference for share_total_size with value = 10000\n");
-    expectMessagesAskedFor(1, "3");
+               "Updating preference for share_total_size with value = 10006\n");
+    expectMessagesAskedFor(2, "3");
 }
 
 } // namespace

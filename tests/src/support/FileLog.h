@@ -37,7 +37,8 @@ public:
         return all;
     }
 
-    /// The messages alone.
+    /// The messages alone. What the usage log answers is left out: it comes whenever the loop is
+    /// free, between any two others.
     std::vector<std::string> messages() const
     {
         std::vector<std::string> all = lines();
@@ -45,6 +46,10 @@ public:
             const size_t end = line.find(") > ");
             line = end == std::string::npos ? line : line.substr(end + 4);
         }
+        std::erase_if(all, [](const std::string &message) {
+            return message.starts_with("request ID[") &&
+                   message.find("] completed, uri[") != std::string::npos;
+        });
         return all;
     }
 

@@ -1,0 +1,55 @@
+#pragma once
+
+#include <filesystem>
+#include <fstream>
+#include <glib.h>
+#include <nlohmann/json.hpp>
+#include <string>
+#include <vector>
+
+namespace pelliko::test
+{
+
+/// The file that the usage log keeps for the user of this world.
+inline std::filesystem::path usageFile()
+{
+    return std::filesystem::path(g_get_user_state_dir()) / "velmora" / "usage.jsonl";
+}
+
+/// What the trace says before a record is made: usageLine("PK01 [Pelliko_Share via]").
+inline std::string usageLine(const std::string &feature, const std::string &extra = "(null)")
+{
+    return "type: 0, feature: " + feature + ", extra: " + extra + ", value: (null)\n";
+}
+
+/// The usage records that were made from here on.
+class UsageRecords
+{
+public:
+    UsageRecords() { std::filesystem::remove(usageFile()); }
+
+    /// Every record as it stands in the file.
+    std::vector<nlohmann::json> all() const
+    {
+        std::vector<nlohmann::json> records;
+        std::ifstream in(usageFile());
+        for (std::string line; std::getline(in, line);)
+            records.push_back(nlohmann::json::parse(line));
+        return records;
+    }
+
+    /// "PK05 1_10", or "PK01" for a record without extra, in order.
+    std::vector<std::string> features() const
+    {
+        std::vector<std::string> texts;
+        for (const nlohmann::json &record : all()) {
+            std::string text = record.at("feature");
+            if (record.contains("extra"))
+                text += " " + record.at("extra").get<std::string>();
+            texts.push_back(text);
+        }
+        return texts;
+    }
+};
+
+} // namespace pelliko::test
