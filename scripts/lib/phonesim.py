@@ -1,0 +1,323 @@
+#!/usr/bin/python3
+"""A simulated phone: one or two modems that speak AT over TCP, and the real ofonod that drives them.
+
+  phonesim.py run --imsi IMSI[,IMSI2] --state DIR --outbox FILE --control SOCKET [--ready-fd N]
+  phonesim.py tell SOCKET COMMAND [ARGUMENT...]
+
+Messages that the network takes are appended to FILE as JSON lines (to, text, sim, time), put together from
+their parts. Commands, sent as one line to SOCKET and answered by one line once they are done ("ok", or what
+failed); SLOT counts from 1:
+
+  refuse SLOT        the network refuses every message       accept SLOT   and takes them again
+  silent SLOT        messages are never answered             drop SLOT     the modem closes its line
+  sim SLOT missing|locked|ready|IMSI                         the SIM, as it is when the modem is next powered
+  power SLOT on|off  switches the modem as the phone's shell does
+  enter-pin SLOT PIN                                         unlocks the SIM (the PIN is 1234)
+  service start|stop|kill                                    the modem service
+  wait-message SLOT  answers when the modem has been handed a message's first part from now on
+
+The outer process ends its ofonod when it ends.
+"""
+
+import argparse
+import asyncio
+import json
+import os
+import re
+import signal
+import socket
+import sys
+import time
+
+sys.path.insert(0, os.path.dirname(os.path.abspath(__file__)))
+sys.dont_write_bytecode = True
+
+from sms_pdu import Assembler, decode_submit  # noqa: E402
+
+PIN = "1234"
+LIMIT = 30
+# What a modem of this kind answers where no state is involved.
+FIXED = {
+    "+CGMI": "Pelliko", "+CGMM": "Simulated", "+CGMR": "1.0", "+CGSN": "356938035643809",
+    "+CSCS=?": '+CSCS: ("GSM","UTF-8")', "+CSCS?": '+CSCS: "GSM"',
+    "+CSMS=?": "+CSMS: (0,1)", "+CSMS?": "+CSMS: 1,1,1,1", "+CSMS=1": "+CSMS: 1,1,1",
+    "+CMGF=?": "+CMGF: (0,1)", "+CPMS=?": '+CPMS: ("SM","ME"),("SM","ME"),("SM","ME")',
+    "+CNMI=?": "+CNMI: (0-2),(0-3),(0-3),(0-2),(0,1)", "+CSCA?": '+CSCA: "+491710760000",145',
+    "+CPIN=?": None, "+CPWD=?": '+CPWD: ("SC",8)', "+CREG=?": "+CREG: (0-2)", "+CREG?": '+CREG: 2,1,"0001","0001"',
+    "+COPS?": '+COPS: 0,2,"26201"', "+CSQ": "+CSQ: 20,99", "+CIND=?": '+CIND: ("signal",(0-5))', "+CIND?": "+CIND: 4",
+    "+CFUN?": "+CFUN: 1", "+CBC": "+CBC: 0,100", "+CNUM": None, "+CCWA=?": "+CCWA: (0,1)",
+}
+
+
+class Modem:
+    """One modem: its SIM, what the network does, and its line to the modem service."""
+
+    def __init__(self, slot, imsi, deliver):
+        self.slot, self.imsi, self.deliver = slot, imsi, deliver
+        self.sim = "ready"
+        self.network = "accept"
+        self.assembler = Assembler()
+        self.reference = 0
+        self.writer = None
+        self.message_came = asyncio.Event()
+
+    async def serve(self, reader, writer):
+        self.writer = writer
+        try:
+            while True:
+                line = (await reader.readuntil(b"\r")).decode("ascii", "replace").strip()
+                if line:
+                    await self.command(line, reader)
+        except (asyncio.IncompleteReadError, ConnectionError):
+            pass
+        finally:
+            writer.close()
+
+    def say(self, *lines):
+        for line in lines:
+            self.writer.write(f"\r\n{line}\r\n".encode("ascii"))
+
+    async def command(self, line, reader):
+        if os.environ.get("PELLIKO_PHONESIM_DEBUG"):
+            print(f"phonesim: modem {self.slot}: {line}", file=sys.stderr)
+        command = line[2:] if line.upper().startswith("AT") else line
+        if command.startswith("+CMGS="):
+            await self.submit(int(command[6:]), reader)
+        elif command.startswith("+CPIN"):
+            self.pin(command)
+        elif command.startswith("+CIMI"):
+            self.answer_with_sim(self.imsi)
+        elif command.startswith("+CRSM"):
+            self.answer_with_sim("+CRSM: 106,130")  # no such file
+        elif command in FIXED:
+            self.say(*[text for text in (FIXED[command],) if text], "OK")
+        elif command.endswith("?"):
+            self.say("ERROR")
+        else:
+            self.say("OK")
+
+    def answer_with_sim(self, text):
+        if self.sim == "ready":
+            self.say(*[line for line in (text,) if line], "OK")
+        else:
+            self.say("+CME ERROR: 10" if self.sim == "missing" else "+CME ERROR: 11")
+
+    def pin(self, command):
+        entered = re.match(r'\+CPIN="?([^",]*)"?', command)
+        if command == "+CPIN?" and self.sim == "missing":
+            self.say("+CME ERROR: 10")
+        elif command == "+CPIN?":
+            self.say("+CPIN: SIM PIN" if self.sim == "locked" else "+CPIN: READY", "OK")
+        elif entered and entered[1] == PIN:
+            self.sim = "ready"
+            self.say("OK")
+        else:
+            self.say("+CME ERROR: 16")
+
+    async def submit(self, length, reader):
+        self.writer.write(b"\r\n> ")
+        data = bytes.fromhex((await reader.readuntil(b"\x1a"))[:-1].decode("ascii").strip())
+        self.message_came.set()
+        if self.network == "silent":
+            return
+        if self.network == "refuse":
+            self.say("+CMS ERROR: 38")  # network out of order
+            return
+        centre = data[0] + 1
+        if len(data) - centre != length:
+            self.say("+CMS ERROR: 304")  # invalid PDU
+            return
+        whole = self.assembler.add(decode_submit(data[centre:]))
+        if whole:
+            self.deliver(self.slot, *whole)
+        self.reference = (self.reference + 1) % 256
+        self.say(f"+CMGS: {self.reference}", "OK")
+
+
+class Outbox:
+    def __init__(self, path):
+        self.path = path
+
+    def append(self, slot, to, text):
+        record = {"to": to, "text": text, "sim": slot, "time": time.strftime("%Y-%m-%dT%H:%M:%SZ", time.gmtime())}
+        with open(self.path, "a", encoding="utf-8") as file:
+            file.write(json.dumps(record, ensure_ascii=False) + "\n")
+            file.flush()
+            os.fsync(file.fileno())
+
+
+class Service:
+    """The modem service: the real ofonod, with the modems as its only devices."""
+
+    def __init__(self, state, ports):
+        from gi.repository import Gio, GLib
+        self.gio, self.glib = Gio, GLib
+        self.log = os.path.join(state, "ofonod.log")
+        self.config = os.path.join(state, "phonesim.conf")
+        with open(self.config, "w", encoding="ascii") as file:
+            for slot, port in enumerate(ports, 1):
+                file.write(f"[phonesim{slot}]\nAddress=127.0.0.1\nPort={port}\n")
+        self.slots = len(ports)
+        self.process = None
+
+    def _call(self, path, interface, method, arguments=None, service="org.ofono"):
+        bus = self.gio.bus_get_sync(self.gio.BusType.SYSTEM)
+        return bus.call_sync(service, path, interface, method, arguments, None, self.gio.DBusCallFlags.NO_AUTO_START,
+                             LIMIT * 1000)
+
+    async def call(self, *arguments):
+        return await asyncio.to_thread(self._call, *arguments)
+
+    async def start(self):
+        if self.process:
+            return
+        with open(self.log, "ab") as log:
+            self.process = await asyncio.create_subprocess_exec(
+                "ofonod", "-n", "-d", "-p", "phonesim,atmodem,udev_none", stdout=log, stderr=log,
+                env={**os.environ, "OFONO_PHONESIM_CONFIG": self.config})
+        await asyncio.to_thread(self._wait_for_name)
+        for slot in range(1, self.slots + 1):
+            await self.power(slot, True)
+
+    def _wait_for_name(self):
+        context = self.glib.MainContext.new()
+        context.push_thread_default()
+        here, late = [], []
+        watch = self.gio.bus_watch_name(self.gio.BusType.SYSTEM, "org.ofono", self.gio.BusNameWatcherFlags.NONE,
+                                        lambda *_: here.append(True), None)
+        timer = self.glib.timeout_source_new_seconds(LIMIT)
+        timer.set_callback(lambda *_: late.append(True) or True)
+        timer.attach(context)
+        while not here and not late:
+            context.iteration(True)
+        timer.destroy()
+        self.gio.bus_unwatch_name(watch)
+        context.pop_thread_default()
+        if not here:
+            raise RuntimeError("ofonod did not come to the bus")
+
+    async def end(self, number):
+        if self.process:
+            self.process.send_signal(number)
+            await self.process.wait()
+            self.process = None
+
+    async def set(self, slot, name, value):
+        await self.call(f"/phonesim{slot}", "org.ofono.Modem", "SetProperty",
+                        self.glib.Variant("(sv)", (name, self.glib.Variant("b", value))))
+
+    async def power(self, slot, on):
+        await self.set(slot, "Powered", on)
+        if on:
+            try:
+                await self.set(slot, "Online", True)
+            except self.glib.Error:
+                pass  # a modem without a usable SIM does not go online
+
+    async def enter_pin(self, slot, pin):
+        await self.call(f"/phonesim{slot}", "org.ofono.SimManager", "EnterPin",
+                        self.glib.Variant("(ss)", ("pin", pin)))
+
+
+class Phone:
+    def __init__(self, modems, service):
+        self.modems, self.service = modems, service
+
+    async def control(self, reader, writer):
+        try:
+            while line := await reader.readline():
+                try:
+                    await asyncio.wait_for(self.obey(line.decode().split()), LIMIT)
+                    writer.write(b"ok\n")
+                except Exception as error:  # the other side is told whatever went wrong
+                    writer.write(f"failed: {error!r}\n".replace("\n", " ", 0).encode())
+                await writer.drain()
+        except ConnectionError:
+            pass
+        finally:
+            writer.close()
+
+    async def obey(self, words):
+        command, *rest = words
+        if command == "service":
+            await self.obey_service(rest[0])
+            return
+        modem = self.modems[int(rest[0]) - 1]
+        if command in ("refuse", "accept", "silent"):
+            modem.network = command
+        elif command == "drop":
+            modem.writer.close()
+        elif command == "sim":
+            modem.sim = rest[1] if rest[1] in ("missing", "locked") else "ready"
+            modem.imsi = rest[1] if rest[1] not in ("missing", "locked", "ready") else modem.imsi
+        elif command == "power":
+            await self.service.power(modem.slot, rest[1] == "on")
+        elif command == "enter-pin":
+            await self.service.enter_pin(modem.slot, rest[1])
+        elif command == "wait-message":
+            modem.message_came.clear()
+            await modem.message_came.wait()
+        else:
+            raise ValueError(f"unknown command {command}")
+
+    async def obey_service(self, what):
+        if what == "start":
+            await self.service.start()
+        else:
+            await self.service.end(signal.SIGKILL if what == "kill" else signal.SIGTERM)
+
+
+async def run(options):
+    outbox = Outbox(options.outbox)
+    modems = [Modem(slot, imsi, outbox.append) for slot, imsi in enumerate(options.imsi.split(","), 1)]
+    ports = []
+    for modem in modems:
+        server = await asyncio.start_server(modem.serve, "127.0.0.1", 0)
+        ports.append(server.sockets[0].getsockname()[1])
+    service = Service(options.state, ports)
+    phone = Phone(modems, service)
+    ending = asyncio.Event()
+    for number in (signal.SIGTERM, signal.SIGINT):
+        asyncio.get_running_loop().add_signal_handler(number, ending.set)
+    try:
+        await service.start()
+        await asyncio.start_unix_server(phone.control, options.control)
+        if options.ready_fd is not None:
+            with os.fdopen(options.ready_fd, "w") as tell:
+                tell.write("ready\n")
+        await ending.wait()
+    finally:
+        await service.end(signal.SIGTERM)
+
+
+def tell(options):
+    with socket.socket(socket.AF_UNIX) as line:
+        line.connect(options.control)
+        line.sendall((" ".join(options.command) + "\n").encode())
+        answer = line.makefile().readline().strip()
+    if answer != "ok":
+        print(f"phonesim: {answer or 'no answer'}", file=sys.stderr)
+        return 1
+    return 0
+
+
+def main():
+    parser = argparse.ArgumentParser(description=__doc__, formatter_class=argparse.RawDescriptionHelpFormatter)
+    commands = parser.add_subparsers(required=True)
+    running = commands.add_parser("run")
+    running.add_argument("--imsi", required=True)
+    running.add_argument("--state", required=True)
+    running.add_argument("--outbox", required=True)
+    running.add_argument("--control", required=True)
+    running.add_argument("--ready-fd", type=int)
+    running.set_defaults(do=lambda options: asyncio.run(run(options)))
+    telling = commands.add_parser("tell")
+    telling.add_argument("control")
+    telling.add_argument("command", nargs="+")
+    telling.set_defaults(do=tell)
+    options = parser.parse_args()
+    return options.do(options) or 0
+
+
+if __name__ == "__main__":
+    sys.exit(main())
