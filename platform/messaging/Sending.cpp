@@ -3,6 +3,7 @@
 #include <exception>
 #include <memory>
 
+#include "ModemTransport.h"
 #include "OutboxTransport.h"
 #include "Structure.h"
 #include "msg.h"
@@ -55,8 +56,8 @@ msg_error_t msg_open_msg_handle(msg_handle_t *handle)
     if (!handle)
         return MSG_ERR_NULL_POINTER;
     try {
-        auto transport = std::make_unique<OutboxTransport>(OutboxTransport::defaultPath());
-        *handle = new Service{std::move(transport)};
+        auto outbox = std::make_unique<OutboxTransport>(OutboxTransport::defaultPath());
+        *handle = new Service{std::make_unique<ModemTransport>(std::move(outbox))};
         return MSG_SUCCESS;
     } catch (const std::exception &error) {
         std::fprintf(stderr, "messaging: cannot open the outbox: %s\n", error.what());

@@ -2,11 +2,15 @@
 
 #include "KeyNode.h"
 #include "KeyWatch.h"
+#include "Readiness.h"
 
 #include <cstring>
 
+using pelliko::vconf::followReadiness;
+using pelliko::vconf::followsModems;
 using pelliko::vconf::KeyWatch;
 using pelliko::vconf::readKey;
+using pelliko::vconf::refreshReadiness;
 using pelliko::vconf::Value;
 using pelliko::vconf::writeKey;
 
@@ -49,6 +53,8 @@ template <typename Type> Type *valueOf(keynode_t *node)
 
 int vconf_get_bool(const char *in_key, int *boolval)
 {
+    if (in_key && followsModems(in_key))
+        refreshReadiness();
     return get<bool>(in_key, boolval);
 }
 
@@ -81,7 +87,11 @@ int vconf_set_str(const char *in_key, const char *strval)
 
 int vconf_notify_key_changed(const char *in_key, vconf_callback_fn cb, void *user_data)
 {
-    return in_key && cb && keyWatch().add(in_key, cb, user_data) ? kSuccess : kError;
+    if (!in_key || !cb || !keyWatch().add(in_key, cb, user_data))
+        return kError;
+    if (followsModems(in_key))
+        followReadiness();
+    return kSuccess;
 }
 
 int vconf_ignore_key_changed(const char *in_key, vconf_callback_fn cb)

@@ -10,7 +10,8 @@ failed); SLOT counts from 1:
 
   refuse SLOT        the network refuses every message       accept SLOT   and takes them again
   silent SLOT        messages are never answered             drop SLOT     the modem closes its line
-  sim SLOT missing|locked|ready|IMSI                         the SIM, as it is when the modem is next powered
+  sim SLOT unreadable|locked|ready|IMSI                      the SIM, as it is when the modem is next powered
+                     (ofonod does not live through a modem that reports no SIM or an empty number)
   power SLOT on|off  switches the modem as the phone's shell does
   enter-pin SLOT PIN                                         unlocks the SIM (the PIN is 1234)
   service start|stop|kill                                    the modem service
@@ -96,17 +97,23 @@ class Modem:
         else:
             self.say("OK")
 
+    def insert(self, sim):
+        if sim in ("unreadable", "locked", "ready"):
+            self.sim = sim
+        else:
+            self.sim, self.imsi = "ready", sim
+
     def answer_with_sim(self, text):
         if self.sim == "ready":
             self.say(*[line for line in (text,) if line], "OK")
         else:
-            self.say("+CME ERROR: 10" if self.sim == "missing" else "+CME ERROR: 11")
+            self.say("+CME ERROR: 11")  # PIN required
 
     def pin(self, command):
         entered = re.match(r'\+CPIN="?([^",]*)"?', command)
-        if command == "+CPIN?" and self.sim == "missing":
-            self.say("+CME ERROR: 10")
-        elif command == "+CPIN?":
+        if self.sim == "unreadable":
+            return  # a modem that goes on trying to read a card
+        if command == "+CPIN?":
             self.say("+CPIN: SIM PIN" if self.sim == "locked" else "+CPIN: READY", "OK")
         elif entered and entered[1] == PIN:
             self.sim = "ready"
@@ -169,54 +176,70 @@ class Service:
         return await asyncio.to_thread(self._call, *arguments)
 
     async def start(self):
-        if self.process:
+        if self.process and self.process.returncode is None:
             return
         with open(self.log, "ab") as log:
             self.process = await asyncio.create_subprocess_exec(
                 "ofonod", "-n", "-d", "-p", "phonesim,atmodem,udev_none", stdout=log, stderr=log,
                 env={**os.environ, "OFONO_PHONESIM_CONFIG": self.config})
-        await asyncio.to_thread(self._wait_for_name)
-        for slot in range(1, self.slots + 1):
-            await self.power(slot, True)
+        await asyncio.to_thread(self._until, lambda: self._properties(1, "org.ofono.Modem"), "ofonod")
 
-    def _wait_for_name(self):
+    def _until(self, condition, what):
+        """Waits until condition() holds; it is looked at after whatever oFono announces."""
         context = self.glib.MainContext.new()
         context.push_thread_default()
-        here, late = [], []
+        late = []
+        bus = self.gio.bus_get_sync(self.gio.BusType.SYSTEM)
+        heard = bus.signal_subscribe("org.ofono", None, None, None, None, self.gio.DBusSignalFlags.NONE,
+                                     lambda *_: None)
         watch = self.gio.bus_watch_name(self.gio.BusType.SYSTEM, "org.ofono", self.gio.BusNameWatcherFlags.NONE,
-                                        lambda *_: here.append(True), None)
-        timer = self.glib.timeout_source_new_seconds(LIMIT)
+                                        None, None)
+        timer = self.glib.timeout_source_new_seconds(LIMIT // 2)
         timer.set_callback(lambda *_: late.append(True) or True)
         timer.attach(context)
-        while not here and not late:
-            context.iteration(True)
-        timer.destroy()
-        self.gio.bus_unwatch_name(watch)
-        context.pop_thread_default()
-        if not here:
-            raise RuntimeError("ofonod did not come to the bus")
+        try:
+            while not condition():
+                if late:
+                    raise RuntimeError(f"waited in vain for {what}")
+                context.iteration(True)
+        finally:
+            timer.destroy()
+            bus.signal_unsubscribe(heard)
+            self.gio.bus_unwatch_name(watch)
+            context.pop_thread_default()
+
+    def _properties(self, slot, interface):
+        try:
+            return self._call(f"/phonesim{slot}", interface, "GetProperties").unpack()[0]
+        except self.glib.Error:
+            return {}
+
+    def _sim_is_read(self, slot):
+        return bool(self._properties(slot, "org.ofono.SimManager").get("SubscriberIdentity"))
 
     async def end(self, number):
-        if self.process:
+        if self.process and self.process.returncode is None:
             self.process.send_signal(number)
             await self.process.wait()
-            self.process = None
 
     async def set(self, slot, name, value):
         await self.call(f"/phonesim{slot}", "org.ofono.Modem", "SetProperty",
                         self.glib.Variant("(sv)", (name, self.glib.Variant("b", value))))
 
-    async def power(self, slot, on):
-        await self.set(slot, "Powered", on)
-        if on:
-            try:
-                await self.set(slot, "Online", True)
-            except self.glib.Error:
-                pass  # a modem without a usable SIM does not go online
+    async def go_online(self, slot):
+        """oFono does not survive being sent online before it has read the SIM."""
+        await asyncio.to_thread(self._until, lambda: self._sim_is_read(slot), "the SIM to be read")
+        await self.set(slot, "Online", True)
+        await asyncio.to_thread(self._until, lambda: "org.ofono.MessageManager" in self._properties(
+            slot, "org.ofono.Modem").get("Interfaces", []), "the modem to take messages")
 
     async def enter_pin(self, slot, pin):
         await self.call(f"/phonesim{slot}", "org.ofono.SimManager", "EnterPin",
                         self.glib.Variant("(ss)", ("pin", pin)))
+        # This driver hears of no notice that the card is usable now; it finds out when it starts again.
+        await self.set(slot, "Powered", False)
+        await self.set(slot, "Powered", True)
+        await self.go_online(slot)
 
 
 class Phone:
@@ -248,10 +271,9 @@ class Phone:
         elif command == "drop":
             modem.writer.close()
         elif command == "sim":
-            modem.sim = rest[1] if rest[1] in ("missing", "locked") else "ready"
-            modem.imsi = rest[1] if rest[1] not in ("missing", "locked", "ready") else modem.imsi
+            modem.insert(rest[1])
         elif command == "power":
-            await self.service.power(modem.slot, rest[1] == "on")
+            await self.power(modem, rest[1] == "on")
         elif command == "enter-pin":
             await self.service.enter_pin(modem.slot, rest[1])
         elif command == "wait-message":
@@ -260,9 +282,19 @@ class Phone:
         else:
             raise ValueError(f"unknown command {command}")
 
+    async def power(self, modem, on):
+        await self.service.set(modem.slot, "Powered", on)
+        if on and modem.sim == "ready":
+            await self.service.go_online(modem.slot)
+
+    async def start(self):
+        await self.service.start()
+        for modem in self.modems:
+            await self.power(modem, True)
+
     async def obey_service(self, what):
         if what == "start":
-            await self.service.start()
+            await self.start()
         else:
             await self.service.end(signal.SIGKILL if what == "kill" else signal.SIGTERM)
 
@@ -280,7 +312,7 @@ async def run(options):
     for number in (signal.SIGTERM, signal.SIGINT):
         asyncio.get_running_loop().add_signal_handler(number, ending.set)
     try:
-        await service.start()
+        await phone.start()
         await asyncio.start_unix_server(phone.control, options.control)
         if options.ready_fd is not None:
             with os.fdopen(options.ready_fd, "w") as tell:

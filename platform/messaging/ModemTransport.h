@@ -1,0 +1,23 @@
+// The transport of machines with a modem.
+#pragma once
+
+#include "SmsTransport.h"
+
+#include <memory>
+
+namespace pelliko::messaging
+{
+
+// Sends through the modem of the message's SIM slot. Whether there is a modem is asked for every
+// message; while the machine has none, messages go to the other transport.
+class ModemTransport : public SmsTransport
+{
+public:
+    explicit ModemTransport(std::unique_ptr<SmsTransport> withoutModem);
+    std::string send(const Sms &sms) override;
+
+private:
+    std::unique_ptr<SmsTransport> withoutModem_;
+};
+
+} // namespace pelliko::messaging
