@@ -51,10 +51,10 @@ public:
     /// watched by the caller. Once per object, main loop only, does not block.
     virtual void listen(std::function<void()> changed) = 0;
 
-    /// Sends `text` (valid UTF-8, of any length) through the modem of `slot` (counted from 0) and waits
-    /// for the service's final word. Empty on success, else one sentence that says what failed: no
-    /// such slot, no usable SIM, refused by the network, the service died, no word within bounded
-    /// time.
+    /// Sends `text` (valid UTF-8, of any length) through the modem of `slot` (counted from 0) and
+    /// waits for the service's final word. Empty on success, else one sentence that says what
+    /// failed: no such slot, no usable SIM, refused by the network, the service died, no word
+    /// within bounded time.
     [[nodiscard]] virtual std::string sendSms(int slot, const std::string &to,
                                               const std::string &text) = 0;
 };

@@ -2,6 +2,7 @@
 
 #include "OfonoNames.h"
 
+#include <algorithm>
 #include <map>
 
 namespace pelliko::modem
@@ -183,6 +184,13 @@ std::string reasonAgainst(const Modem &modem)
     return {};
 }
 
+// oFono makes messages of two-byte characters and refuses a text with others as a whole.
+bool hasLongCharacter(const std::string &text)
+{
+    return std::any_of(text.begin(), text.end(),
+                       [](char byte) { return static_cast<unsigned char>(byte) >= 0xF0; });
+}
+
 } // namespace
 
 std::string sendThroughOfono(const Modem &modem, const std::string &to, const std::string &text)
@@ -190,6 +198,8 @@ std::string sendThroughOfono(const Modem &modem, const std::string &to, const st
     std::string error = reasonAgainst(modem);
     if (!error.empty())
         return error;
+    if (hasLongCharacter(text))
+        return "the text has a character (such as an emoji) that oFono cannot send";
     const OwnContext context;
     Listener listener(context.get(), modem.name);
     const VariantPtr reply =

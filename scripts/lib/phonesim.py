@@ -15,7 +15,8 @@ failed); SLOT counts from 1:
   power SLOT on|off  switches the modem as the phone's shell does
   enter-pin SLOT PIN                                         unlocks the SIM (the PIN is 1234)
   service start|stop|kill                                    the modem service
-  wait-message SLOT  answers when the modem has been handed a message's first part from now on
+  wait-message SLOT N                                        answers when the modem was handed N parts since the reset
+  reset              everything as at the start, with a new modem service
 
 The outer process ends its ofonod when it ends.
 """
@@ -25,6 +26,7 @@ import asyncio
 import json
 import os
 import re
+import shutil
 import signal
 import socket
 import sys
@@ -37,6 +39,7 @@ from sms_pdu import Assembler, decode_submit  # noqa: E402
 
 PIN = "1234"
 LIMIT = 30
+STORE = "/var/lib/ofono"
 # What a modem of this kind answers where no state is involved.
 FIXED = {
     "+CGMI": "Pelliko", "+CGMM": "Simulated", "+CGMR": "1.0", "+CGSN": "356938035643809",
@@ -54,13 +57,18 @@ class Modem:
     """One modem: its SIM, what the network does, and its line to the modem service."""
 
     def __init__(self, slot, imsi, deliver):
-        self.slot, self.imsi, self.deliver = slot, imsi, deliver
+        self.slot, self.first_imsi, self.deliver = slot, imsi, deliver
+        self.writer = None
+        self.handed = asyncio.Condition()
+        self.reset()
+
+    def reset(self):
+        self.imsi = self.first_imsi
         self.sim = "ready"
         self.network = "accept"
         self.assembler = Assembler()
         self.reference = 0
-        self.writer = None
-        self.message_came = asyncio.Event()
+        self.parts = 0
 
     async def serve(self, reader, writer):
         self.writer = writer
@@ -124,7 +132,9 @@ class Modem:
     async def submit(self, length, reader):
         self.writer.write(b"\r\n> ")
         data = bytes.fromhex((await reader.readuntil(b"\x1a"))[:-1].decode("ascii").strip())
-        self.message_came.set()
+        async with self.handed:
+            self.parts += 1
+            self.handed.notify_all()
         if self.network == "silent":
             return
         if self.network == "refuse":
@@ -217,6 +227,12 @@ class Service:
     def _sim_is_read(self, slot):
         return bool(self._properties(slot, "org.ofono.SimManager").get("SubscriberIdentity"))
 
+    @staticmethod
+    def forget():
+        """Messages that oFono had not got rid of would be sent when it runs again."""
+        for folder in os.listdir(STORE):
+            shutil.rmtree(os.path.join(STORE, folder))
+
     async def end(self, number):
         if self.process and self.process.returncode is None:
             self.process.send_signal(number)
@@ -253,7 +269,7 @@ class Phone:
                     await asyncio.wait_for(self.obey(line.decode().split()), LIMIT)
                     writer.write(b"ok\n")
                 except Exception as error:  # the other side is told whatever went wrong
-                    writer.write(f"failed: {error!r}\n".replace("\n", " ", 0).encode())
+                    writer.write(f"failed: {error!r}\n".encode())
                 await writer.drain()
         except ConnectionError:
             pass
@@ -264,6 +280,13 @@ class Phone:
         command, *rest = words
         if command == "service":
             await self.obey_service(rest[0])
+            return
+        if command == "reset":
+            await self.service.end(signal.SIGKILL)
+            for modem in self.modems:
+                modem.reset()
+            self.service.forget()
+            await self.start()
             return
         modem = self.modems[int(rest[0]) - 1]
         if command in ("refuse", "accept", "silent"):
@@ -277,8 +300,8 @@ class Phone:
         elif command == "enter-pin":
             await self.service.enter_pin(modem.slot, rest[1])
         elif command == "wait-message":
-            modem.message_came.clear()
-            await modem.message_came.wait()
+            async with modem.handed:
+                await modem.handed.wait_for(lambda: modem.parts >= int(rest[1]))
         else:
             raise ValueError(f"unknown command {command}")
 
