@@ -16,7 +16,7 @@ Current Lang : L
 _initI18n setlocale = L
 _initI18n bindtextdomain domain = pelliko
 _initI18n textdomain domain = pelliko
-tapi_ready_state isn't yet ready !!
+SIM index = 0
 DB Opened Successfully.
 SQL query framed is = CREATE TABLE IF NOT EXISTS 'UPLOAD_INFO' (req_id INT PRIMARY KEY NOT NULL, \
 total_files INT, total_size INT, file_list VARCHAR, recipient_list VARCHAR, recipient_index_list VARCHAR);
@@ -73,7 +73,6 @@ pk_caller_id_default.png
 Action type is ACTION_UPLOAD
 Recipient count = 1
 Recipient number_id 0 = {ann}
-sender_ccc is NULL !!
 Files count = 1
 extension[jpg], match[jpg]
 Is upload wifi only = 0

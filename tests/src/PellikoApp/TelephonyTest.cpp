@@ -105,8 +105,20 @@ protected:
         fs::create_directories(file.parent_path());
         std::ofstream(file) << R"({"server":"http://h","number":"+49","token":"t","imsi":")" << imsi
                             << "\"}";
+        lookAtModems();
     }
-    static void removeSim() { fs::remove(korrin::defaultAccountFile()); }
+    static void removeSim()
+    {
+        fs::remove(korrin::defaultAccountFile());
+        lookAtModems();
+    }
+
+    // A reader of the key sets it when the modems say something new; after that it is the test's.
+    static void lookAtModems()
+    {
+        int ready = 0;
+        vconf_get_bool(VCONFKEY_TELEPHONY_READY, &ready);
+    }
 
     // Sets the readiness and waits until everybody who listens has heard of it.
     void setReady(int ready)
@@ -271,8 +283,8 @@ TEST_F(Telephony, ReadyPhoneWhoseDataSimIsUnknownIsReadAtSlot0)
 
 TEST_F(Telephony, PhoneThatBecomesReadyLaterKeepsItsSimIndex)
 {
-    setReady(0);
     insertSim("262011234567890");
+    setReady(0);
     log.restart();
     startTelephony(ad);
     EXPECT_THAT(log.messages(), ElementsAre("tapi_ready_state isn't yet ready !!"));
@@ -288,8 +300,8 @@ TEST_F(Telephony, PhoneThatBecomesReadyLaterKeepsItsSimIndex)
 
 TEST_F(Telephony, PhoneThatIsNoLongerReadyLosesItsHandlesUntilItIsReadyAgain)
 {
-    setReady(0);
     insertSim("262011234567890");
+    setReady(0);
     startTelephony(ad);
     setReady(1);
     ASSERT_NE(ad->tapi_handle[0], nullptr);
