@@ -2,32 +2,12 @@
 
 #include "ModemManagerSession.h"
 #include "ModemManagerSim.h"
+#include "SmsText.h"
 
 namespace pelliko::modem
 {
 namespace
 {
-
-constexpr size_t longestCharacter = 4;
-
-// A text that was cut at a number of bytes may end inside a character, which the bus does not
-// carry. What is left of it goes: a sign in its place would cost every other character half of its
-// room.
-std::string wholeCharacters(const std::string &text)
-{
-    const auto length = static_cast<gssize>(text.size());
-    const gchar *end = nullptr;
-    if (g_utf8_validate_len(text.c_str(), text.size(), &end))
-        return text;
-    const auto valid = static_cast<size_t>(end - text.c_str());
-    const bool cut = text.size() - valid < longestCharacter &&
-                     g_utf8_get_char_validated(end, length - static_cast<gssize>(valid)) ==
-                         static_cast<gunichar>(-2);
-    if (cut)
-        return text.substr(0, valid);
-    g_autofree gchar *readable = g_utf8_make_valid(text.c_str(), length);
-    return readable;
-}
 
 std::string whyUnusable(SimState sim)
 {
@@ -53,8 +33,8 @@ MMSms *create(MMModemMessaging *messaging, const std::string &to, const std::str
     return mm_modem_messaging_create_sync(messaging, properties, cancellable, error);
 }
 
-// A store full of old messages would refuse the next one. The message's own fate is decided by then:
-// whether it could be deleted has no part in that.
+// A store full of old messages would refuse the next one. The message's own fate is decided by
+// then: whether it could be deleted has no part in that.
 void forget(MMModemMessaging *messaging, MMSms *sms, GCancellable *cancellable)
 {
     mm_modem_messaging_delete_sync(messaging, mm_sms_get_path(sms), cancellable, nullptr);
