@@ -60,11 +60,20 @@ class Usage(share_case.ShareCase):
         self.messages(2)
         self.assertEqual(["PK01", "PK02 Recent_personal", "PK05", "PK06 0_100MB", "PK09"], self.features())
 
-    def test_a_refused_share_is_one_record(self):
-        world.share([self.file("program.exe", b"MZ")], [self.ann])
-        world.wait_for(lambda: [i for i in self.panel.items if i["event"] == "toast"], "the refusal")
+    def assert_refused(self, paths, reason):
+        world.run("velmora-log", "clear")
+        toasts = [i for i in self.panel.items if i["event"] == "toast"]
+        world.share(paths, [self.ann])
+        self.panel.wait(lambda items: len([i for i in items if i["event"] == "toast"]) > len(toasts), "the refusal")
         self.application.wait_gone()
-        self.assertEqual(["PK07 not_supported_files"], self.features())
+        self.assertEqual([f"PK07 {reason}"], self.features())
+
+    def test_a_refused_share_is_one_record(self):
+        self.assert_refused([self.file("program.exe", b"MZ")], "not_supported_files")
+        self.assert_refused([self.file(f"{i}.txt", b"x") for i in range(101)], "file_count")
+        film = self.file("film.mp4", b"")
+        os.truncate(film, 1 << 30)
+        self.assert_refused([film], "size_exceeded_once")
 
     def test_a_popup_that_is_cancelled_leaves_no_record(self):
         world.share([self.file("a.jpg", share_case.random_bytes(500))], [self.ann])
