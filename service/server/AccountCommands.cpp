@@ -2,11 +2,13 @@
 
 #include "DataDirectory.h"
 #include "accounts/Accounts.h"
+#include "accounts/Invitations.h"
 #include "shares/ShareRules.h"
 #include "store/DirectoryBlobs.h"
 #include "store/SqliteMetadata.h"
 #include "text/Escape.h"
 
+#include <algorithm>
 #include <cstdio>
 #include <cstdlib>
 #include <ctime>
@@ -55,6 +57,53 @@ int removeAccountCommand(const std::filesystem::path &data, const std::string &n
             metadata.forgetBlob(key);
         }
     }
+    return EXIT_SUCCESS;
+}
+
+int inviteCommand(const std::filesystem::path &data, const InvitationOptions &options)
+{
+    makeDataDirectory(data);
+    SqliteMetadata metadata(metadataFile(data));
+    const Seconds now = std::time(nullptr);
+    const std::string code =
+        makeInvitation(metadata, {}, options.uses, now, now + options.lifetime);
+    std::printf("%s\n", code.c_str());
+    return EXIT_SUCCESS;
+}
+
+int listInvitationsCommand(const std::filesystem::path &data)
+{
+    SqliteMetadata metadata(metadataFile(data));
+    for (const Invitation &invitation : metadata.listInvitations())
+        std::printf("%lld\t%s\t%s\t%d/%d\t%s\n", static_cast<long long>(invitation.id),
+                    isoDate(invitation.created).c_str(), isoDate(invitation.expires).c_str(),
+                    invitation.used, invitation.uses, invitation.number.c_str());
+    return EXIT_SUCCESS;
+}
+
+int revokeInvitationCommand(const std::filesystem::path &data, std::int64_t id)
+{
+    SqliteMetadata metadata(metadataFile(data));
+    if (metadata.removeInvitation(id))
+        return EXIT_SUCCESS;
+    std::fprintf(stderr, "pelliko-server: there is no invitation %lld.\n",
+                 static_cast<long long>(id));
+    return EXIT_FAILURE;
+}
+
+int renewAccountCommand(const std::filesystem::path &data, const std::string &number,
+                        std::int64_t lifetime)
+{
+    SqliteMetadata metadata(metadataFile(data));
+    const auto accounts = metadata.listAccounts();
+    if (std::none_of(accounts.begin(), accounts.end(),
+                     [&](const Account &account) { return account.number == number; })) {
+        std::fprintf(stderr, "pelliko-server: %s has no account.\n", number.c_str());
+        return EXIT_FAILURE;
+    }
+    const Seconds now = std::time(nullptr);
+    const std::string code = makeInvitation(metadata, number, 1, now, now + lifetime);
+    std::printf("%s\n", code.c_str());
     return EXIT_SUCCESS;
 }
 

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <cstdint>
 #include <filesystem>
 #include <string>
 
@@ -12,5 +13,17 @@ int addAccountCommand(const std::filesystem::path &data, const std::string &numb
                       const std::string &name);
 int listAccountsCommand(const std::filesystem::path &data);
 int removeAccountCommand(const std::filesystem::path &data, const std::string &number);
+
+/// How an invitation is made: for how many accounts, and for how many seconds.
+struct InvitationOptions {
+    int uses = 1;
+    std::int64_t lifetime = 7 * 86400;
+};
+int inviteCommand(const std::filesystem::path &data, const InvitationOptions &options);
+int listInvitationsCommand(const std::filesystem::path &data);
+int revokeInvitationCommand(const std::filesystem::path &data, std::int64_t id);
+/// A code with which the number's account moves to another phone.
+int renewAccountCommand(const std::filesystem::path &data, const std::string &number,
+                        std::int64_t lifetime);
 
 } // namespace pelliko::server

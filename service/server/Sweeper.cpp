@@ -88,8 +88,10 @@ Task<void> Sweeper::sweep()
     for (const std::string &blob : ended)
         m_context.writes.stop(blob);
     const Limits &limits = m_context.limits;
-    co_await m_context.pool.run(
-        [&] { m_context.metadata.forgetEnded(now - limits.endedKept, now - limits.dailyWindow); });
+    co_await m_context.pool.run([&] {
+        m_context.metadata.forgetEnded(now - limits.endedKept, now - limits.dailyWindow);
+        m_context.metadata.forgetInvitations(now - limits.endedKept);
+    });
     co_await removeDoomed();
 }
 

@@ -16,6 +16,8 @@
 #include <cstdio>
 #include <cstdlib>
 #include <ctime>
+#include <map>
+#include <string>
 
 namespace
 {
@@ -26,6 +28,9 @@ struct AccountOptions {
     std::string data;
     std::string number;
     std::string name;
+    server::InvitationOptions invitation;
+    bool list = false;
+    std::int64_t revoke = 0;
 };
 
 struct ServeOptions {
@@ -95,6 +100,11 @@ void addServe(CLI::App &app, ServeOptions &options)
         ->add_option("--daily-numbers", limits.dailyNumbers,
                      "Numbers per account in 24 hours in questions about who has joined")
         ->capture_default_str();
+    command
+        ->add_option("--registration-limit", limits.registrations,
+                     "Attempts to register from one address in an hour")
+        ->check(CLI::PositiveNumber)
+        ->capture_default_str();
     command->add_option("--head-timeout", options.headTimeout, "Seconds for a whole request head")
         ->check(CLI::PositiveNumber)
         ->capture_default_str();
@@ -115,6 +125,44 @@ void addServe(CLI::App &app, ServeOptions &options)
     command->footer("--config FILE reads these options from the file's section [serve].");
 }
 
+void addLifetime(CLI::App &command, server::InvitationOptions &options)
+{
+    const std::map<std::string, std::int64_t> units{{"s", 1}, {"m", 60}, {"h", 3600}, {"d", 86400}};
+    command.add_option("--expires", options.lifetime, "How long the code works, like 12h or 7d")
+        ->transform(CLI::AsNumberWithUnit(units))
+        ->check(CLI::Range(std::int64_t{1}, std::int64_t{3650} * 86400))
+        ->default_str("7d");
+}
+
+void addInvite(CLI::App &account, AccountOptions &options)
+{
+    CLI::App *invite = account.add_subcommand(
+        "invite", "Make an invitation code and print it, once; list or revoke those there are");
+    invite->add_option("--uses", options.invitation.uses, "Accounts that the code makes")
+        ->check(CLI::Range(1, 100000))
+        ->capture_default_str();
+    addLifetime(*invite, options.invitation);
+    CLI::Option *list = invite->add_flag(
+        "--list", options.list, "Print id, creation, expiry (UTC), uses and the renewed number");
+    invite->add_option("--revoke", options.revoke, "End the invitation with this id")
+        ->excludes(list);
+    CLI::App *renew = account.add_subcommand(
+        "renew", "Make a code that moves an account to another phone, and print it, once");
+    renew->add_option("--number", options.number, "Phone number of the account")->required();
+    addLifetime(*renew, options.invitation);
+    for (CLI::App *command : {invite, renew})
+        command->add_option("--data", options.data, "The server's directory")->required();
+}
+
+int runInvite(const AccountOptions &options)
+{
+    if (options.list)
+        return server::listInvitationsCommand(options.data);
+    if (options.revoke != 0)
+        return server::revokeInvitationCommand(options.data, options.revoke);
+    return server::inviteCommand(options.data, options.invitation);
+}
+
 void addAccount(CLI::App &app, AccountOptions &options)
 {
     CLI::App *account = app.add_subcommand("account", "Manage the accounts that may share");
@@ -128,6 +176,7 @@ void addAccount(CLI::App &app, AccountOptions &options)
         command->add_option("--number", options.number, "Phone number, like +4915112345678")
             ->required();
     add->add_option("--name", options.name, "Name, for the list");
+    addInvite(*account, options);
 }
 
 int runCommand(const CLI::App &app, const ServeOptions &serveOptions,
@@ -139,6 +188,11 @@ int runCommand(const CLI::App &app, const ServeOptions &serveOptions,
     if (account->got_subcommand("add"))
         return server::addAccountCommand(accountOptions.data, accountOptions.number,
                                          accountOptions.name);
+    if (account->got_subcommand("invite"))
+        return runInvite(accountOptions);
+    if (account->got_subcommand("renew"))
+        return server::renewAccountCommand(accountOptions.data, accountOptions.number,
+                                           accountOptions.invitation.lifetime);
     if (account->got_subcommand("remove"))
         return server::removeAccountCommand(accountOptions.data, accountOptions.number);
     return server::listAccountsCommand(accountOptions.data);

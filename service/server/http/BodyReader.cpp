@@ -143,6 +143,9 @@ Task<HeadResult> BodyReader::readHead()
         co_return malformed ? HeadResult::malformed : HeadResult::closed;
     }
     state.request = requestOf(*state.head);
+    boost::system::error_code gone;
+    const auto peer = state.socket.remote_endpoint(gone);
+    state.request.peer = gone ? std::string() : peer.address().to_string();
     state.takesChunks = state.head->get().version() >= 11;
     if (state.takesChunks && state.request.header("Host") == nullptr)
         co_return HeadResult::malformed;

@@ -1,5 +1,6 @@
 #pragma once
 
+#include "accounts/AttemptLimiter.h"
 #include "http/StoragePool.h"
 #include "shares/Limits.h"
 #include "store/Blobs.h"
@@ -25,6 +26,7 @@ struct Context {
     std::string publicUrl;
     /// Called when bytes became unneeded or a deadline was set.
     std::function<void()> wakeSweeper;
+    AttemptLimiter registrations{limits.registrations, limits.registrationWindow};
 };
 
 } // namespace pelliko::server

@@ -33,6 +33,14 @@ constexpr ErrorEntry table[] = {
     {Error::headerTooLarge, "header_too_large", 431, "The request's head is over 16 KiB."},
     {Error::internal, "internal", 500, "The server failed."},
     {Error::noSpace, "no_space", 507, "The store is full."},
+    {Error::numberInvalid, "number_invalid", 400,
+     "The number has to be in international form, like +4915112345678."},
+    {Error::numberTaken, "number_taken", 409, "The number has an account already."},
+    {Error::codeUnknown, "code_unknown", 403, "There is no such invitation code."},
+    {Error::codeExpired, "code_expired", 403, "The invitation code has expired."},
+    {Error::codeUsedUp, "code_used_up", 403, "The invitation code has been used up."},
+    {Error::codeForOther, "code_for_other_number", 403, "The code is for another number."},
+    {Error::tooManyAttempts, "too_many_attempts", 429, "There were too many attempts."},
 };
 
 } // namespace

@@ -28,6 +28,13 @@ enum class Error {
     headerTooLarge,
     internal,
     noSpace,
+    numberInvalid,
+    numberTaken,
+    codeUnknown,
+    codeExpired,
+    codeUsedUp,
+    codeForOther,
+    tooManyAttempts,
 };
 
 /// One row of the table of refusals: what goes over the wire.

@@ -30,6 +30,8 @@ struct Request {
     /// Without the query, not decoded: every address of this server is plain ASCII.
     std::string path;
     std::vector<Header> headers;
+    /// The address that the connection comes from; empty when it is gone already.
+    std::string peer;
     /// Bytes of the body; absent when they come in chunks of unknown total.
     std::optional<std::uint64_t> bodyLength;
 

@@ -1,6 +1,7 @@
 #include "http/Router.h"
 
 #include "accounts/Accounts.h"
+#include "accounts/Invitations.h"
 #include "accounts/Joined.h"
 #include "http/Errors.h"
 #include "pages/Download.h"
@@ -107,6 +108,10 @@ Task<void> routeApi(Exchange &exchange, Context &context, Parts parts)
         co_await tusCollection(exchange, context);
     } else if (room == "uploads" && parts.size() == 1) {
         co_await tusUpload(exchange, context, parts[0]);
+    } else if (room == "accounts" && parts.empty()) {
+        if (exchange.request().method != "POST")
+            refuseMethod("POST");
+        co_await registerAccount(exchange, context);
     } else if (room == "account" && parts.empty()) {
         requireGet(exchange.request());
         co_await showAccount(exchange, context);

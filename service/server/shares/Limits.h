@@ -23,6 +23,9 @@ struct Limits {
     std::int64_t unfinishedLifetime = 7 * 86400;
     /// From the end of a share to the moment when its names and numbers are forgotten.
     std::int64_t endedKept = 30 * 86400;
+    /// Attempts to register from one address within the window.
+    std::size_t registrations = 20;
+    std::int64_t registrationWindow = 3600;
 };
 
 } // namespace pelliko::server

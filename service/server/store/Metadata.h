@@ -18,6 +18,45 @@ struct Account {
     Seconds created = 0;
 };
 
+/// Makes accounts for those who know its code.
+struct Invitation {
+    std::int64_t id = 0;
+    /// The number whose account the code renews; empty for one that makes new accounts.
+    std::string number;
+    int uses = 1;
+    int used = 0;
+    Seconds created = 0;
+    Seconds expires = 0;
+};
+
+struct NewInvitation {
+    std::string codeHash;
+    std::string number;
+    int uses = 1;
+    Seconds now = 0;
+    Seconds expires = 0;
+};
+
+/// Somebody who has an invitation and wants an account.
+struct Registration {
+    std::string codeHash;
+    std::string number;
+    std::string tokenHash;
+    /// The same again, after an answer that was lost, gives the account another token.
+    std::string keyHash;
+    Seconds now = 0;
+};
+
+enum class RegisterResult {
+    registered,
+    codeUnknown,
+    codeExpired,
+    codeUsedUp,
+    /// The code renews another number's account.
+    codeForOther,
+    numberTaken,
+};
+
 struct Recipient {
     std::string number;
     /// The sender's country calling code, or empty.
@@ -147,6 +186,15 @@ public:
     /// Counts the numbers towards the account's limit, then tells which of them have accounts. Only
     /// how many were asked for is kept, never which.
     virtual JoinedAnswer askJoined(const JoinedQuestion &question) = 0;
+    virtual void addInvitation(const NewInvitation &invitation) = 0;
+    /// Oldest first, the used up and expired ones too as long as they are remembered.
+    virtual std::vector<Invitation> listInvitations() = 0;
+    /// False when there is none. Accounts that it made stay.
+    virtual bool removeInvitation(std::int64_t id) = 0;
+    /// Forgets the invitations that expired at or before `expired`.
+    virtual void forgetInvitations(Seconds expired) = 0;
+    /// Makes an account, or renews one, and counts a use of the code; or does neither.
+    virtual RegisterResult registerAccount(const Registration &registration) = 0;
 
     virtual CreateResult createShare(const NewShare &share) = 0;
     virtual std::optional<ShareRecord> findShare(std::int64_t account, const std::string &key,

@@ -90,6 +90,10 @@ struct SqliteMetadata::Connection {
     /// Makes the share end in `state` at `now`; returns the keys of the blobs it had.
     std::vector<std::string> endShare(const ShareRow &share, ShareState state, Seconds now);
 
+    RegisterResult redeem(const Registration &registration);
+    bool repeat(const Registration &registration);
+    bool makeOrRenew(const Registration &registration, bool renew);
+
     /// Seconds until the share fits the account's limit; nothing when it fits now.
     std::optional<Seconds> waitForLimit(const NewShare &share);
     /// Seconds until the question fits the account's limit; nothing when it fits now.

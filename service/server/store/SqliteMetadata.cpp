@@ -77,8 +77,25 @@ CREATE TABLE questions (
   PRIMARY KEY (account, at)) WITHOUT ROWID;
 )sql";
 
+constexpr const char *withInvitations = R"sql(
+CREATE TABLE invitations (
+  id INTEGER PRIMARY KEY AUTOINCREMENT,
+  code_hash BLOB NOT NULL UNIQUE,
+  number TEXT NOT NULL,
+  uses INTEGER NOT NULL,
+  used INTEGER NOT NULL DEFAULT 0,
+  created INTEGER NOT NULL,
+  expires INTEGER NOT NULL);
+CREATE TABLE redemptions (
+  invitation INTEGER NOT NULL REFERENCES invitations (id) ON DELETE CASCADE,
+  account INTEGER NOT NULL REFERENCES accounts (id) ON DELETE CASCADE,
+  key_hash BLOB NOT NULL,
+  PRIMARY KEY (invitation, account, key_hash)) WITHOUT ROWID;
+CREATE INDEX redemptions_by_account ON redemptions (account);
+)sql";
+
 /// The way from each version of the layout to the next; a fresh file goes all of it.
-constexpr std::array layouts{firstLayout, withEnds, withQuestions};
+constexpr std::array layouts{firstLayout, withEnds, withQuestions, withInvitations};
 
 bool meansFull(int systemError)
 {

@@ -24,6 +24,11 @@ public:
     std::uint64_t usedBytes(std::int64_t account, Seconds since) override;
 
     JoinedAnswer askJoined(const JoinedQuestion &question) override;
+    void addInvitation(const NewInvitation &invitation) override;
+    std::vector<Invitation> listInvitations() override;
+    bool removeInvitation(std::int64_t id) override;
+    void forgetInvitations(Seconds expired) override;
+    RegisterResult registerAccount(const Registration &registration) override;
 
     CreateResult createShare(const NewShare &share) override;
     std::optional<ShareRecord> findShare(std::int64_t account, const std::string &key,

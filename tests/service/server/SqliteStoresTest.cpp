@@ -95,15 +95,19 @@ TEST(SqliteMetadata, AFileOfTheFirstLayoutIsTakenOver)
         metadata.withdrawShare(share.account, key, 1100);
     }
     SQLite::Database(database().string(), SQLite::OPEN_READWRITE)
-        .exec(
-            "DROP TABLE questions; DROP INDEX shares_by_end; ALTER TABLE shares DROP COLUMN ended;"
-            "PRAGMA user_version = 1");
+        .exec("DROP TABLE redemptions; DROP TABLE invitations; DROP TABLE questions;"
+              "DROP INDEX shares_by_end; ALTER TABLE shares DROP COLUMN ended;"
+              "PRAGMA user_version = 1");
     SqliteMetadata metadata(database());
     EXPECT_EQ(metadata.earliestEnd(), 1500);
     const auto account = metadata.findAccount(token)->id;
     EXPECT_EQ(metadata.askJoined({account, {"+491"}, 1500, 1}).joined,
               std::vector<std::string>{"+491"});
     EXPECT_EQ(metadata.findShare(account, key, 1500)->state, ShareState::withdrawn);
+    metadata.addInvitation({std::string(32, 'c'), "+491", 1, 1000, 2000});
+    EXPECT_EQ(
+        metadata.registerAccount({std::string(32, 'c'), "+491", std::string(32, 'n'), "k", 1500}),
+        RegisterResult::registered);
 }
 
 TEST(DirectoryBlobs, AFullStoreIsToldFromABrokenOne)

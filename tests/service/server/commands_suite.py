@@ -43,7 +43,7 @@ class Commands(ServerCase):
 
     def test_help_everywhere(self):
         for words in [[], ["serve"], ["account"], ["account", "add"], ["account", "list"],
-                      ["account", "remove"]]:
+                      ["account", "remove"], ["account", "invite"], ["account", "renew"]]:
             done = run(*words, "--help")
             self.assertEqual(done.returncode, 0)
             self.assertIn("Usage:", done.stdout)

@@ -1,0 +1,114 @@
+#include "accounts/Invitations.h"
+
+#include "http/Errors.h"
+#include "text/Secrets.h"
+
+#include <nlohmann/json.hpp>
+
+#include <algorithm>
+
+namespace pelliko::server
+{
+namespace
+{
+
+constexpr std::size_t bodyLimit = 4096;
+constexpr std::size_t keyLimit = 64;
+using Outcome = RegisterResult;
+
+void checkAttempts(const Request &request, Context &context)
+{
+    if (const auto wait = context.registrations.attempt(addressOf(request), context.now()))
+        throw Refusal(Error::tooManyAttempts, {}, {{"Retry-After", std::to_string(*wait)}});
+}
+
+std::string textOf(const nlohmann::json &body, const char *member)
+{
+    const auto found = body.find(member);
+    if (found == body.end() || !found->is_string())
+        throw Refusal(Error::badRequest,
+                      std::string("The member \"") + member + "\" is missing or malformed.");
+    return found->get<std::string>();
+}
+
+std::string keyHashOf(const Request &request)
+{
+    const std::string *key = request.header("Idempotency-Key");
+    if (key == nullptr || key->empty() || key->size() > keyLimit)
+        throw Refusal(Error::badRequest, "Idempotency-Key has to be 1 to 64 characters.");
+    return sha256(*key);
+}
+
+Registration registrationOf(const Request &request, const std::string &text)
+{
+    const nlohmann::json body = nlohmann::json::parse(text, nullptr, false);
+    if (!body.is_object())
+        throw Refusal(Error::badRequest, "The body is not a JSON object.");
+    Registration registration;
+    registration.number = textOf(body, "number");
+    const std::string code = textOf(body, "code");
+    registration.keyHash = keyHashOf(request);
+    if (!isInternationalNumber(registration.number))
+        throw Refusal(Error::numberInvalid);
+    if (!looksLikeToken(code))
+        throw Refusal(Error::codeUnknown);
+    registration.codeHash = sha256(code);
+    return registration;
+}
+
+void checkOutcome(RegisterResult result)
+{
+    switch (result) {
+    case Outcome::registered:
+        return;
+    case Outcome::codeUnknown:
+        throw Refusal(Error::codeUnknown);
+    case Outcome::codeExpired:
+        throw Refusal(Error::codeExpired);
+    case Outcome::codeUsedUp:
+        throw Refusal(Error::codeUsedUp);
+    case Outcome::codeForOther:
+        throw Refusal(Error::codeForOther);
+    case Outcome::numberTaken:
+        throw Refusal(Error::numberTaken);
+    }
+}
+
+} // namespace
+
+Task<void> registerAccount(Exchange &exchange, Context &context)
+{
+    // Before anything is looked at: no refusal tells a guesser anything for free.
+    checkAttempts(exchange.request(), context);
+    const std::string body = co_await readWholeBody(exchange, bodyLimit);
+    Registration registration = registrationOf(exchange.request(), body);
+    const std::string token = randomToken();
+    registration.tokenHash = sha256(token);
+    registration.now = context.now();
+    const RegisterResult result =
+        co_await context.pool.run([&] { return context.metadata.registerAccount(registration); });
+    checkOutcome(result);
+    const nlohmann::json answer{{"number", registration.number}, {"token", token}};
+    co_await exchange.respond(jsonResponse(Status::created, answer.dump()));
+}
+
+bool isInternationalNumber(std::string_view number)
+{
+    constexpr std::size_t fewest = 7;
+    constexpr std::size_t most = 15;
+    if (number.size() < fewest + 1 || number.size() > most + 1 || number[0] != '+' ||
+        number[1] == '0')
+        return false;
+    number.remove_prefix(1);
+    return std::all_of(number.begin(), number.end(), [](char c) { return c >= '0' && c <= '9'; });
+}
+
+std::string makeInvitation(Metadata &metadata, const std::string &number, int uses, Seconds now,
+                           Seconds expires)
+{
+    std::string code = randomToken();
+    metadata.addInvitation({sha256(code), number, uses, now, expires});
+    return code;
+}
+
+} // namespace pelliko::server
