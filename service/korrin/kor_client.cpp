@@ -1,6 +1,7 @@
 #include "kor_client.h"
 
 #include "kor_account.h"
+#include "kor_sim.h"
 
 #include <glib.h>
 
@@ -50,7 +51,11 @@ int check(const std::string &file, char **imsi, int *state)
     if (!exists && found.kind != AccountFinding::Kind::none)
         return errorOf(found);
     if (exists) {
-        if (const int error = tell(found.account.imsi, imsi); error != KOR_ERROR_NONE)
+        // An account from before SIMs were noted is one all the same.
+        const std::string known = found.account.imsi.empty()
+                                      ? pelliko::korrin::composedImsi(found.account.number)
+                                      : found.account.imsi;
+        if (const int error = tell(known, imsi); error != KOR_ERROR_NONE)
             return error;
     } else {
         *imsi = nullptr;

@@ -1,5 +1,7 @@
 #include "Commands.h"
 
+#include <kor_sim.h>
+
 #include "com.velmora.pelliko.Service1.h"
 
 #include <nlohmann/json.hpp>
@@ -84,6 +86,12 @@ int accountCommand(const std::string &file, Account account)
     if (!std::getline(std::cin, account.token)) {
         std::fprintf(stderr, "pelliko-service: no token came on standard input\n");
         return 1;
+    }
+    if (account.imsi.empty()) {
+        account.imsi = korrin::machineImsi();
+    }
+    if (account.imsi.empty()) {
+        account.imsi = korrin::composedImsi(account.number);
     }
     const std::string fault = korrin::writeAccount(file, account);
     if (!fault.empty()) {

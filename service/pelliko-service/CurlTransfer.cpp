@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <cctype>
 #include <cstdio>
+#include <cstdlib>
 #include <utility>
 
 namespace pelliko::service
@@ -83,6 +84,10 @@ void CurlTransfer::setOptions()
     curl_easy_setopt(easy_, CURLOPT_WRITEDATA, this);
     curl_easy_setopt(easy_, CURLOPT_HEADERFUNCTION, onHeader);
     curl_easy_setopt(easy_, CURLOPT_HEADERDATA, this);
+    // Whoever runs an own server may have made its certificate; the sign-in trusts the same file.
+    if (const char *certificates = std::getenv("SSL_CERT_FILE"); certificates && *certificates) {
+        curl_easy_setopt(easy_, CURLOPT_CAINFO, certificates);
+    }
     for (const std::string &header : request_.headers) {
         headers_ = curl_slist_append(headers_, header.c_str());
     }

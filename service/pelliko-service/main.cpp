@@ -56,7 +56,9 @@ int main(int argc, char **argv)
         app.add_subcommand("account", "Write the account; the token is read from standard input");
     account->add_option("--server", typed.server, "Address of the share server")->required();
     account->add_option("--number", typed.number, "The user's own phone number")->required();
-    account->add_option("--imsi", typed.imsi, "The SIM that the account belongs to");
+    account->add_option("--imsi", typed.imsi,
+                        "IMSI of the SIM that the account belongs to; without it the "
+                        "machine's SIM, else one made from the number");
 
     bool json = false;
     CLI::App *status = app.add_subcommand("status", "Print the requests of the running service");

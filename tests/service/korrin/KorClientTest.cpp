@@ -63,6 +63,15 @@ TEST_F(AccountClient, theAccountTellsItsSim)
     free(imsi);
 }
 
+TEST_F(AccountClient, anAccountFromBeforeSimsWereNotedHasOneOfItsCountry)
+{
+    write("");
+    EXPECT_EQ(kor_check_account_exist(handle, &imsi, &state), KOR_ERROR_NONE);
+    EXPECT_STREQ(imsi, "262005112345678");
+    EXPECT_EQ(state, 1);
+    free(imsi);
+}
+
 TEST_F(AccountClient, aBrokenFileIsAnErrorAndChangesNothing)
 {
     write("262011234567890");
