@@ -30,3 +30,5 @@ find_program(GDBUS_CODEGEN gdbus-codegen REQUIRED)
 if(PELLIKO_TESTS)
   find_package(GTest REQUIRED)
 endif()
+# Phones and desktops without Evolution's data server do without the import from it.
+pkg_check_modules(ebook IMPORTED_TARGET libebook-1.2)

@@ -5,9 +5,9 @@
 
 #include <nlohmann/json.hpp>
 
+#include "ContactArguments.h"
 #include "ContactsWriter.h"
-#include "NumberText.h"
-#include "PictureStore.h"
+#include "EvolutionBooks.h"
 #include "VcardImport.h"
 
 namespace pelliko::contacts_tool
@@ -17,53 +17,25 @@ namespace
 
 using namespace contacts;
 
-ExitCode fail(const std::string &sentence)
-{
-    std::cerr << "contacts-tool: " << sentence << '\n';
-    return ExitCode::Failure;
-}
-
-// Output that did not reach its reader is a failure, for example on a full disk.
-ExitCode finish()
-{
-    std::cout.flush();
-    return std::cout ? ExitCode::Success : fail("the output cannot be written");
-}
-
-bool isPrintable(const std::string &text)
-{
-    const bool blank = text.find_first_not_of(" \t") == std::string::npos;
-    return !blank && std::none_of(text.begin(), text.end(), [](char c) {
-        return static_cast<unsigned char>(c) < ' ' || c == '\x7f';
-    });
-}
-
 // Null, with the sentence in `error`, when the arguments make no contact.
 std::optional<ContactCard> cardOf(const NewContact &contact, std::string &error)
 {
-    ContactCard card;
-    card.display_name = contact.name;
-    card.name_source = NameSource::Name;
-    if (!isPrintable(contact.name)) {
-        error = "the name is empty or not on one line";
+    std::optional<ContactCard> card = namedCard(contact.name, contact.picture, error);
+    if (!card || !addNumber(*card, contact.number, error))
         return std::nullopt;
-    }
-    if (!isPrintable(contact.number) || cleanNumber(contact.number).empty()) {
-        error = "\"" + contact.number + "\" is not a phone number";
-        return std::nullopt;
-    }
-    card.numbers.push_back({contact.number, number_cell, {}, true, contact.joined});
-    if (contact.picture.empty())
-        return card;
-    auto bytes = readPictureFile(contact.picture, error);
-    if (!bytes)
-        return std::nullopt;
-    if (!pictureKind(*bytes)) {
-        error = "the picture " + contact.picture + " is not a JPEG, PNG, GIF, BMP or WebP image";
-        return std::nullopt;
-    }
-    card.picture = std::move(*bytes);
+    card->numbers.front().joined = contact.joined;
     return card;
+}
+
+ExitCode tell(const ImportReport &report, const std::string &source)
+{
+    for (const std::string &message : report.messages)
+        std::cerr << "contacts-tool: " << message << '\n';
+    std::cout << report.added << " added, " << report.updated << " updated, " << report.skipped
+              << " skipped\n";
+    if (report.added + report.updated == 0 && report.skipped > 0)
+        return fail("no card of " + source + " could be imported");
+    return finish();
 }
 
 void printJson(const std::vector<ListedNumber> &numbers)
@@ -71,6 +43,7 @@ void printJson(const std::vector<ListedNumber> &numbers)
     auto rows = nlohmann::ordered_json::array();
     for (const ListedNumber &row : numbers)
         rows.push_back({{"number_id", row.number_id},
+                        {"contact_id", row.contact_id},
                         {"name", row.name},
                         {"number", row.number},
                         {"joined", row.joined}});
@@ -82,13 +55,25 @@ void printJson(const std::vector<ListedNumber> &numbers)
 
 void printTable(const std::vector<ListedNumber> &numbers)
 {
-    std::cout << "number id\tname\tnumber\tjoined\n";
+    std::cout << "number id\tname\tnumber\tjoined\tcontact id\n";
     for (const ListedNumber &row : numbers)
         std::cout << row.number_id << '\t' << row.name << '\t' << row.number << '\t'
-                  << (row.joined ? "yes" : "no") << '\n';
+                  << (row.joined ? "yes" : "no") << '\t' << row.contact_id << '\n';
 }
 
 } // namespace
+
+ExitCode fail(const std::string &sentence)
+{
+    std::cerr << "contacts-tool: " << sentence << '\n';
+    return ExitCode::Failure;
+}
+
+ExitCode finish()
+{
+    std::cout.flush();
+    return std::cout ? ExitCode::Success : fail("the output cannot be written");
+}
 
 ExitCode importFile(const std::string &path)
 {
@@ -98,13 +83,19 @@ ExitCode importFile(const std::string &path)
     const auto report = importVcards(*writer.value, path);
     if (!report)
         return fail(report.error);
-    for (const std::string &message : report.value->messages)
-        std::cerr << "contacts-tool: " << message << '\n';
-    std::cout << report.value->added << " added, " << report.value->updated << " updated, "
-              << report.value->skipped << " skipped\n";
-    if (report.value->added + report.value->updated == 0)
-        return fail("no card of " + path + " could be imported");
-    return finish();
+    return tell(*report.value, path);
+}
+
+ExitCode importEvolution()
+{
+    const auto cards = readEvolutionBooks();
+    if (!cards)
+        return fail(cards.error);
+    auto writer = ContactsWriter::open();
+    if (!writer)
+        return fail(writer.error);
+    const auto report = importCards(*writer.value, *cards.value);
+    return report ? tell(*report.value, "the address books") : fail(report.error);
 }
 
 ExitCode add(const NewContact &contact)

@@ -2,6 +2,7 @@
 #pragma once
 
 #include <string>
+#include <vector>
 
 namespace pelliko::contacts_tool
 {
@@ -19,8 +20,25 @@ struct NewContact {
     bool joined = false;
 };
 
+struct Profile {
+    std::string name;
+    std::vector<std::string> numbers;
+    std::string picture; ///< file name, may be empty
+};
+
 ExitCode importFile(const std::string &path);
+ExitCode importEvolution();
 ExitCode add(const NewContact &contact);
 ExitCode list(bool as_json);
+
+/// Writes contacts, by their contact ids, as vCards into the directory and prints the files' names.
+ExitCode exportContacts(const std::vector<std::string> &ids, bool one_file, std::string directory);
+ExitCode setProfile(const Profile &profile);
+ExitCode showProfile();
+
+/// Says the sentence on standard error.
+ExitCode fail(const std::string &sentence);
+/// Success, when the output reached its reader: it does not on a full disk.
+ExitCode finish();
 
 } // namespace pelliko::contacts_tool

@@ -12,11 +12,11 @@
 namespace pelliko::contacts
 {
 
-/// Id, name, number and joined mark of every number; bound to the service's book. Joined as an
-/// application tests it: the first row of that book with letters decides. Both sides stand in
-/// lower() and the order behind a "+" so that the index over number ids is used.
+/// Id, contact id, name, number and joined mark of every number; bound to the service's book.
+/// Joined as an application tests it: the first row of that book with letters decides. Both sides
+/// stand in lower() and the order behind a "+" so that the index over number ids is used.
 inline constexpr const char *select_listed_numbers =
-    "SELECT n.id, coalesce(c.display_name, ''), n.number, "
+    "SELECT n.id, n.contact_id, coalesce(c.display_name, ''), n.number, "
     "coalesce((SELECT instr(s.sync2, 'R') > 0 FROM contacts s "
     "WHERE lower(s.number_id) = lower(n.id) AND s.address_book_id = ? "
     "AND s.sync2 IS NOT NULL ORDER BY +s.id LIMIT 1), 0) "

@@ -75,8 +75,9 @@ std::vector<ListedNumber> listNumbers(SQLite::Database &database)
     select.bind(1, service_book);
     std::vector<ListedNumber> numbers;
     while (select.executeStep())
-        numbers.push_back({select.getColumn(0).getInt(), select.getColumn(1).getString(),
-                           select.getColumn(2).getString(), select.getColumn(3).getInt() != 0});
+        numbers.push_back({select.getColumn(0).getInt(), select.getColumn(1).getInt(),
+                           select.getColumn(2).getString(), select.getColumn(3).getString(),
+                           select.getColumn(4).getInt() != 0});
     return numbers;
 }
 

@@ -34,6 +34,7 @@ struct SavedContact {
 
 struct ListedNumber {
     int number_id;
+    int contact_id;
     std::string name;
     std::string number;
     bool joined;

@@ -7,38 +7,19 @@
 #include <memory>
 #include <stdexcept>
 #include <system_error>
-#include <utility>
 
 #include <fcntl.h>
 #include <glib.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include "DurableFile.h"
 #include "StateDir.h"
 
 namespace pelliko::contacts
 {
 namespace
 {
-
-class File
-{
-public:
-    explicit File(int descriptor) : m_descriptor(descriptor) {}
-    ~File() { close(); }
-    File(const File &) = delete;
-    File &operator=(const File &) = delete;
-
-    [[nodiscard]] int descriptor() const { return m_descriptor; }
-    bool close()
-    {
-        const int descriptor = std::exchange(m_descriptor, -1);
-        return descriptor < 0 || ::close(descriptor) == 0;
-    }
-
-private:
-    int m_descriptor;
-};
 
 std::string nameOf(std::string_view bytes, const char *kind)
 {
@@ -48,48 +29,10 @@ std::string nameOf(std::string_view bytes, const char *kind)
     return std::string(sum.get()).substr(0, 32) + "." + kind;
 }
 
-bool writeAll(int descriptor, std::string_view bytes)
-{
-    while (!bytes.empty()) {
-        const ssize_t written = ::write(descriptor, bytes.data(), bytes.size());
-        if (written < 0 && errno == EINTR)
-            continue;
-        if (written < 0)
-            return false;
-        bytes.remove_prefix(static_cast<size_t>(written));
-    }
-    return true;
-}
-
-[[noreturn]] void failToStore()
+[[noreturn]] void failToStore(int error)
 {
     throw std::runtime_error("the picture cannot be stored: " +
-                             std::generic_category().message(errno));
-}
-
-void syncFolder(const std::string &folder)
-{
-    File opened(::open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
-    if (opened.descriptor() < 0 || ::fsync(opened.descriptor()) != 0)
-        failToStore();
-}
-
-// Written beside its place and renamed, so that a reader never sees half a picture.
-void writeDurably(const std::string &folder, const std::string &path, std::string_view bytes)
-{
-    std::string temporary = folder + "/.new-XXXXXX";
-    File file(::mkostemp(temporary.data(), O_CLOEXEC));
-    if (file.descriptor() < 0)
-        failToStore();
-    const bool written = writeAll(file.descriptor(), bytes) && ::fsync(file.descriptor()) == 0 &&
-                         file.close() && ::rename(temporary.c_str(), path.c_str()) == 0;
-    if (!written) {
-        const int error = errno;
-        ::unlink(temporary.c_str());
-        errno = error;
-        failToStore();
-    }
-    syncFolder(folder);
+                             std::generic_category().message(error));
 }
 
 std::optional<std::string> readAll(int descriptor, size_t size)
@@ -136,7 +79,7 @@ const char *pictureKind(std::string_view bytes)
 std::optional<std::string> readPictureFile(const std::string &path, std::string &error)
 {
     // Opening a pipe or a device must neither wait nor take it over.
-    File file(::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY));
+    const File file(::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY));
     struct stat status {
     };
     if (file.descriptor() < 0 || ::fstat(file.descriptor(), &status) != 0) {
@@ -166,11 +109,16 @@ std::string storePicture(std::string_view bytes)
         throw std::runtime_error("the picture is not a JPEG, PNG, GIF, BMP or WebP image");
     const std::string folder = platform::stateDirectory() + "/contacts-pictures";
     if (!platform::createPrivateDirectories(folder))
-        failToStore();
-    const std::string path = folder + "/" + nameOf(bytes, kind);
+        failToStore(errno);
+    const std::string name = nameOf(bytes, kind);
+    std::string path = folder + "/" + name;
     if (std::filesystem::exists(path))
         return path;
-    writeDurably(folder, path, bytes);
+    try {
+        replaceFile(folder, name, bytes);
+    } catch (const std::system_error &error) {
+        failToStore(error.code().value());
+    }
     return path;
 }
 

@@ -7,6 +7,7 @@
 #include <libebook-contacts/libebook-contacts.h>
 
 #include "NumberText.h"
+#include "NumberTypes.h"
 #include "PictureStore.h"
 
 namespace pelliko::contacts
@@ -87,32 +88,35 @@ std::string numberText(EVCardAttribute *attribute)
     return percentDecoded(value.substr(4, value.find(';') - 4));
 }
 
-struct TypeWord {
-    const char *word;
-    int bits;
-};
-constexpr std::array type_words{
-    TypeWord{"home", number_home},   TypeWord{"work", number_work},
-    TypeWord{"voice", number_voice}, TypeWord{"fax", number_fax},
-    TypeWord{"msg", number_message}, TypeWord{"text", number_message},
-    TypeWord{"cell", number_cell},   TypeWord{"pager", number_pager},
-};
-
-void takeTypeWord(const char *word, CardNumber &number)
+void takeTypeWord(const char *word, CardNumber &number, int &preference)
 {
     for (const TypeWord &known : type_words) {
         if (isName(word, known.word))
-            number.type |= known.bits;
+            number.type |= known.bit;
     }
     if (isName(word, "pref"))
-        number.is_default = true;
+        preference = 1;
     if (g_ascii_strncasecmp(word, "x-", 2) == 0) {
         number.type |= number_custom;
         number.label = onOneLine(word + 2);
     }
 }
 
-CardNumber numberOf(EVCardAttribute *attribute)
+// How much a number is preferred: 1 most, 100 least. An old card only says that it is.
+constexpr int least_preference = 100;
+constexpr int no_preference = least_preference + 1;
+
+int preferenceOf(EVCardAttributeParam *parameter)
+{
+    const GList *values = e_vcard_attribute_param_get_values(parameter);
+    guint64 preference = 0;
+    const bool is_number =
+        values && g_ascii_string_to_unsigned(static_cast<char *>(values->data), 10, 1,
+                                             least_preference, &preference, nullptr);
+    return is_number ? static_cast<int>(preference) : 1;
+}
+
+CardNumber numberOf(EVCardAttribute *attribute, int &preference)
 {
     CardNumber number;
     number.number = numberText(attribute);
@@ -120,11 +124,11 @@ CardNumber numberOf(EVCardAttribute *attribute)
         auto *parameter = static_cast<EVCardAttributeParam *>(at->data);
         const char *name = e_vcard_attribute_param_get_name(parameter);
         if (isName(name, "PREF"))
-            number.is_default = true;
+            preference = std::min(preference, preferenceOf(parameter));
         if (!isName(name, "TYPE"))
             continue;
         for (GList *word = e_vcard_attribute_param_get_values(parameter); word; word = word->next)
-            takeTypeWord(static_cast<const char *>(word->data), number);
+            takeTypeWord(static_cast<const char *>(word->data), number, preference);
     }
     return number;
 }
@@ -193,14 +197,43 @@ void takeName(ContactCard &card, std::string name, NameSource source)
     card.name_source = source;
 }
 
-void takeAttribute(EVCardAttribute *attribute, ContactCard &card, std::string &spoken,
-                   std::vector<std::string> &notes)
+// What is known of a card while its attributes are read one by one.
+struct Reading {
+    ContactCard card;
+    std::string spoken_name;
+    int best_preference = no_preference;
+    bool is_group = false;
+};
+
+// Of several numbers that are preferred alike the first one is the person's default.
+void takeNumber(EVCardAttribute *attribute, Reading &reading)
 {
+    int preference = no_preference;
+    reading.card.numbers.push_back(numberOf(attribute, preference));
+    if (preference >= reading.best_preference)
+        return;
+    reading.best_preference = preference;
+    for (CardNumber &number : reading.card.numbers)
+        number.is_default = false;
+    reading.card.numbers.back().is_default = true;
+}
+
+bool saysGroup(EVCardAttribute *attribute, const char *name)
+{
+    const bool kind = isName(name, "KIND") || isName(name, "X-ADDRESSBOOKSERVER-KIND");
+    const std::string value = firstValueOf(attribute);
+    return (kind && isName(value.c_str(), "group")) ||
+           (isName(name, "X-EVOLUTION-LIST") && isName(value.c_str(), "TRUE"));
+}
+
+void takeAttribute(EVCardAttribute *attribute, Reading &reading, std::vector<std::string> &notes)
+{
+    ContactCard &card = reading.card;
     const char *name = e_vcard_attribute_get_name(attribute);
     if (isName(name, "FN"))
         takeName(card, onOneLine(wholeValueOf(attribute)), NameSource::Name);
     else if (isName(name, "N"))
-        spoken = spokenName(attribute);
+        reading.spoken_name = spokenName(attribute);
     else if (isName(name, "ORG"))
         takeName(card, firstValueOf(attribute), NameSource::Organisation);
     else if (isName(name, "NICKNAME"))
@@ -210,9 +243,11 @@ void takeAttribute(EVCardAttribute *attribute, ContactCard &card, std::string &s
     else if (isName(name, "UID"))
         card.uid = onOneLine(wholeValueOf(attribute));
     else if (isName(name, "TEL"))
-        card.numbers.push_back(numberOf(attribute));
+        takeNumber(attribute, reading);
     else if (isName(name, "PHOTO") && card.picture.empty())
         card.picture = pictureOf(attribute, notes);
+    else if (saysGroup(attribute, name))
+        reading.is_group = true;
 }
 
 void dropUnusableNumbers(ContactCard &card, std::vector<std::string> &notes)
@@ -228,19 +263,34 @@ void dropUnusableNumbers(ContactCard &card, std::vector<std::string> &notes)
     std::erase_if(card.numbers, unusable);
 }
 
+// Such a number is kept: a person may have written an extension or a word behind it, and finds it
+// again. Whether it can be reached is for those to say who send something there.
+void noteLetters(const ContactCard &card, std::vector<std::string> &notes)
+{
+    for (const CardNumber &number : card.numbers) {
+        if (std::any_of(number.number.begin(), number.number.end(),
+                        [](char c) { return g_ascii_isalpha(c); }))
+            notes.push_back("the phone number \"" + number.number +
+                            "\" has letters in it and may not be reached");
+    }
+}
+
 } // namespace
 
 ReadCard readCard(const std::string &text)
 {
     ReadCard read;
-    ContactCard card;
-    std::string spoken;
+    Reading reading;
     const Unreffed<EVCard> vcard(e_vcard_new_from_string(text.c_str()), g_object_unref);
     // The library lists attributes in the order of the card; the list stays the card's.
     for (GList *at = e_vcard_get_attributes(vcard.get()); at; at = at->next)
-        takeAttribute(static_cast<EVCardAttribute *>(at->data), card, spoken, read.notes);
-    takeName(card, spoken, NameSource::Name);
+        takeAttribute(static_cast<EVCardAttribute *>(at->data), reading, read.notes);
+    if (reading.is_group)
+        return {std::nullopt, {"it is a group of people and no person"}};
+    ContactCard &card = reading.card;
+    takeName(card, reading.spoken_name, NameSource::Name);
     dropUnusableNumbers(card, read.notes);
+    noteLetters(card, read.notes);
 
     if (card.numbers.empty() && card.display_name.empty()) {
         read.notes.emplace_back("there is neither a name nor a phone number in it");

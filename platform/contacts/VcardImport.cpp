@@ -29,24 +29,23 @@ Outcome<std::string> readFile(const std::string &path)
 
 std::string placeOf(size_t index, const RawCard &raw)
 {
-    return "card " + std::to_string(index + 1) + " (line " + std::to_string(raw.line) + "): ";
+    return "card " + std::to_string(index + 1) + " (line " + std::to_string(raw.line) + ")";
 }
 
 // The cards worth keeping; the others are counted and named in the report.
-std::vector<ContactCard> readCards(const std::vector<RawCard> &raw_cards, ImportReport &report)
+std::vector<ContactCard> readCards(const std::vector<PlacedCard> &placed_cards,
+                                   ImportReport &report)
 {
     std::vector<ContactCard> cards;
-    for (size_t i = 0; i < raw_cards.size(); ++i) {
-        const RawCard &raw = raw_cards[i];
-        const std::string place = placeOf(i, raw);
+    for (const PlacedCard &placed : placed_cards) {
         ReadCard read;
-        if (raw.error.empty())
-            read = readCard(raw.text);
+        if (placed.error.empty())
+            read = readCard(placed.text);
         else
-            read.notes.push_back(raw.error);
+            read.notes.push_back(placed.error);
         const char *ending = read.card ? "." : "; the card was skipped.";
         for (const std::string &note : read.notes)
-            report.messages.push_back(place + note + ending);
+            report.messages.push_back(placed.place + ": " + note + ending);
         if (read.card)
             cards.push_back(std::move(*read.card));
         else
@@ -57,22 +56,30 @@ std::vector<ContactCard> readCards(const std::vector<RawCard> &raw_cards, Import
 
 } // namespace
 
-Outcome<ImportReport> importVcards(ContactsWriter &writer, const std::string &path)
+Outcome<ImportReport> importCards(ContactsWriter &writer, const std::vector<PlacedCard> &cards)
 {
-    const Outcome<std::string> text = readFile(path);
-    if (!text)
-        return {std::nullopt, text.error};
-    const std::vector<RawCard> raw_cards = splitCards(*text.value);
-    if (raw_cards.empty())
-        return {std::nullopt, path + " holds no vCard"};
     ImportReport report;
-    const std::vector<ContactCard> cards = readCards(raw_cards, report);
-    const auto saved = writer.save(cards);
+    const auto saved = writer.save(readCards(cards, report));
     if (!saved)
         return {std::nullopt, saved.error};
     for (const SavedContact &contact : *saved.value)
         ++(contact.added ? report.added : report.updated);
     return {std::move(report), {}};
+}
+
+Outcome<ImportReport> importVcards(ContactsWriter &writer, const std::string &path)
+{
+    const Outcome<std::string> text = readFile(path);
+    if (!text)
+        return {std::nullopt, text.error};
+    std::vector<PlacedCard> cards;
+    for (RawCard &raw : splitCards(*text.value)) {
+        const std::string place = placeOf(cards.size(), raw);
+        cards.push_back({place, std::move(raw.text), std::move(raw.error)});
+    }
+    if (cards.empty())
+        return {std::nullopt, path + " holds no vCard"};
+    return importCards(writer, cards);
 }
 
 } // namespace pelliko::contacts

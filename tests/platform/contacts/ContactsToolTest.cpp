@@ -44,12 +44,12 @@ TEST_F(ContactsTool, AddPrintsTheNumberIdAndListShowsIt)
     const Run again = tool({"add", "--name", "Ann", "--number", "+44 7700 900123"});
     EXPECT_EQ(again.status, 0);
     EXPECT_EQ(again.out, "1\n");
-    EXPECT_EQ(tool({"list"}).out, "number id\tname\tnumber\tjoined\n"
-                                  "1\tAnn\t+44 7700 900123\tyes\n"
-                                  "2\t王小明\t+447700900124\tno\n");
+    EXPECT_EQ(tool({"list"}).out, "number id\tname\tnumber\tjoined\tcontact id\n"
+                                  "1\tAnn\t+44 7700 900123\tyes\t1\n"
+                                  "2\t王小明\t+447700900124\tno\t3\n");
     const auto expected = nlohmann::json::parse(R"([
-        {"number_id": 1, "name": "Ann", "number": "+44 7700 900123", "joined": true},
-        {"number_id": 2, "name": "王小明", "number": "+447700900124", "joined": false}])");
+        {"number_id": 1, "contact_id": 1, "name": "Ann", "number": "+44 7700 900123", "joined": true},
+        {"number_id": 2, "contact_id": 3, "name": "王小明", "number": "+447700900124", "joined": false}])");
     EXPECT_EQ(nlohmann::json::parse(tool({"list", "--json"}).out), expected);
 }
 
@@ -109,6 +109,23 @@ TEST_F(ContactsTool, FailuresAreOneSentenceAndAStatus)
         {{"add", "--name", "A", "--number", "1", "--picture", text},
          1,
          "contacts-tool: the picture " + text + " is not a JPEG, PNG, GIF, BMP or WebP image\n"},
+        {{"export", "9", "--to", m_folder.string()},
+         1,
+         "contacts-tool: one of the ids is no contact's; nothing was exported\n"},
+        {{"export", "one", "--to", m_folder.string()},
+         1,
+         "contacts-tool: a contact id is a number such as those that \"list\" shows\n"},
+        {{"profile", "show"},
+         1,
+         "contacts-tool: there is no profile yet; \"profile set\" makes one\n"},
+        {{"profile", "set", "--name", "Me", "--number", "abc"},
+         1,
+         "contacts-tool: \"abc\" is not a phone number\n"},
+        {{"profile", "set", "--name", "Me"}, 2, ""},
+        {{"profile"}, 2, ""},
+        {{"export", "1"}, 2, ""},
+        {{"import"}, 2, ""},
+        {{"import", text, "--evolution"}, 2, ""},
         {{"add", "--name", "A"}, 2, ""},
         {{}, 2, ""},
         {{"dance"}, 2, ""},
@@ -124,11 +141,33 @@ TEST_F(ContactsTool, FailuresAreOneSentenceAndAStatus)
     EXPECT_EQ(tool({"list", "--json"}).out, "[]\n");
 }
 
+TEST_F(ContactsTool, ExportPrintsTheFilesThatItWrote)
+{
+    EXPECT_EQ(tool({"add", "--name", "Ann", "--number", "1"}).status, 0);
+    EXPECT_EQ(tool({"add", "--name", "Bob", "--number", "2"}).status, 0);
+    const std::string folder = m_folder.string();
+    const Run each = tool({"export", "1", "2", "--to", folder});
+    EXPECT_EQ(each.out, folder + "/Ann.vcf\n" + folder + "/Bob.vcf\n") << each.err;
+    EXPECT_EQ(tool({"export", "1", "2", "--one-file", "--to", folder + "/"}).out,
+              folder + "/contacts.vcf\n");
+    EXPECT_TRUE(std::filesystem::exists(folder + "/contacts.vcf"));
+}
+
+TEST_F(ContactsTool, TheProfileIsShownAsItWasSet)
+{
+    const std::string path = file("me.png", picture('m'));
+    const Run set = tool({"profile", "set", "--name", "Me", "--number", "+49 1", "--number", "2",
+                          "--picture", path});
+    EXPECT_EQ(set.status, 0) << set.err;
+    EXPECT_EQ(tool({"profile", "show"}).out, "Me\n+49 1\n2\nwith a picture of 9 bytes\n");
+    EXPECT_EQ(tool({"list", "--json"}).out, "[]\n");
+}
+
 TEST_F(ContactsTool, HelpIsNoFailure)
 {
     const Run run = tool({"--help"});
     EXPECT_EQ(run.status, 0);
-    for (const char *word : {"import", "add", "list"})
+    for (const char *word : {"import", "add", "list", "export", "profile"})
         EXPECT_NE(run.out.find(word), std::string::npos) << word;
 }
 

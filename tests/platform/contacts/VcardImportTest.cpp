@@ -1,6 +1,8 @@
 #include <fstream>
 #include <iterator>
 
+#include <SQLiteCpp/SQLiteCpp.h>
+
 #include "ContactsFixture.h"
 #include "VcardImport.h"
 
@@ -36,6 +38,17 @@ protected:
     }
     static Rows names() { return all(_contacts_person._uri, _contacts_person.display_name); }
     static Rows numbers() { return all(_contacts_number._uri, _contacts_number.number); }
+    /// The numbers that are their contact's default.
+    [[nodiscard]] Rows preferred() const
+    {
+        SQLite::Database database(databaseFile().string());
+        SQLite::Statement select(database,
+                                 "SELECT number FROM numbers WHERE is_default = 1 ORDER BY id");
+        Rows found;
+        while (select.executeStep())
+            found.push_back(select.getColumn(0).getString());
+        return found;
+    }
     static std::string pictureBytes()
     {
         const Rows paths = all(_contacts_person._uri, _contacts_person.image_thumbnail_path);
@@ -162,6 +175,55 @@ TEST_F(VcardImport, ACardWithoutNumberIsKeptAndNamed)
                     "card 2 (line 5): the phone number \"call me\" has no digit and was left out.",
                     "card 2 (line 5): it has no phone number, so nothing can be shared with it."}));
     EXPECT_EQ(imported(card("FN:Ann")).updated, 1U);
+}
+
+TEST_F(VcardImport, GroupsAreNoContacts)
+{
+    const ImportReport report =
+        imported("BEGIN:VCARD\r\nVERSION:4.0\r\nKIND:group\r\nFN:Team\r\nTEL:9\r\n"
+                 "MEMBER:urn:uuid:1\r\nEND:VCARD\r\n" +
+                 card("X-ADDRESSBOOKSERVER-KIND:group\r\nN:Friends\r\nFN:Friends") +
+                 card("FN:List\r\nX-EVOLUTION-LIST:TRUE\r\nEMAIL:a@example.org") +
+                 card("KIND:individual\r\nX-EVOLUTION-LIST:FALSE\r\nFN:Ann\r\nTEL:1"));
+    EXPECT_EQ(names(), Rows{"Ann"});
+    EXPECT_EQ(report.skipped, 3U);
+    EXPECT_EQ(report.messages.at(0),
+              "card 1 (line 1): it is a group of people and no person; the card was skipped.");
+}
+
+TEST_F(VcardImport, TheMostPreferredNumberIsTheDefault)
+{
+    imported("BEGIN:VCARD\r\nVERSION:4.0\r\nFN:Ann\r\nTEL;PREF=20:1\r\nTEL:2\r\n"
+             "TEL;PREF=2;VALUE=uri:tel:3\r\nTEL;PREF=nonsense;TYPE=x-a:4\r\n"
+             "TEL;TYPE=pref:5\r\nEND:VCARD\r\n");
+    EXPECT_EQ(preferred(), Rows{"4"});
+    imported(card("FN:Bob\r\nTEL;PREF=100:6\r\nTEL:7"));
+    EXPECT_EQ(preferred(), (Rows{"4", "6"}));
+}
+
+TEST_F(VcardImport, ANumberWithLettersIsKeptAndNamed)
+{
+    const ImportReport report =
+        imported(card("FN:Shop\r\nTEL:+1-800-FLOWERS\r\nTEL:030 12 ext. 3"));
+    EXPECT_EQ(numbers(), (Rows{"+1-800-FLOWERS", "030 12 ext. 3"}));
+    EXPECT_EQ(
+        report.messages,
+        (Rows{"card 1 (line 1): the phone number \"+1-800-FLOWERS\" has letters in it and may "
+              "not be reached.",
+              "card 1 (line 1): the phone number \"030 12 ext. 3\" has letters in it and may "
+              "not be reached."}));
+}
+
+TEST_F(VcardImport, BrokenFoldingLosesNoMoreThanItsLine)
+{
+    imported(card("FN:Ann\r\nNOTE:a line that goes\r\non without a space\r\nTEL:1") +
+             "BEGIN:VCARD\r\n VERSION:3.0\r\nFN:Bo\r\n\tb\r\n\r\nTEL:2\r\nEND:VCARD\r\n" +
+             card("FN;ENCODING=QUOTED-PRINTABLE:C=ZZ=4\r\nTEL:3") +
+             card("FN;ENCODING=b:%%%%\r\nN:Dee\r\nTEL:4") + card("FN:Eve\r\nTEL:5"));
+    EXPECT_EQ(numbers(), (Rows{"1", "2", "3", "4", "5"}));
+    EXPECT_EQ(names().at(0), "Ann");
+    EXPECT_EQ(names().at(1), "Bob");
+    EXPECT_EQ(names().at(4), "Eve");
 }
 
 TEST_F(VcardImport, BrokenCardsAreNamedByPlaceAndTheRestIsImported)

@@ -1,0 +1,15 @@
+// A ContactCard written as a vCard.
+#pragma once
+
+#include <string>
+
+#include "ContactCard.h"
+
+namespace pelliko::contacts
+{
+
+/// The card as vCard 3.0 in UTF-8, with CRLF at its end: all numbers with their types, the picture
+/// inside. Throws std::bad_alloc only.
+std::string vcardText(const ContactCard &card);
+
+} // namespace pelliko::contacts

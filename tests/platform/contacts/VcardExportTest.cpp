@@ -1,0 +1,362 @@
+// Contacts written to files, and read back by another implementation.
+#include <fstream>
+#include <iterator>
+#include <set>
+#include <sstream>
+#include <thread>
+
+#include <csignal>
+#include <glib.h>
+#include <nlohmann/json.hpp>
+#include <sys/resource.h>
+
+#include "ContactsFixture.h"
+#include "ExportFiles.h"
+#include "MyProfile.h"
+#include "VcardImport.h"
+#include "contacts_service_helper.h"
+
+namespace pelliko::contacts::test
+{
+
+using Names = std::vector<std::string>;
+using nlohmann::json;
+
+class VcardExport : public Store
+{
+protected:
+    VcardExport() { std::filesystem::create_directory(m_folder / "out"); }
+
+    struct Calls {
+        Names names;
+        std::vector<int> counts;
+        size_t stop_after = SIZE_MAX;
+    };
+
+    static bool note(const char *file_name, int progress_count, void *user_data)
+    {
+        auto &calls = *static_cast<Calls *>(user_data);
+        calls.names.emplace_back(file_name);
+        calls.counts.push_back(progress_count);
+        return calls.names.size() < calls.stop_after;
+    }
+
+    [[nodiscard]] std::string directory() const { return m_folder / "out/"; }
+
+    int exported(std::vector<std::string> ids, int share_mode, Calls &calls) const
+    {
+        std::vector<char *> list;
+        for (std::string &id : ids)
+            list.push_back(id.data());
+        return contacts_service_helper_create_vcard_files(directory().c_str(), list.data(),
+                                                          static_cast<int>(list.size()), share_mode,
+                                                          note, &calls);
+    }
+    Names exported(const std::vector<std::string> &ids, int share_mode) const
+    {
+        Calls calls;
+        EXPECT_EQ(exported(ids, share_mode, calls), CONTACTS_ERROR_NONE);
+        return calls.names;
+    }
+
+    /// All names in the directory, hidden ones too.
+    [[nodiscard]] std::set<std::string> left() const
+    {
+        std::set<std::string> names;
+        for (const auto &entry : std::filesystem::directory_iterator(directory()))
+            names.insert(entry.path().filename());
+        return names;
+    }
+
+    [[nodiscard]] std::string text(const std::string &name) const
+    {
+        std::ifstream in(directory() + name, std::ios::binary);
+        return {std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>()};
+    }
+
+    /// What python3-vobject reads.
+    [[nodiscard]] json readBack(const std::string &name) const
+    {
+        const std::string path = directory() + name;
+        const char *words[] = {"/usr/bin/python3",
+                               PELLIKO_SOURCE_DIR "/tests/platform/contacts/read_vcards.py",
+                               path.c_str(), nullptr};
+        char *out = nullptr;
+        EXPECT_TRUE(g_spawn_sync(nullptr, const_cast<char **>(words), nullptr, G_SPAWN_DEFAULT,
+                                 nullptr, nullptr, &out, nullptr, nullptr, nullptr));
+        const std::unique_ptr<char, decltype(&g_free)> owned(out, g_free);
+        return json::parse(out, nullptr, false);
+    }
+
+    static std::string sumOf(const std::string &bytes)
+    {
+        const std::unique_ptr<char, decltype(&g_free)> sum(
+            g_compute_checksum_for_string(G_CHECKSUM_SHA256, bytes.data(),
+                                          static_cast<gssize>(bytes.size())),
+            g_free);
+        return sum.get();
+    }
+
+    std::string addContact(const ContactCard &contact)
+    {
+        return std::to_string(save(contact).contact_id);
+    }
+};
+
+TEST_F(VcardExport, AnotherProgramReadsNameNumbersTypesAndPicture)
+{
+    ContactCard ann = card("Ann; the \"quick\", of Ä\\B & 王小明", "+49 151 1");
+    ann.uid = "urn:uuid:1";
+    ann.numbers[0].is_default = true;
+    ann.numbers.push_back({"030 2", number_work | number_fax, {}, false, false});
+    ann.numbers.push_back({"030 3", number_home, {}, false, false});
+    ann.numbers.push_back({"030 4", number_custom, "Boat \"2\": x", false, false});
+    ann.numbers.push_back({"030 5", number_other, {}, false, false});
+    ann.picture = "\xff\xd8\xff" + std::string("a\0b\r\nc", 6);
+    const Names names = exported({addContact(ann)}, 0);
+    ASSERT_EQ(names, Names{"Ann; the _quick_, of Ä_B & 王小明.vcf"});
+    EXPECT_EQ(readBack(names[0]),
+              json::array({{{"version", "3.0"},
+                            {"name", ann.display_name},
+                            {"given", ann.display_name},
+                            {"uid", "urn:uuid:1"},
+                            {"numbers",
+                             {{{"number", "+49 151 1"}, {"types", {"CELL", "PREF"}}},
+                              {{"number", "030 2"}, {"types", {"FAX", "WORK"}}},
+                              {{"number", "030 3"}, {"types", {"HOME"}}},
+                              {{"number", "030 4"}, {"types", {"X-BOAT '2': X"}}},
+                              {{"number", "030 5"}, {"types", json::array()}}}},
+                            {"picture", sumOf(ann.picture)},
+                            {"picture_type", "JPEG"}}}));
+}
+
+TEST_F(VcardExport, LinesOfANameStayOneValueAndLongLinesAreFolded)
+{
+    const std::string id = addContact(card("x", "1"));
+    const std::string name = "First\nSecond " + std::string(300, 'y') + " €€€€";
+    sql("UPDATE contacts SET display_name = 'First' || char(10) || 'Second " +
+        std::string(300, 'y') + " €€€€'");
+    const Names names = exported({id}, 1);
+    EXPECT_EQ(readBack(names[0])[0]["name"], name);
+    EXPECT_EQ(names[0], "First_Second " + std::string(87, 'y') + ".vcf");
+    std::istringstream lines(text(names[0]));
+    for (std::string line; std::getline(lines, line);)
+        EXPECT_LE(line.size(), 300U) << line;
+}
+
+TEST_F(VcardExport, ManyContactsGoIntoOneFileOrIntoOneEach)
+{
+    const Names ids = {addContact(card("Ann", "1")), addContact(card("Bob", "2")),
+                       addContact(card("Cem", "3"))};
+    Calls one;
+    EXPECT_EQ(exported(ids, 0, one), CONTACTS_ERROR_NONE);
+    EXPECT_EQ(one.names, Names{"contacts.vcf"});
+    EXPECT_EQ(one.counts, std::vector<int>{1});
+    const json cards = readBack("contacts.vcf");
+    ASSERT_EQ(cards.size(), 3U);
+    EXPECT_EQ(cards[2]["name"], "Cem");
+
+    Calls each;
+    EXPECT_EQ(exported({ids[2], ids[0], ids[1]}, 1, each), CONTACTS_ERROR_NONE);
+    EXPECT_EQ(each.names, (Names{"Cem.vcf", "Ann.vcf", "Bob.vcf"}));
+    EXPECT_EQ(each.counts, (std::vector<int>{1, 2, 3}));
+    EXPECT_EQ(readBack("Bob.vcf")[0]["numbers"][0]["number"], "2");
+    EXPECT_EQ(left(), (std::set<std::string>{"contacts.vcf", "Cem.vcf", "Ann.vcf", "Bob.vcf"}));
+}
+
+TEST_F(VcardExport, NamesakesAndEarlierFilesKeepTheirOwn)
+{
+    const Names ids = {addContact(card("Ann", "1")), addContact(card("Ann", "2"))};
+    std::ofstream(directory() + "Ann.vcf") << "something else";
+    EXPECT_EQ(exported(ids, 1), (Names{"Ann (2).vcf", "Ann (3).vcf"}));
+    EXPECT_EQ(exported({ids[0]}, 1), Names{"Ann (4).vcf"});
+    EXPECT_EQ(text("Ann.vcf"), "something else");
+    EXPECT_EQ(readBack("Ann (3).vcf")[0]["numbers"][0]["number"], "2");
+}
+
+TEST_F(VcardExport, NamesBecomeSafeFileNames)
+{
+    EXPECT_EQ(fileStem("../../etc/passwd"), "_.._etc_passwd");
+    EXPECT_EQ(fileStem(".hidden"), "hidden");
+    EXPECT_EQ(fileStem("a\tb\nc?d|e"), "a_b_c_d_e");
+    EXPECT_EQ(fileStem(" .. "), "contact");
+    EXPECT_EQ(fileStem(""), "contact");
+    EXPECT_EQ(fileStem("Dr. José Núñez, Jr."), "Dr. José Núñez, Jr");
+    EXPECT_EQ(fileStem(std::string(98, 'x') + "€€"), std::string(98, 'x'));
+    EXPECT_EQ(fileStem("\xff\xfe"), "\xef\xbf\xbd\xef\xbf\xbd");
+}
+
+TEST_F(VcardExport, ACardWithoutNameIsNamedByItsNumberAndOneWithNothingToo)
+{
+    const std::string number = addContact(card("", "+49 1"));
+    EXPECT_EQ(exported({number}, 1), Names{"+49 1.vcf"});
+    EXPECT_EQ(readBack("+49 1.vcf")[0]["name"], "+49 1");
+    const std::string bare = addContact(ContactCard{});
+    EXPECT_EQ(exported({bare}, 1), Names{"contact.vcf"});
+}
+
+TEST_F(VcardExport, APictureOfTenMebibytesIsWrittenWhole)
+{
+    ContactCard big = card("Big", "1");
+    big.picture = "\x89PNG\r\n\x1a\n";
+    for (unsigned state = 1; big.picture.size() < size_t{10} << 20;) {
+        state = state * 1664525U + 1013904223U;
+        big.picture += static_cast<char>(state >> 24);
+    }
+    const Names names = exported({addContact(big)}, 0);
+    EXPECT_EQ(readBack(names.at(0))[0]["picture"], sumOf(big.picture));
+    std::filesystem::remove_all(m_folder / "pelliko-platform");
+    auto writer = ContactsWriter::open();
+    const auto report = importVcards(*writer.value, directory() + "Big.vcf");
+    ASSERT_TRUE(report) << report.error;
+    EXPECT_EQ(report.value->messages, Names{});
+    const auto stored = std::filesystem::directory_iterator(pictureFolder())->path();
+    EXPECT_EQ(std::filesystem::file_size(stored), big.picture.size());
+}
+
+TEST_F(VcardExport, APictureWhoseFileIsGoneIsLeftOut)
+{
+    ContactCard ann = card("Ann", "1");
+    ann.picture = picture('a');
+    const std::string id = addContact(ann);
+    std::filesystem::remove_all(pictureFolder());
+    EXPECT_EQ(readBack(exported({id}, 1).at(0))[0]["picture"], nullptr);
+}
+
+TEST_F(VcardExport, AnIdThatIsNoContactFailsTheWholeExport)
+{
+    const std::string ann = addContact(card("Ann", "1"));
+    const struct {
+        Names ids;
+        int error;
+    } rows[] = {
+        {{ann, "99"}, CONTACTS_ERROR_NO_DATA},
+        {{ann, "2147483648"}, CONTACTS_ERROR_INVALID_PARAMETER},
+        {{"x"}, CONTACTS_ERROR_INVALID_PARAMETER},
+        {{"1x"}, CONTACTS_ERROR_INVALID_PARAMETER},
+        {{""}, CONTACTS_ERROR_INVALID_PARAMETER},
+        {{"-1"}, CONTACTS_ERROR_INVALID_PARAMETER},
+        {{"0"}, CONTACTS_ERROR_INVALID_PARAMETER},
+        {{}, CONTACTS_ERROR_INVALID_PARAMETER},
+    };
+    for (const auto &row : rows) {
+        for (const int share_mode : {0, 1}) {
+            Calls calls;
+            EXPECT_EQ(exported(row.ids, share_mode, calls), row.error);
+            EXPECT_EQ(calls.names, Names{});
+        }
+    }
+    EXPECT_EQ(left(), std::set<std::string>{});
+}
+
+TEST_F(VcardExport, ARowOfTheSharingServiceIsNoContact)
+{
+    add("Ann", {"1"}, true);
+    Calls calls;
+    EXPECT_EQ(exported({"2"}, 0, calls), CONTACTS_ERROR_NO_DATA);
+}
+
+TEST_F(VcardExport, WrongArgumentsAreRefused)
+{
+    char id[] = "1";
+    char *ids[] = {id, nullptr};
+    Calls calls;
+    const std::string to = directory();
+    const auto create = contacts_service_helper_create_vcard_files;
+    const auto profile = contacts_service_helper_create_vcard_file_by_my_profile;
+    addContact(card("Ann", "1"));
+    EXPECT_EQ(create(nullptr, ids, 1, 0, note, &calls), CONTACTS_ERROR_INVALID_PARAMETER);
+    EXPECT_EQ(create(to.c_str(), nullptr, 1, 0, note, &calls), CONTACTS_ERROR_INVALID_PARAMETER);
+    EXPECT_EQ(create(to.c_str(), ids, 0, 0, note, &calls), CONTACTS_ERROR_INVALID_PARAMETER);
+    EXPECT_EQ(create(to.c_str(), ids, -1, 0, note, &calls), CONTACTS_ERROR_INVALID_PARAMETER);
+    EXPECT_EQ(create(to.c_str(), ids, 2, 0, note, &calls), CONTACTS_ERROR_INVALID_PARAMETER);
+    EXPECT_EQ(create(to.c_str(), ids, 1, 2, note, &calls), CONTACTS_ERROR_INVALID_PARAMETER);
+    EXPECT_EQ(create(to.c_str(), ids, 1, 0, nullptr, &calls), CONTACTS_ERROR_INVALID_PARAMETER);
+    EXPECT_EQ(profile(nullptr, nullptr, note, &calls), CONTACTS_ERROR_INVALID_PARAMETER);
+    EXPECT_EQ(profile(to.c_str(), nullptr, nullptr, &calls), CONTACTS_ERROR_INVALID_PARAMETER);
+    EXPECT_EQ(create("/nowhere/", ids, 1, 0, note, &calls), CONTACTS_ERROR_SYSTEM);
+    EXPECT_EQ(create("/proc/", ids, 1, 0, note, &calls), CONTACTS_ERROR_SYSTEM);
+    EXPECT_EQ(calls.names, Names{});
+    EXPECT_EQ(left(), std::set<std::string>{});
+}
+
+TEST_F(VcardExport, AFileThatCannotGrowLeavesNothing)
+{
+    ContactCard big = card("Big", "1");
+    big.picture = picture('b') + std::string(100000, 'b');
+    const Names ids = {addContact(card("Ann", "2")), addContact(big)};
+    const rlimit small = {50000, RLIM_INFINITY};
+    rlimit before{};
+    getrlimit(RLIMIT_FSIZE, &before);
+    signal(SIGXFSZ, SIG_IGN);
+    setrlimit(RLIMIT_FSIZE, &small);
+    Calls calls;
+    const int error = exported(ids, 1, calls);
+    setrlimit(RLIMIT_FSIZE, &before);
+    EXPECT_EQ(error, CONTACTS_ERROR_SYSTEM);
+    EXPECT_EQ(calls.names, Names{});
+    EXPECT_EQ(left(), std::set<std::string>{});
+}
+
+TEST_F(VcardExport, TheCallbackMayStopTheExport)
+{
+    const Names ids = {addContact(card("Ann", "1")), addContact(card("Bob", "2")),
+                       addContact(card("Cem", "3"))};
+    Calls calls;
+    calls.stop_after = 2;
+    EXPECT_EQ(exported(ids, 1, calls), CONTACTS_ERROR_NONE);
+    EXPECT_EQ(calls.names, (Names{"Ann.vcf", "Bob.vcf"}));
+    EXPECT_EQ(left(), (std::set<std::string>{"Ann.vcf", "Bob.vcf"}));
+}
+
+TEST_F(VcardExport, AWorkerExportsOnAConnectionOfItsOwn)
+{
+    const std::string id = addContact(card("Ann", "1"));
+    Names names;
+    std::thread worker([&] { names = exported({id}, 1); });
+    worker.join();
+    EXPECT_EQ(names, Names{"Ann.vcf"});
+    contacts_record_h record = nullptr;
+    EXPECT_EQ(contacts_db_get_record(_contacts_number._uri, 1, &record), CONTACTS_ERROR_IPC);
+}
+
+TEST_F(VcardExport, TheProfileIsExportedWhateverTheId)
+{
+    Calls calls;
+    const std::string to = directory();
+    const auto create = contacts_service_helper_create_vcard_file_by_my_profile;
+    EXPECT_EQ(create(to.c_str(), "1", note, &calls), CONTACTS_ERROR_NO_DATA);
+    ContactCard me = card("Me, myself", "+49 1");
+    me.numbers.push_back({"2", number_work, {}, false, false});
+    me.picture = picture('m');
+    ASSERT_TRUE(saveMyProfile(me));
+    addContact(card("Ann", "1"));
+    for (const char *id : {static_cast<const char *>(nullptr), "1", "nonsense"})
+        EXPECT_EQ(create(to.c_str(), id, note, &calls), CONTACTS_ERROR_NONE);
+    EXPECT_EQ(calls.names, (Names{"Me, myself.vcf", "Me, myself (2).vcf", "Me, myself (3).vcf"}));
+    EXPECT_EQ(calls.counts, (std::vector<int>{1, 1, 1}));
+    const json read = readBack("Me, myself.vcf")[0];
+    EXPECT_EQ(read["name"], "Me, myself");
+    EXPECT_EQ(read["numbers"].size(), 2U);
+    EXPECT_EQ(read["picture"], sumOf(me.picture));
+}
+
+TEST_F(VcardExport, WhatIsExportedComesInAgainAsItWas)
+{
+    ContactCard ann = card("Ann; B, C\\D", "+49 151 1");
+    ann.uid = "u1";
+    ann.numbers[0].is_default = true;
+    ann.numbers.push_back({"2", number_work | number_fax, {}, false, false});
+    ann.numbers.push_back({"3", number_custom, "Boot", false, false});
+    ann.picture = picture('a');
+    exported({addContact(ann)}, 0);
+    auto writer = ContactsWriter::open();
+    const auto report = importVcards(*writer.value, directory() + exported({"1"}, 1).at(0));
+    ASSERT_TRUE(report) << report.error;
+    EXPECT_EQ(report.value->updated, 1U);
+    EXPECT_EQ(report.value->messages, Names{});
+    const Names again = exported({"1"}, 1);
+    EXPECT_EQ(text(again.at(0)), text("Ann; B, C_D.vcf"));
+}
+
+} // namespace pelliko::contacts::test
