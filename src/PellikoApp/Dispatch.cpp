@@ -1,8 +1,10 @@
 #include "PellikoApp/Dispatch.h"
 
 #include "AppLog/AppLog.h"
+#include "PellikoApp/ContactVcard.h"
 #include "PellikoApp/ShareRequest.h"
 #include "PellikoApp/SmsSender.h"
+#include "PellikoApp/TextArray.h"
 #include "PellikoApp/Window.h"
 
 #include <cstring>
@@ -13,6 +15,8 @@ namespace pelliko
 namespace
 {
 
+constexpr const char *contactMime = "application/vnd.tizen.contact";
+constexpr int quietContactCount = 99; // more take long enough to tell the user
 constexpr const char *resumeReplyKey = "resume_by_app";
 
 void _replyResume(app_control_h request, const char *value)
@@ -117,6 +121,18 @@ Next _onDefault(const Launch &launch, PellikoAppData *ad)
     return Next::run;
 }
 
+// Contacts become a file first, away from the loop; the file then goes on as a share of its own.
+Next _onContacts(const Launch &launch, PellikoAppData *ad)
+{
+    LOG_DEBUG("MIME case - create uri with vcf !!");
+    ad->operation_type = OPERATION_SHARE;
+    ensureMainWindow(launch.app, ad);
+    if (TextArray(ad->app_control, APP_CONTROL_DATA_ID).length() > quietContactCount)
+        _showProcessingPopup(ad);
+    startContactVcard(ad);
+    return Next::wait;
+}
+
 struct OperationRow {
     const char *operation;
     Next (*handle)(const Launch &launch, PellikoAppData *ad);
@@ -134,6 +150,8 @@ constexpr OperationRow operations[] = {
 
 Next dispatch(const Launch &launch, PellikoAppData *ad)
 {
+    if (launch.mime && strcmp(launch.mime.get(), contactMime) == 0)
+        return _onContacts(launch, ad);
     for (const OperationRow &row : operations) {
         if (launch.operation && strcmp(launch.operation.get(), row.operation) == 0)
             return row.handle(launch, ad);

@@ -19,8 +19,9 @@ struct Launch {
 
 /// What follows once a request was read.
 enum class Next {
-    run,  ///< the operation is to be done
-    leave ///< the request could not be understood
+    run,   ///< the operation is to be done
+    leave, ///< the request could not be understood
+    wait   ///< a worker is at it, and the operation follows it
 };
 
 /// Reads the request into the record as its operation asks; the operation itself is not done here.

@@ -139,9 +139,10 @@ void PellikoApp::onAppControl(app_control_h request, bool)
                            _readReshare(ad, reshare.get())};
     LOG_DEBUG("operation = %s, mime = %s, reshare = %s", textOrNull(launch.operation.get()),
               textOrNull(launch.mime.get()), textOrNull(reshare.get()));
-    if (dispatch(launch, ad) == Next::run)
+    const Next next = dispatch(launch, ad);
+    if (next == Next::run)
         _runWithAccount(ad);
-    else if (!ad->popup)
+    else if (next == Next::leave && !ad->popup)
         _hideWindow(ad); // the clear window lies above everything and would swallow every touch
 }
 

@@ -2,6 +2,7 @@
 
 #include "AppLog/AppLog.h"
 #include "PellikoApp/Decimal.h"
+#include "PellikoApp/TextArray.h"
 #include "PellikoApp/TextFormat.h"
 #include "PellikoUploadDataManager/SupportedFileTypes.h"
 #include "PellikoUploadManager/ExitPolicy.h"
@@ -35,35 +36,6 @@ constexpr size_t toastSize = 512;
 constexpr size_t memoPathSize = 128;
 constexpr size_t pathSize = 1025;
 constexpr int schemeSlashes = 2; // what follows the colon of "file:" before the path begins
-
-// A text array of a request; an element may be null.
-class TextArray
-{
-public:
-    TextArray(app_control_h request, const char *key)
-        : result_(app_control_get_extra_data_array(request, key, &texts_, &length_))
-    {
-    }
-    TextArray(const TextArray &) = delete;
-    TextArray &operator=(const TextArray &) = delete;
-    ~TextArray()
-    {
-        for (int i = 0; texts_ && i < length_; ++i)
-            free(texts_[i]);
-        free(texts_);
-    }
-
-    int result() const { return result_; }
-    int length() const { return length_; }
-    bool readable() const { return result_ == APP_CONTROL_ERROR_NONE; }
-    bool filled() const { return readable() && texts_ && length_ > 0; }
-    const char *operator[](int index) const { return texts_[index]; }
-
-private:
-    char **texts_ = nullptr;
-    int length_ = 0;
-    int result_;
-};
 
 void _postToast(const char *id)
 {

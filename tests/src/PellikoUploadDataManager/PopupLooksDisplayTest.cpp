@@ -1,6 +1,7 @@
 // How the popup looks on the screen that it gets: run on several sizes of screens.
 #include "PellikoUploadDataManager/ConfirmationPopup.h"
 
+#include "PellikoApp/ContactVcard.h"
 #include "support/PopupScene.h"
 
 #include <algorithm>
@@ -227,6 +228,21 @@ TEST_P(PopupLooks, ReshareInGermanToOne)
     share(100, 512 << 20, {{"Mara Lindqvist", true}});
     open("german-reshare");
     expectNothingClipped();
+}
+
+TEST_P(PopupLooks, ProcessingContacts)
+{
+    _showProcessingPopup(ad);
+    Evas_Object *layout = elm_object_content_get(ad->processing_popup);
+    ASSERT_TRUE(settle(layout));
+    photograph("looks-processing-" + size);
+    expectWholeLine(layout, "elm.text");
+    const Box ring = boxOf(elm_object_part_content_get(layout, "processing"));
+    EXPECT_EQ(ring.width, ring.height);
+    EXPECT_GT(ring.width, 0);
+    const Box words = boxOf(part(layout, "elm.text"));
+    EXPECT_LE(ring.x + ring.width, words.x);
+    evas_object_del(ad->processing_popup);
 }
 
 INSTANTIATE_TEST_SUITE_P(TextSizes, PopupLooks, ::testing::Values(1.0, 1.3));
