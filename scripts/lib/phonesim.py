@@ -14,7 +14,7 @@ failed); SLOT counts from 1:
                      (ofonod does not live through a modem that reports no SIM or an empty number)
   power SLOT on|off  switches the modem as the phone's shell does
   enter-pin SLOT PIN                                         unlocks the SIM (the PIN is 1234)
-  service start|stop|kill                                    the modem service
+  service start|stop|kill|hang                               the modem service
   wait-message SLOT N                                        answers when the modem was handed N parts since the reset
   reset              everything as at the start, with a new modem service
 
@@ -318,6 +318,8 @@ class Phone:
     async def obey_service(self, what):
         if what == "start":
             await self.start()
+        elif what == "hang":
+            self.service.process.send_signal(signal.SIGSTOP)
         else:
             await self.service.end(signal.SIGKILL if what == "kill" else signal.SIGTERM)
 

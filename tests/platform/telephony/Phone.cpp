@@ -99,14 +99,34 @@ OfonoDouble::~OfonoDouble()
     g_object_unref(process_);
 }
 
-void OfonoDouble::setSim(const char *property, GVariant *value)
+void OfonoDouble::call(const char *path, const char *interface, const char *method,
+                       GVariant *arguments)
 {
     GVariant *reply =
-        g_dbus_connection_call_sync(systemBus(), "org.ofono", "/ril_0", "org.ofono.SimManager",
-                                    "SetProperty", g_variant_new("(sv)", property, value), nullptr,
-                                    G_DBUS_CALL_FLAGS_NONE, 5000, nullptr, nullptr);
+        g_dbus_connection_call_sync(systemBus(), "org.ofono", path, interface, method, arguments,
+                                    nullptr, G_DBUS_CALL_FLAGS_NONE, 5000, nullptr, nullptr);
     if (reply)
         g_variant_unref(reply);
+}
+
+void OfonoDouble::setSim(const char *property, GVariant *value)
+{
+    call("/ril_0", "org.ofono.SimManager", "SetProperty", g_variant_new("(sv)", property, value));
+}
+
+void OfonoDouble::addModem(const char *name)
+{
+    call("/", "org.freedesktop.DBus.Mock", "AddModem", g_variant_new("(sa{sv})", name, nullptr));
+}
+
+void OfonoDouble::setConnection(const char *modem, bool up)
+{
+    const std::string answer =
+        std::string("ret = [(dbus.ObjectPath('/context'), {'Active': dbus.Boolean(") +
+        (up ? "True" : "False") + ", variant_level=1)})]";
+    call(modem, "org.freedesktop.DBus.Mock", "AddMethod",
+         g_variant_new("(sssss)", "org.ofono.ConnectionManager", "GetContexts", "", "a(oa{sv})",
+                       answer.c_str()));
 }
 
 } // namespace phone

@@ -35,9 +35,16 @@ public:
     OfonoDouble &operator=(const OfonoDouble &) = delete;
 
     bool isReady() const { return process_ != nullptr; }
+    /// A property of the first modem's SIM.
     void setSim(const char *property, GVariant *value);
+    void addModem(const char *name);
+    /// Gives the modem one data connection, up or down.
+    void setConnection(const char *modem, bool up);
 
 private:
+    static void call(const char *path, const char *interface, const char *method,
+                     GVariant *arguments);
+
     GSubprocess *process_ = nullptr;
 };
 

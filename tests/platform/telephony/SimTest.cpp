@@ -187,4 +187,20 @@ TEST_F(Sim, AMissingCardAndAnEmptyNumber)
     EXPECT_EQ(imsiOf("/ril_0"), "262 011 234567890") << "this SIM's network code has three digits";
 }
 
+TEST_F(Sim, OfTwoUsableSimsTheConnectedOneCarriesTheData)
+{
+    ASSERT_EQ(phone::tell("service stop"), "ok");
+    phone::OfonoDouble ofono;
+    ASSERT_TRUE(ofono.isReady());
+    ofono.addModem("ril_10");
+    ofono.addModem("ril_2");
+    EXPECT_THAT(modemNames(), ElementsAre("/ril_0", "/ril_2", "/ril_10"));
+    EXPECT_EQ(dataSim(), -9);
+    ofono.setConnection("/ril_0", false);
+    ofono.setConnection("/ril_2", true);
+    EXPECT_EQ(dataSim(), 1);
+    ofono.setConnection("/ril_0", true);
+    EXPECT_EQ(dataSim(), -9) << "two are connected";
+}
+
 } // namespace

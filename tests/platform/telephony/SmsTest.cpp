@@ -177,6 +177,13 @@ TEST_F(Sms, TheServiceDiesWhileSending)
     EXPECT_TRUE(phone::messages().empty());
 }
 
+TEST_F(Sms, AServiceThatHangsIsAFailure)
+{
+    ASSERT_EQ(phone::tell("service hang"), "ok");
+    EXPECT_NE(send("+491511", "lost"), MSG_SUCCESS);
+    EXPECT_TRUE(phone::messages().empty());
+}
+
 TEST_F(Sms, TheModemIsSwitchedOffWhileSending)
 {
     EXPECT_NE(sendInterruptedBy("power 1 off"), MSG_SUCCESS);
