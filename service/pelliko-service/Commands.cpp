@@ -4,9 +4,11 @@
 
 #include "com.velmora.pelliko.Service1.h"
 
+#include <PhoneNumbers.h>
 #include <nlohmann/json.hpp>
 
 #include <cstdio>
+#include <functional>
 #include <iostream>
 
 namespace pelliko::service
@@ -37,6 +39,34 @@ Row rowOf(GVariant *request)
     return row;
 }
 
+struct RecipientRow {
+    const char *number = "";
+    const char *e164 = "";
+    const char *fault = "";
+    const char *joined = "";
+};
+
+// The texts stay the variant's.
+RecipientRow recipientOf(GVariant *recipient)
+{
+    RecipientRow row;
+    g_variant_lookup(recipient, "number", "&s", &row.number);
+    g_variant_lookup(recipient, "e164", "&s", &row.e164);
+    g_variant_lookup(recipient, "fault", "&s", &row.fault);
+    g_variant_lookup(recipient, "joined", "&s", &row.joined);
+    return row;
+}
+
+void forEachRecipient(GVariant *request, const std::function<void(const RecipientRow &)> &take)
+{
+    g_autoptr(GVariant) list =
+        g_variant_lookup_value(request, "recipients", G_VARIANT_TYPE("aa{sv}"));
+    for (gsize i = 0; list && i < g_variant_n_children(list); ++i) {
+        g_autoptr(GVariant) recipient = g_variant_get_child_value(list, i);
+        take(recipientOf(recipient));
+    }
+}
+
 GVariant *askRequests()
 {
     g_autoptr(GError) error = nullptr;
@@ -60,6 +90,12 @@ void printTable(GVariant *requests)
         const Row row = rowOf(request);
         std::printf("%10d  %-10s %7d%% %6d %15" G_GINT64_FORMAT " %6d\n", row.id, row.state,
                     row.percent, row.files, row.size, row.error);
+        forEachRecipient(request, [](const RecipientRow &recipient) {
+            if (*recipient.fault) {
+                std::printf("%12s%s gets nothing: %s\n", "", recipient.number,
+                            numbers::faultSentence(recipient.fault));
+            }
+        });
     }
 }
 
@@ -69,13 +105,21 @@ void printJson(GVariant *requests)
     for (gsize i = 0; i < g_variant_n_children(requests); ++i) {
         g_autoptr(GVariant) request = g_variant_get_child_value(requests, i);
         const Row row = rowOf(request);
+        nlohmann::json recipients = nlohmann::json::array();
+        forEachRecipient(request, [&recipients](const RecipientRow &recipient) {
+            recipients.push_back({{"number", recipient.number},
+                                  {"e164", recipient.e164},
+                                  {"fault", recipient.fault},
+                                  {"joined", recipient.joined}});
+        });
         list.push_back({{"id", row.id},
                         {"state", row.state},
                         {"percent", row.percent},
                         {"files", row.files},
                         {"size", row.size},
                         {"expires", row.expires},
-                        {"error", row.error}});
+                        {"error", row.error},
+                        {"recipients", recipients}});
     }
     std::printf("%s\n", list.dump().c_str());
 }

@@ -21,6 +21,7 @@ constexpr std::array table{
     Failure{"share_too_large", false, errorRefused},
     Failure{"too_large", false, errorRefused},
     Failure{"daily_limit", false, errorRefused},
+    Failure{"numbers_limit", true, errorUnreachable},
     Failure{"header_too_large", false, errorRefused},
     Failure{"internal", true, errorUnreachable},
     Failure{"no_space", true, errorUnreachable},
@@ -33,6 +34,7 @@ constexpr std::array table{
     Failure{"unexpected_answer", true, errorUnreachable},
     // on this side
     Failure{"no_account", false, errorRefused},
+    Failure{"no_recipient", false, errorDevice}, // no number of them is a phone number
     Failure{"file_changed", false, errorDevice},
     Failure{"file_vanished", false, errorDevice},
     Failure{"file_unreadable", false, errorDevice},

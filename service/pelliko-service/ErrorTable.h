@@ -5,7 +5,7 @@
 namespace pelliko::service
 {
 
-constexpr int errorDevice = -5;      ///< a file of the share is at fault
+constexpr int errorDevice = -5;      ///< the share's files or recipients are at fault
 constexpr int errorUnreachable = -7; ///< the server could not be reached for a long time
 constexpr int errorRefused = -16;    ///< the server, or the service itself, refuses the request
 

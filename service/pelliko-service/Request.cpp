@@ -1,5 +1,6 @@
 #include "Request.h"
 
+#include <PhoneNumbers.h>
 #include <glib.h>
 
 #include <algorithm>
@@ -76,6 +77,9 @@ void Request::proceed()
         return;
     }
     account_ = *account;
+    if (!numbersAreKnown()) {
+        return;
+    }
     waitsForNetwork_ = !context_.gate.open(account_.server, record_.wifiOnly);
     if (waitsForNetwork_) {
         g_message("request %d: waits for a network", record_.id);
@@ -84,10 +88,30 @@ void Request::proceed()
     } else if (record_.share.empty()) {
         create();
     } else if (!record_.reshareOf.empty()) {
-        finish();
+        askJoined();
     } else {
         askOffsets();
     }
+}
+
+bool Request::numbersAreKnown()
+{
+    if (findForms(record_.recipients, account_.number)) {
+        if (!store([&] { context_.queue.setFindings(record_.id, record_.recipients); })) {
+            return false;
+        }
+        for (size_t i = 0; i < record_.recipients.size(); ++i) {
+            if (const std::string &fault = record_.recipients[i].fault; !fault.empty()) {
+                g_warning("request %d: recipient %zu of %zu gets nothing: %s", record_.id, i + 1,
+                          record_.recipients.size(), numbers::faultSentence(fault));
+            }
+        }
+    }
+    if (people(record_.recipients).empty()) {
+        fail(failureNamed("no_recipient"));
+        return false;
+    }
+    return true;
 }
 
 bool Request::filesAreThere()
@@ -162,7 +186,7 @@ void Request::takeRecord(const HttpAnswer &answer)
     if (record_.reshareOf.empty()) {
         uploadFiles(*share);
     } else {
-        finish();
+        askJoined();
     }
 }
 
@@ -189,7 +213,7 @@ void Request::uploadFiles(const ShareRecord &share)
                       if (failure) {
                           fail(*failure);
                       } else {
-                          finish();
+                          askJoined();
                       }
                   });
 }
@@ -204,6 +228,31 @@ void Request::onProgress(int64_t present, bool stored)
         progress_.repeatNext();
     }
     progress_.update(present);
+}
+
+// The share goes on without an answer: whoever is not known to have joined gets a message.
+void Request::askJoined()
+{
+    auto numbers = askable(record_.recipients);
+    if (asked_ || numbers.empty()) {
+        finish();
+        return;
+    }
+    question_ = std::make_unique<JoinedQuestion>(context_.http, context_.timers, account_);
+    question_->ask(std::move(numbers),
+                   [this](const JoinedFindings &findings) { onJoined(findings); });
+}
+
+void Request::onJoined(const JoinedFindings &findings)
+{
+    question_.reset();
+    noteJoined(record_.recipients, findings.asked, findings.joined);
+    if (!findings.asked.empty() &&
+        !store([&] { context_.queue.setFindings(record_.id, record_.recipients); })) {
+        return;
+    }
+    asked_ = findings.refused || askable(record_.recipients).empty();
+    finish();
 }
 
 void Request::finish()

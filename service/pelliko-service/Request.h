@@ -2,6 +2,7 @@
 
 #include "Backoff.h"
 #include "FilesUpload.h"
+#include "JoinedQuestion.h"
 #include "ProgressReporter.h"
 #include "RequestContext.h"
 #include "SmsDelivery.h"
@@ -40,6 +41,7 @@ public:
 
 private:
     void proceed();
+    bool numbersAreKnown();
     bool filesAreThere();
     void create();
     void onCreated(const HttpAnswer &answer);
@@ -48,6 +50,8 @@ private:
     void takeRecord(const HttpAnswer &answer);
     void uploadFiles(const ShareRecord &share);
     void onProgress(int64_t present, bool stored);
+    void askJoined();
+    void onJoined(const JoinedFindings &findings);
     void finish();
     void onFinished(const HttpAnswer &answer);
     void tellRecipients();
@@ -71,6 +75,7 @@ private:
     Backoff backoff_;
     ProgressReporter progress_;
     std::unique_ptr<FilesUpload> files_;
+    std::unique_ptr<JoinedQuestion> question_;
     std::unique_ptr<SmsDelivery> sms_;
     uint64_t transfer_ = 0;
     uint64_t retryTimer_ = 0;
@@ -79,6 +84,7 @@ private:
     bool maybeCreated_;
     bool started_ = false;
     bool paused_ = false;
+    bool asked_ = false; ///< the server has said who has joined, or that it does not
     bool waitsForNetwork_ = false;
     bool ended_ = false;
 };

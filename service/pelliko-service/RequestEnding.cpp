@@ -110,6 +110,7 @@ void Request::stopTransfers()
     context_.http.cancel(std::exchange(transfer_, 0));
     context_.timers.cancel(std::exchange(retryTimer_, 0));
     files_.reset();
+    question_.reset();
     progress_.stop();
 }
 

@@ -28,6 +28,43 @@ int percentOf(const QueuedRequest &record, const Request *running)
     return uploaded ? 100 : running ? running->percent() : 0;
 }
 
+const char *joinedName(Joined joined)
+{
+    switch (joined) {
+    case Joined::no:
+        return "no";
+    case Joined::yes:
+        return "yes";
+    case Joined::unknown:
+        break;
+    }
+    return "unknown";
+}
+
+// What clients hand over may be any bytes, a text on the bus may not.
+GVariant *text(const std::string &bytes)
+{
+    return g_variant_new_take_string(
+        g_utf8_make_valid(bytes.data(), static_cast<gssize>(bytes.size())));
+}
+
+GVariant *recipientList(const std::vector<Recipient> &recipients)
+{
+    GVariantBuilder list;
+    g_variant_builder_init(&list, G_VARIANT_TYPE("aa{sv}"));
+    for (const Recipient &recipient : recipients) {
+        GVariantBuilder entry;
+        g_variant_builder_init(&entry, G_VARIANT_TYPE_VARDICT);
+        g_variant_builder_add(&entry, "{sv}", "number", text(recipient.number));
+        g_variant_builder_add(&entry, "{sv}", "e164", text(recipient.e164));
+        g_variant_builder_add(&entry, "{sv}", "fault", text(recipient.fault));
+        g_variant_builder_add(&entry, "{sv}", "joined",
+                              g_variant_new_string(joinedName(recipient.joined)));
+        g_variant_builder_add_value(&list, g_variant_builder_end(&entry));
+    }
+    return g_variant_builder_end(&list);
+}
+
 GVariant *entry(const QueuedRequest &record, const Request *running)
 {
     int64_t total = 0;
@@ -46,6 +83,7 @@ GVariant *entry(const QueuedRequest &record, const Request *running)
     add("size", g_variant_new_int64(total));
     add("expires", g_variant_new_int64(record.expires));
     add("error", g_variant_new_int32(record.error));
+    add("recipients", recipientList(record.recipients));
     return g_variant_builder_end(&builder);
 }
 } // namespace

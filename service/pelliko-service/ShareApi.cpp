@@ -18,21 +18,27 @@ HttpRequest request(const Account &account, const char *method, const std::strin
     return result;
 }
 
-HttpRequest postShare(const Account &account, const std::string &key, const Json &body)
+HttpRequest post(const Account &account, const std::string &path, const Json &body)
 {
-    HttpRequest result = request(account, "POST", "/api/v1/shares");
-    result.headers.push_back("Idempotency-Key: " + key);
+    HttpRequest result = request(account, "POST", path);
     result.headers.push_back("Content-Type: application/json");
     // File names may be any bytes; what is no UTF-8 is shown by replacement characters.
     result.body = body.dump(-1, ' ', false, Json::error_handler_t::replace);
     return result;
 }
 
+HttpRequest postShare(const Account &account, const std::string &key, const Json &body)
+{
+    HttpRequest result = post(account, "/api/v1/shares", body);
+    result.headers.push_back("Idempotency-Key: " + key);
+    return result;
+}
+
 Json recipientsJson(const std::vector<Recipient> &recipients)
 {
     Json list = Json::array();
-    for (const Recipient &recipient : recipients) {
-        list.push_back({{"number", recipient.number}, {"ccc", recipient.ccc}});
+    for (const Recipient &recipient : people(recipients)) {
+        list.push_back({{"number", recipient.e164}, {"ccc", recipient.ccc}});
     }
     return list;
 }
@@ -90,6 +96,11 @@ HttpRequest withdrawShare(const Account &account, const std::string &share)
     return request(account, "DELETE", sharePath(share));
 }
 
+HttpRequest askJoined(const Account &account, const std::vector<std::string> &numbers)
+{
+    return post(account, "/api/v1/joined", {{"numbers", numbers}});
+}
+
 const Failure &failureOf(const HttpAnswer &answer)
 {
     if (!answer.failure.empty()) {
@@ -127,6 +138,18 @@ std::optional<FinishedShare> readFinished(const HttpAnswer &answer)
         const Json json = Json::parse(answer.body);
         return FinishedShare{json.at("url").get<std::string>(), json.at("expires").get<int64_t>(),
                              json.at("sms").get<std::vector<std::string>>()};
+    } catch (const std::exception &) {
+        return std::nullopt;
+    }
+}
+
+std::optional<std::vector<std::string>> readJoined(const HttpAnswer &answer)
+{
+    if (!answer.failure.empty() || answer.status != 200) {
+        return std::nullopt;
+    }
+    try {
+        return Json::parse(answer.body).at("joined").get<std::vector<std::string>>();
     } catch (const std::exception &) {
         return std::nullopt;
     }

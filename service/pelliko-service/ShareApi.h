@@ -3,18 +3,12 @@
 #include "Account.h"
 #include "ErrorTable.h"
 #include "Http.h"
+#include "Recipient.h"
 
 #include <optional>
 
 namespace pelliko::service
 {
-
-/** One recipient of a share. */
-struct Recipient {
-    std::string ccc;
-    std::string number;
-    int32_t numberId = 0;
-};
 
 /** A file as the server is told of it. */
 struct AnnouncedFile {
@@ -39,7 +33,8 @@ struct FinishedShare {
     std::vector<std::string> sms; ///< the numbers to be told by SMS
 };
 
-/** The requests of the share server's JSON interface. */
+/** The requests of the share server's JSON interface. Recipients are told to it by their E.164
+ * form, each person once; whoever has none is left out. */
 namespace ShareApi
 {
 HttpRequest createShare(const Account &account, const std::string &key,
@@ -51,6 +46,7 @@ HttpRequest createReshare(const Account &account, const std::string &key,
 HttpRequest getShare(const Account &account, const std::string &share);
 HttpRequest finishShare(const Account &account, const std::string &share);
 HttpRequest withdrawShare(const Account &account, const std::string &share);
+HttpRequest askJoined(const Account &account, const std::vector<std::string> &numbers);
 
 /** What an answer means when it is none of those that were hoped for. */
 const Failure &failureOf(const HttpAnswer &answer);
@@ -60,6 +56,9 @@ std::optional<ShareRecord> readShare(const HttpAnswer &answer);
 
 /** Reads the answer of finishing. @return nothing when it is no such answer */
 std::optional<FinishedShare> readFinished(const HttpAnswer &answer);
+
+/** Reads the numbers that have joined. @return nothing when it is no such answer */
+std::optional<std::vector<std::string>> readJoined(const HttpAnswer &answer);
 } // namespace ShareApi
 
 } // namespace pelliko::service

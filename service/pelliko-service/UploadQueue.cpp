@@ -12,11 +12,10 @@ namespace pelliko::service
 {
 namespace
 {
-constexpr int schemaVersion = 1;
 constexpr int busyMs =
     60'000; // a backup that holds the file locked makes the service wait, not fail
 
-constexpr const char *schema = R"sql(
+constexpr const char *firstLayout = R"sql(
 CREATE TABLE requests (
   id INTEGER PRIMARY KEY AUTOINCREMENT CHECK (id BETWEEN 1 AND 2147483647),
   state INTEGER NOT NULL,
@@ -60,6 +59,16 @@ CREATE TABLE sms_numbers (
 ) WITHOUT ROWID;
 )sql";
 
+// What is found out about a recipient stands beside what the client said.
+constexpr const char *withForms = R"sql(
+ALTER TABLE recipients ADD COLUMN e164 TEXT NOT NULL DEFAULT '';
+ALTER TABLE recipients ADD COLUMN fault TEXT NOT NULL DEFAULT '';
+ALTER TABLE recipients ADD COLUMN joined INTEGER NOT NULL DEFAULT 0;
+)sql";
+
+/** The way from each version of the layout to the next; a fresh file goes all of it. */
+constexpr std::array layouts{firstLayout, withForms};
+
 std::unique_ptr<SQLite::Database> openDatabase(const std::string &file)
 {
     g_autofree char *folder = g_path_get_dirname(file.c_str());
@@ -95,7 +104,9 @@ void addFiles(SQLite::Database &db, int64_t id, const std::vector<QueuedFile> &f
 
 void addRecipients(SQLite::Database &db, int64_t id, const std::vector<Recipient> &recipients)
 {
-    SQLite::Statement insert(db, "INSERT INTO recipients VALUES (?, ?, ?, ?, ?)");
+    SQLite::Statement insert(db,
+                             "INSERT INTO recipients (request, position, ccc, number, number_id)"
+                             " VALUES (?, ?, ?, ?, ?)");
     int position = 0;
     for (const Recipient &recipient : recipients) {
         SQLite::bind(insert, id, position++, recipient.ccc, recipient.number, recipient.numberId);
@@ -138,13 +149,17 @@ void UploadQueue::migrate()
 {
     SQLite::Transaction transaction(*db_, SQLite::TransactionBehavior::IMMEDIATE);
     const int version = db_->execAndGet("PRAGMA user_version").getInt();
-    if (version > schemaVersion) {
+    const int newest = static_cast<int>(layouts.size());
+    if (version > newest) {
         throw std::runtime_error("the queue was made by a newer pelliko-service");
     }
-    if (version == 0) {
-        db_->exec(schema);
-        db_->exec("PRAGMA user_version = 1");
+    if (version == newest) {
+        return;
     }
+    for (auto step = static_cast<size_t>(version); step < layouts.size(); ++step) {
+        db_->exec(layouts[step]);
+    }
+    db_->exec("PRAGMA user_version = " + std::to_string(newest));
     transaction.commit();
 }
 
@@ -204,12 +219,15 @@ void UploadQueue::readFiles(QueuedRequest &request)
 
 void UploadQueue::readRecipients(QueuedRequest &request)
 {
-    SQLite::Statement query(
-        *db_, "SELECT ccc, number, number_id FROM recipients WHERE request = ? ORDER BY position");
+    SQLite::Statement query(*db_,
+                            "SELECT ccc, number, number_id, e164, fault, joined FROM recipients"
+                            " WHERE request = ? ORDER BY position");
     query.bind(1, request.id);
     while (query.executeStep()) {
-        request.recipients.push_back({query.getColumn(0).getString(),
-                                      query.getColumn(1).getString(), query.getColumn(2).getInt()});
+        request.recipients.push_back(
+            {query.getColumn(0).getString(), query.getColumn(1).getString(),
+             query.getColumn(2).getInt(), query.getColumn(3).getString(),
+             query.getColumn(4).getString(), static_cast<Joined>(query.getColumn(5).getInt())});
     }
     SQLite::Statement sms(*db_,
                           "SELECT number FROM sms_numbers WHERE request = ? ORDER BY position");
@@ -237,6 +255,20 @@ std::vector<int32_t> UploadQueue::allIds()
 std::vector<int32_t> UploadQueue::openIds()
 {
     return ids("SELECT id FROM requests WHERE state < 2 OR delivered = 0 ORDER BY id");
+}
+
+void UploadQueue::setFindings(int32_t id, const std::vector<Recipient> &recipients)
+{
+    SQLite::Transaction transaction(*db_, SQLite::TransactionBehavior::IMMEDIATE);
+    int position = 0;
+    for (const Recipient &recipient : recipients) {
+        execute(*db_,
+                "UPDATE recipients SET e164 = ?, fault = ?, joined = ?"
+                " WHERE request = ? AND position = ?",
+                recipient.e164, recipient.fault, static_cast<int>(recipient.joined), id,
+                position++);
+    }
+    transaction.commit();
 }
 
 void UploadQueue::setShare(int32_t id, const std::string &share)

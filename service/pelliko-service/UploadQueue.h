@@ -89,6 +89,8 @@ public:
     /** Requests that have not ended, or whose end no client has heard of. */
     std::vector<int32_t> openIds();
 
+    /** Keeps what was found out about a request's recipients, who are as many as it has. */
+    void setFindings(int32_t id, const std::vector<Recipient> &recipients);
     void setShare(int32_t id, const std::string &share);
     /** The server has finished the share: its link and the numbers to be told are kept. */
     void setFinished(int32_t id, const FinishedShare &finished);

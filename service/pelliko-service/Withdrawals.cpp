@@ -59,10 +59,12 @@ void Withdrawals::findShare(const Account &account, const QueuedRequest &request
     for (const QueuedFile &file : request.files) {
         files.push_back({file.path, file.stamp.size});
     }
+    std::vector<Recipient> recipients = request.recipients;
+    findForms(recipients, account.number);
     HttpRequest create =
         request.reshareOf.empty()
-            ? ShareApi::createShare(account, request.key, files, request.recipients)
-            : ShareApi::createReshare(account, request.key, request.reshareOf, request.recipients);
+            ? ShareApi::createShare(account, request.key, files, recipients)
+            : ShareApi::createReshare(account, request.key, request.reshareOf, recipients);
     transfer_ = context_.http.send(std::move(create), nullptr, [this](const HttpAnswer &answer) {
         transfer_ = 0;
         onFound(answer);

@@ -14,9 +14,9 @@ TEST(ErrorTable, refusalsOfTheServerAreFinalServerErrors)
     }
 }
 
-TEST(ErrorTable, filesAtFaultAreDeviceErrors)
+TEST(ErrorTable, filesOrRecipientsAtFaultAreDeviceErrors)
 {
-    for (const char *name : {"file_changed", "file_vanished", "file_unreadable"}) {
+    for (const char *name : {"file_changed", "file_vanished", "file_unreadable", "no_recipient"}) {
         EXPECT_FALSE(failureNamed(name).retry) << name;
         EXPECT_EQ(failureNamed(name).code, -5) << name;
     }

@@ -153,7 +153,7 @@ struct Hands {
     HandLauncher launcher;
     Settings settings;
     UploadQueue queue{folder.file("queue.db")};
-    std::optional<Account> account{Account{"http://server", "+441", "token"}};
+    std::optional<Account> account{Account{"http://server", "+447700900100", "token"}};
     RequestContext context{queue,
                            http,
                            timers,
@@ -164,11 +164,12 @@ struct Hands {
                            [] { return 1.0; }};
 
     /** A queued request for one file of that content. */
-    QueuedRequest queued(const std::string &content, bool wifiOnly = false)
+    QueuedRequest queued(const std::string &content, bool wifiOnly = false,
+                         std::vector<Recipient> recipients = {{"44", "+447700900111", 7}})
     {
         QueuedFile file{folder.make("photo.jpg", content), {}};
         stampOf(file.path, file.stamp);
-        const int32_t id = queue.add({{file}, {{"44", "+442", 7}}, wifiOnly, {}, 1});
+        const int32_t id = queue.add({{file}, std::move(recipients), wifiOnly, {}, 1});
         return *queue.find(id);
     }
 };

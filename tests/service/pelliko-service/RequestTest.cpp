@@ -38,6 +38,28 @@ struct OneRequest : testing::Test {
     {
         hands.http.answer(204, "", {{"upload-offset", length}});
     }
+    /** Answers the question that comes before the finish. */
+    void sayWhoHasJoined(const std::string &numbers = "")
+    {
+        ASSERT_EQ(hands.http.oldest().url, "http://server/api/v1/joined");
+        hands.http.answer(200, R"({"joined":[)" + numbers + "]}");
+    }
+    void toTheQuestion(const std::vector<Recipient> &recipients)
+    {
+        begin(hands.queued("0123456789", false, recipients));
+        hands.http.answer(201, shareRecord);
+        upload("10");
+    }
+    std::vector<std::string> numbersIn(const char *member) const
+    {
+        const auto body = nlohmann::json::parse(hands.http.oldest().body);
+        std::vector<std::string> numbers;
+        for (const auto &entry : body.at(member)) {
+            numbers.push_back(entry.is_object() ? entry.at("number") : entry);
+        }
+        return numbers;
+    }
+    std::vector<Recipient> kept() { return hands.queue.find(request->record().id)->recipients; }
 };
 } // namespace
 
@@ -51,6 +73,7 @@ TEST_F(OneRequest, goesFromCreatingToTheEndInOrder)
     EXPECT_EQ(hands.http.oldest().url, "http://server/u/1");
     upload("10");
     hands.timers.pass(200);
+    sayWhoHasJoined();
     EXPECT_EQ(hands.http.oldest().url, "http://server/api/v1/shares/S/finish");
     hands.http.answer(200, finishedRecord);
     EXPECT_EQ(reports.back().status, Status::finished);
@@ -210,7 +233,119 @@ TEST_F(OneRequest, withoutRecipientsForAnSmsItEndsAfterFinishing)
     begin(hands.queued("0123456789"));
     hands.http.answer(201, shareRecord);
     upload("10");
+    sayWhoHasJoined();
     hands.http.answer(200, R"({"url":"http://s/T","expires":9000000,"sms":[]})");
     EXPECT_EQ(reports.back().status, Status::shareFinished);
     EXPECT_TRUE(hands.launcher.launches.empty());
+}
+
+TEST_F(OneRequest, aPersonWrittenInThreeWaysIsToldOnce)
+{
+    begin(hands.queued("0123456789", false,
+                       {{"44", "07700 900111", 1},
+                        {"", "+49 (0)151 12345678", 2},
+                        {"44", "00447700900111", 3},
+                        {"44", "+44 7700 900111", 4}}));
+    EXPECT_THAT(numbersIn("recipients"), ElementsAre("+447700900111", "+4915112345678"));
+    EXPECT_EQ(kept()[2].number, "00447700900111") << "what the client gave stays";
+    EXPECT_EQ(kept()[2].e164, "+447700900111");
+    hands.http.answer(201, shareRecord);
+    upload("10");
+    EXPECT_THAT(numbersIn("numbers"), ElementsAre("+447700900111", "+4915112345678"));
+    sayWhoHasJoined(R"("+447700900111")");
+    EXPECT_EQ(kept()[0].joined, Joined::yes);
+    EXPECT_EQ(kept()[1].joined, Joined::no);
+    EXPECT_EQ(kept()[2].joined, Joined::yes) << "they are one person";
+}
+
+TEST_F(OneRequest, withoutACountryCodeTheOwnNumberGivesTheCountry)
+{
+    begin(hands.queued("0123456789", false, {{"", "07700 900111", 1}}));
+    EXPECT_THAT(numbersIn("recipients"), ElementsAre("+447700900111"));
+}
+
+TEST_F(OneRequest, whoCannotBeReachedIsLeftOutAndTheOthersGetTheirs)
+{
+    begin(hands.queued("0123456789", false,
+                       {{"44", "999", 1}, {"44", "07700 900111", 2}, {"44", "Anna", 3}}));
+    EXPECT_THAT(numbersIn("recipients"), ElementsAre("+447700900111"));
+    EXPECT_EQ(kept()[0].fault, "too_short");
+    EXPECT_EQ(kept()[1].fault, "");
+    EXPECT_EQ(kept()[2].fault, "not_a_number");
+}
+
+TEST_F(OneRequest, withNobodyToReachItEndsWithoutAskingTheServer)
+{
+    begin(hands.queued("0123456789", false, {{"44", "999", 1}, {"44", "Anna", 2}}));
+    EXPECT_THAT(statuses(), ElementsAre(4));
+    EXPECT_EQ(reports.back().error, -5);
+    EXPECT_EQ(hands.http.count, 0U);
+    EXPECT_TRUE(hands.queue.withdrawals().empty());
+}
+
+TEST_F(OneRequest, aQuestionWithoutAnAnswerDoesNotStopTheShare)
+{
+    const std::vector<std::function<void()>> failures{
+        [this] { hands.http.answer(429, R"({"error":"numbers_limit","message":"x"})"); },
+        [this] { hands.http.answer(404, R"({"error":"not_found","message":"x"})"); },
+        [this] { hands.http.answer(200, "<html>"); },
+        [this] { hands.http.answer(200, R"({"joined":[1]})"); },
+        [this] { hands.http.refuseConnection(); },
+        [this] { hands.timers.pass(10'000); }};
+    for (const auto &fail : failures) {
+        toTheQuestion({{"44", "+447700900111", 7}});
+        fail();
+        ASSERT_FALSE(hands.http.open.empty());
+        EXPECT_EQ(hands.http.oldest().url, "http://server/api/v1/shares/S/finish");
+        EXPECT_EQ(hands.http.open.size(), 1U) << "nothing goes on beside it";
+        EXPECT_EQ(kept()[0].joined, Joined::unknown);
+        hands.http.answer(200, finishedRecord);
+        EXPECT_EQ(reports.back().status, Status::finished);
+        request.reset();
+    }
+}
+
+TEST_F(OneRequest, whatIsKnownIsNotAskedAgain)
+{
+    toTheQuestion({{"44", "+447700900111", 7}});
+    sayWhoHasJoined(R"("+447700900111")");
+    hands.http.refuseConnection();
+    const QueuedRequest record = *hands.queue.find(request->record().id);
+    request.reset();
+    begin(record, true);
+    hands.http.answer(
+        200, R"({"share":"S","state":"uploading","files":[{"upload":"/u/1","offset":10}]})");
+    EXPECT_EQ(hands.http.oldest().url, "http://server/api/v1/shares/S/finish");
+}
+
+TEST_F(OneRequest, aCancelDuringTheQuestionEndsBoth)
+{
+    toTheQuestion({{"44", "+447700900111", 7}});
+    request->cancel();
+    EXPECT_TRUE(hands.http.open.empty());
+    hands.timers.pass(20'000);
+    EXPECT_EQ(reports.back().status, Status::cancelled);
+    EXPECT_TRUE(hands.http.open.empty());
+}
+
+TEST_F(OneRequest, manyNumbersAreAskedInBatches)
+{
+    std::vector<std::string> numbers;
+    for (int i = 1000; i < 1250; ++i) {
+        numbers.push_back("+44770090" + std::to_string(i));
+    }
+    JoinedQuestion question(hands.http, hands.timers, *hands.account);
+    std::optional<JoinedFindings> findings;
+    question.ask(numbers, [&](const JoinedFindings &found) { findings = found; });
+    EXPECT_EQ(numbersIn("numbers").size(), 100U);
+    sayWhoHasJoined(R"("+447700901000")");
+    sayWhoHasJoined();
+    EXPECT_EQ(numbersIn("numbers").size(), 50U);
+    EXPECT_FALSE(findings);
+    hands.http.answer(429, R"({"error":"numbers_limit"})", {{"retry-after", "77"}});
+    ASSERT_TRUE(findings);
+    EXPECT_EQ(findings->asked.size(), 200U);
+    EXPECT_THAT(findings->joined, ElementsAre("+447700901000"));
+    EXPECT_TRUE(findings->refused);
+    EXPECT_EQ(findings->waitSeconds, 77);
 }

@@ -117,3 +117,44 @@ TEST_F(Queue, keysAreRandom)
 {
     EXPECT_NE(randomKey(), randomKey());
 }
+
+TEST_F(Queue, keepsWhatWasFoundOutBesideWhatTheClientSaid)
+{
+    const int32_t id = add();
+    auto recipients = queue->find(id)->recipients;
+    recipients[0].e164 = "+447700900111";
+    recipients[0].joined = Joined::yes;
+    recipients[1].fault = "too_short";
+    queue->setFindings(id, recipients);
+    reopen();
+    recipients = queue->find(id)->recipients;
+    EXPECT_EQ(recipients[0].number, "+441");
+    EXPECT_EQ(recipients[0].e164, "+447700900111");
+    EXPECT_EQ(recipients[0].joined, Joined::yes);
+    EXPECT_EQ(recipients[1].fault, "too_short");
+    EXPECT_EQ(recipients[1].joined, Joined::unknown);
+}
+
+TEST_F(Queue, aQueueOfTheFirstLayoutIsTakenOver)
+{
+    const int32_t id = add();
+    queue.reset();
+    sqlite3 *db = nullptr;
+    ASSERT_EQ(sqlite3_open(folder.file("queue.db").c_str(), &db), SQLITE_OK);
+    ASSERT_EQ(sqlite3_exec(db,
+                           "ALTER TABLE recipients DROP COLUMN e164;"
+                           "ALTER TABLE recipients DROP COLUMN fault;"
+                           "ALTER TABLE recipients DROP COLUMN joined;"
+                           "PRAGMA user_version = 1",
+                           nullptr, nullptr, nullptr),
+              SQLITE_OK);
+    sqlite3_close(db);
+    reopen();
+    const auto request = queue->find(id);
+    ASSERT_EQ(request->recipients.size(), 2U);
+    EXPECT_EQ(request->recipients[0].ccc, "44");
+    EXPECT_EQ(request->recipients[1].number, "+442");
+    EXPECT_EQ(request->recipients[1].e164, "");
+    EXPECT_EQ(request->recipients[1].joined, Joined::unknown);
+    EXPECT_GT(add(), id);
+}

@@ -217,3 +217,52 @@ TEST_F(UploadService, statusListsTheRequestsAsJson)
     EXPECT_EQ(list[0]["percent"], 100);
     EXPECT_EQ(list[0]["size"], 4321);
 }
+
+TEST_F(UploadService, tellsAPersonWrittenInThreeWaysOnceAndKnowsWhoHasJoined)
+{
+    startServer();
+    makeAccount();
+    outputOf({PELLIKO_BUILD_DIR "/bin/pelliko-server", "account", "add", "--data",
+              folder_ + "/server", "--number", "+447700900111"});
+    RecordingApplication application;
+    startService();
+    int32_t id = 0;
+    ASSERT_EQ(requestTo({{"44", "07700 900111"},
+                         {"", "0044 7700 900111"},
+                         {"1", "+44 7700 900111"},
+                         {"44", "12"},
+                         {"49", "0151 12345678"}},
+                        {makeFile("photo.jpg", 1000)}, &id),
+              0);
+    ASSERT_TRUE(waitForEnd(id));
+    EXPECT_EQ(reportsOf(id).back().status, 7);
+    ASSERT_EQ(application.launches.size(), 1U);
+    EXPECT_THAT(application.launches[0].lists.at("to_msisdn"),
+                ElementsAre("+447700900111", "+4915112345678"));
+    const auto list = nlohmann::json::parse(
+        outputOf({PELLIKO_BUILD_DIR "/bin/pelliko-service", "status", "--json"}));
+    const auto people = list[0]["recipients"];
+    ASSERT_EQ(people.size(), 5U);
+    EXPECT_EQ(people[0], (nlohmann::json{{"number", "07700 900111"},
+                                         {"e164", "+447700900111"},
+                                         {"fault", ""},
+                                         {"joined", "yes"}}));
+    EXPECT_EQ(people[2]["joined"], "yes");
+    EXPECT_EQ(people[3]["fault"], "too_short");
+    EXPECT_EQ(people[4]["joined"], "no");
+    EXPECT_NE(outputOf({PELLIKO_BUILD_DIR "/bin/pelliko-service", "status"})
+                  .find("12 gets nothing: it has too few digits"),
+              std::string::npos);
+}
+
+TEST_F(UploadService, withNobodyToReachItEndsWithADeviceError)
+{
+    startServer();
+    makeAccount();
+    startService();
+    int32_t id = 0;
+    ASSERT_EQ(requestTo({{"44", "12"}, {"44", "Anna"}}, {makeFile("photo.jpg", 1000)}, &id), 0);
+    ASSERT_TRUE(waitForEnd(id));
+    EXPECT_EQ(reportsOf(id).back().error, -5);
+    EXPECT_EQ(nlohmann::json::parse(askServer("GET", "/api/v1/shares"))["shares"].size(), 0U);
+}

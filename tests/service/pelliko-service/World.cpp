@@ -228,20 +228,31 @@ std::string World::makeFile(const std::string &name, int64_t size)
 
 int World::request(const std::vector<std::string> &files, int32_t *id, bool wifiOnly)
 {
-    char ccc[] = "44";
-    char first[] = "+447700900111";
-    char second[] = "+447700900222";
-    pelliko_recipient_s one{ccc, first, 11, 0};
-    pelliko_recipient_s two{nullptr, second, 22, 0};
-    pelliko_recipient_s *recipients[] = {&one, &two, nullptr};
+    return requestTo({{"44", "+447700900111"}, {"", "07700 900222"}}, files, id, wifiOnly);
+}
+
+int World::requestTo(const std::vector<std::pair<std::string, std::string>> &people,
+                     const std::vector<std::string> &files, int32_t *id, bool wifiOnly)
+{
+    std::vector<pelliko_recipient_s> records;
+    int32_t number = 11;
+    for (const auto &[ccc, written] : people) {
+        records.push_back({ccc.empty() ? nullptr : const_cast<char *>(ccc.c_str()),
+                           const_cast<char *>(written.c_str()), number++, 0});
+    }
+    std::vector<pelliko_recipient_s *> recipients;
+    for (pelliko_recipient_s &record : records) {
+        recipients.push_back(&record);
+    }
+    recipients.push_back(nullptr); // as after an allocation that failed
     std::vector<char *> paths;
     for (const std::string &file : files) {
         paths.push_back(const_cast<char *>(file.c_str()));
     }
     const pelliko_upload_options_s options{1, 0};
-    return pelliko_request_upload(&options, recipients, 3, paths.data(),
-                                  static_cast<int>(paths.size()), wifiOnly ? 1 : 0, onReport, this,
-                                  id);
+    return pelliko_request_upload(&options, recipients.data(), static_cast<int>(recipients.size()),
+                                  paths.data(), static_cast<int>(paths.size()), wifiOnly ? 1 : 0,
+                                  onReport, this, id);
 }
 
 int World::reshare(int32_t earlier, int32_t *id)

@@ -69,6 +69,9 @@ protected:
     std::string makeFile(const std::string &name, int64_t size);
     /** Asks for an upload to the two usual recipients. */
     int request(const std::vector<std::string> &files, int32_t *id, bool wifiOnly = false);
+    /** The same to others: sender's country code, empty for none, and number. */
+    int requestTo(const std::vector<std::pair<std::string, std::string>> &people,
+                  const std::vector<std::string> &files, int32_t *id, bool wifiOnly = false);
     int reshare(int32_t earlier, int32_t *id);
     int resume(int32_t id);
 
