@@ -1,6 +1,5 @@
 #include "AccountSim.h"
 
-#include <fstream>
 #include <glib.h>
 #include <nlohmann/json.hpp>
 
@@ -17,8 +16,12 @@ std::string accountFile()
 
 std::string accountImsi()
 {
-    std::ifstream file(accountFile(), std::ios::binary);
-    const auto account = nlohmann::json::parse(file, nullptr, false);
+    // Not by a stream: that throws where the account is a folder.
+    g_autofree char *text = nullptr;
+    gsize length = 0;
+    if (!g_file_get_contents(accountFile().c_str(), &text, &length, nullptr))
+        return {};
+    const auto account = nlohmann::json::parse(text, text + length, nullptr, false);
     if (!account.is_object())
         return {};
     const auto imsi = account.find("imsi");

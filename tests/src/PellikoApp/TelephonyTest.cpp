@@ -238,6 +238,13 @@ TEST_F(Telephony, MachineWithoutAModemHasNoHandles)
     EXPECT_THAT(log.messages(), ElementsAre("Dual-sim - Could not get the cp_name_list"));
 }
 
+TEST_F(Telephony, AccountThatCannotBeReadIsNoSim)
+{
+    fs::create_directories(korrin::defaultAccountFile());
+    startTelephony(ad);
+    EXPECT_THAT(log.messages(), ElementsAre("tapi_ready_state isn't yet ready !!"));
+}
+
 TEST_F(Telephony, MoreModemsThanTheRecordHoldsAreLeftOut)
 {
     insertSim("262011234567890");
