@@ -132,6 +132,18 @@ TEST_F(SignIn, SharerWithoutAnAccountIsAskedToSignIn)
     EXPECT_FALSE(windowIsShown());
 }
 
+// It would lie above the sign-in, and its Share button would take the new files.
+TEST_F(SignIn, PopupOfAnEarlierShareGoesWhenTheSignInComes)
+{
+    writeAccount("262010000000001");
+    share(0);
+    ASSERT_NE(ad->popup, nullptr);
+    EXPECT_EQ(korrin::removeAccount(korrin::defaultAccountFile()), "");
+    share();
+    EXPECT_EQ(ad->popup, nullptr);
+    EXPECT_FALSE(windowIsShown());
+}
+
 TEST_F(SignIn, AccountThatCannotBeReadCountsAsNone)
 {
     std::filesystem::create_directories(korrin::defaultAccountFile());
