@@ -258,9 +258,13 @@ TEST_F(SignIn, SharerWithAnAccountIsNotAsked)
 
 TEST_F(SignIn, AccountWhoseSimCannotBeNotedIsAnAccount)
 {
-    writeAccount("");
+    writeAccount(""); // the SIM is then found out, and to be noted
+    // What stands where the account's next version would be written.
+    const std::string draft = korrin::defaultAccountFile() + ".new";
+    std::filesystem::create_directories(draft + "/in the way");
     log.restart();
     EXPECT_EQ(isKorAccountExist(), 1);
+    std::filesystem::remove_all(draft);
     EXPECT_THAT(log.messages(),
                 ElementsAre(StartsWith("kor_set_imsi failed, -"), "enhanced feature registered"));
 }
