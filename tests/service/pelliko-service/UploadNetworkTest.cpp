@@ -19,10 +19,15 @@ class UploadNetwork : public World
 protected:
     void SetUp() override
     {
+        bus_ = g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr);
+        startManager();
+    }
+
+    void startManager()
+    {
         manager_ = std::make_unique<Process>(std::vector<std::string>{
             "/usr/bin/python3", "-m", "dbusmock", "--system", "--template", "networkmanager"});
         ASSERT_TRUE(waitForName(G_BUS_TYPE_SYSTEM, managerName, true));
-        bus_ = g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr);
         // 70 is "connected globally", 4 is "full"; the properties have to be there before the
         // service starts.
         mock("SetGlobalConnectionState", g_variant_new("(u)", 70U));
@@ -34,9 +39,14 @@ protected:
     void TearDown() override
     {
         service_->end(SIGTERM);
-        manager_.reset();
-        waitForName(G_BUS_TYPE_SYSTEM, managerName, false);
+        stopManager();
         g_object_unref(bus_);
+    }
+
+    void stopManager()
+    {
+        manager_.reset();
+        ASSERT_TRUE(waitForName(G_BUS_TYPE_SYSTEM, managerName, false));
     }
 
     void setMetered(unsigned value)
@@ -106,4 +116,49 @@ TEST_F(UploadNetwork, anyOtherShareUsesTheMeteredNetwork)
     ASSERT_EQ(request({makeFile("photo.jpg", 100'000)}, &id, false), 0);
     ASSERT_TRUE(waitForEnd(id));
     EXPECT_THAT(statusesOf(id), Not(Contains(6)));
+}
+
+TEST_F(UploadNetwork, changesInQuickSuccessionEndInTheLastState)
+{
+    startServer();
+    RecordingApplication application;
+    startProxy(3'000'000);
+    startService({"--chunk", "1000000"});
+    int32_t id = 0;
+    ASSERT_EQ(request({makeFile("film.mp4", 10'000'000)}, &id, true), 0);
+    ASSERT_TRUE(runUntil([&] { return proxy_->lines().back() == "stalled"; }));
+    for (int i = 0; i < 10; ++i) {
+        setMetered(metered);
+        setMetered(notMetered);
+    }
+    setMetered(metered);
+    ASSERT_TRUE(waitForStatus(id, 6));
+    proxy_->signal(SIGUSR1);
+    int32_t other = 0;
+    ASSERT_EQ(request({makeFile("photo.jpg", 100'000)}, &other, false), 0);
+    ASSERT_TRUE(waitForEnd(other));
+    EXPECT_EQ(reportsOf(id).back().status, 6) << "metered was the last word";
+    setMetered(notMetered);
+    ASSERT_TRUE(waitForEnd(id));
+    EXPECT_EQ(reportsOf(id).back().status, 7);
+}
+
+TEST_F(UploadNetwork, aNetworkManagerThatDiesAndComesBackIsFollowed)
+{
+    startServer();
+    makeAccount();
+    RecordingApplication application;
+    setMetered(metered);
+    startService();
+    int32_t id = 0;
+    ASSERT_EQ(request({makeFile("photo.jpg", 100'000)}, &id, true), 0);
+    ASSERT_TRUE(waitForStatus(id, 6));
+    stopManager();
+    int32_t other = 0;
+    ASSERT_EQ(request({makeFile("map.png", 1000)}, &other, false), 0);
+    ASSERT_TRUE(waitForEnd(other)) << "the service lives without it";
+    startManager();
+    setMetered(notMetered);
+    ASSERT_TRUE(waitForEnd(id));
+    EXPECT_EQ(reportsOf(id).back().status, 7);
 }
