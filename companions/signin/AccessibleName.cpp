@@ -1,0 +1,17 @@
+// The toolkit declares its accessible names only to those who accept that the interface may change.
+#define EFL_BETA_API_SUPPORT 1
+#define EFL_EO_API_SUPPORT 1
+
+#include "AccessibleName.h"
+
+#include <Elementary.h>
+
+namespace pelliko::signin
+{
+
+void setAccessibleName(Evas_Object *object, const char *name)
+{
+    efl_access_object_i18n_name_set(object, name);
+}
+
+} // namespace pelliko::signin

@@ -1,0 +1,49 @@
+// The page with the form.
+#pragma once
+
+#include "SignIn.h"
+#include "Widgets.h"
+
+#include <functional>
+#include <string>
+
+namespace pelliko::signin
+{
+
+/// Takes what the user types. While something is waited for only the cancel button works. Main loop
+/// only.
+class FormPage
+{
+public:
+    struct Wishes {
+        std::function<void(const Typed &)> submit;
+        std::function<void()> cancel;
+    };
+
+    FormPage(const Page &page, const Typed &proposal, Wishes wishes);
+    FormPage(const FormPage &) = delete;
+    FormPage &operator=(const FormPage &) = delete;
+
+    void showBusy();
+    /// Takes input again, with a sentence about what went wrong, at the field that it is about.
+    void showFailure(const std::string &failure, const std::string &sentence);
+
+private:
+    void submit();
+    void enable(bool enabled);
+    void focusFirst();
+    static void onSubmit(void *page, Evas_Object *, void *);
+    static void onCancel(void *page, Evas_Object *, void *);
+    static void onEnter(void *page, Evas_Object *entry, void *);
+
+    Wishes wishes_;
+    Field server_;
+    Field number_;
+    Field code_;
+    Evas_Object *message_;
+    Evas_Object *progress_;
+    Evas_Object *submit_;
+    bool busy_ = false;
+};
+
+} // namespace pelliko::signin

@@ -1,0 +1,7 @@
+#include "SignInApp.h"
+
+int main(int argc, char **argv)
+{
+    pelliko::signin::SignInApp app;
+    return app.start(argc, argv);
+}

@@ -1,0 +1,318 @@
+"""The sign-in as a person uses it: on a real display, launched over the bus, against a real server."""
+
+import json
+import os
+import socket
+import stat
+import subprocess
+import sys
+import unittest
+
+HERE = os.path.dirname(os.path.abspath(__file__))
+sys.path.insert(0, os.path.join(HERE, "..", "..", "..", "scripts", "lib"))
+sys.dont_write_bytecode = True
+
+import screen  # noqa: E402
+import tls_server  # noqa: E402
+import world  # noqa: E402
+
+APP = "com.velmora.korrin"
+OPERATION = "http://velmora.com/korrin/appcontrol/operation/auth"
+SERVER_DATA = os.path.join(os.environ["PELLIKO_STATE"], "server")
+ACCOUNT = os.path.join(os.environ["XDG_CONFIG_HOME"], "pelliko", "account.json")
+SEEN = os.path.join(os.environ["PELLIKO_BUILD"], "seen")
+PORT = 8080
+NUMBER = "+4915112345678"
+
+UNREACHABLE = "The server cannot be reached. Check its address and your connection."
+CERTIFICATE = ("The server's certificate is wrong, so it may not be the server that you mean. "
+               "Nothing was sent.")
+NO_SERVER = "Something answers at this address, but it is no share server."
+USED_UP = "This invitation code has been used up. Ask for a new one."
+UNKNOWN = "The server does not know this invitation code."
+TAKEN = ("This phone number has an account already. To use it on this phone, ask for a code that "
+         "renews it.")
+NO_NUMBER = ("This is not a valid phone number. Enter it with the country code, like "
+             "+44 7700 900123.")
+
+
+def account_command(*words):
+    return world.run("pelliko-server", "account", words[0], "--data", SERVER_DATA, *words[1:]).strip()
+
+
+class SignInCase(unittest.TestCase):
+    def setUp(self):
+        if os.path.exists(ACCOUNT):
+            os.remove(ACCOUNT)
+        screen.announce_reader()
+        self.launcher = None
+        self.application = world.BusName(APP)
+        self.addCleanup(self.leave)
+
+    def leave(self):
+        if self.application.owner:
+            os.kill(self.application.process_id(), 9)
+            self.application.wait_gone()
+        if self.launcher:
+            self.launcher.communicate()
+        subprocess.run(["pelliko-server", "account", "remove", "--data", SERVER_DATA, "--number", NUMBER],
+                       capture_output=True, check=False)
+
+    # --- steps ---
+
+    def launch(self):
+        self.launcher = subprocess.Popen(
+            ["app-launch", "--app", APP, "--operation", OPERATION, "--extra-array", "server=zorp", "--wait-reply"],
+            stdout=subprocess.PIPE, text=True)
+        screen.wait_for_control("Sign in", "button")
+        screen.wait_still()
+
+    def reply(self):
+        """What the launcher was answered: (result, extra data). Ends with the program."""
+        printed, _ = self.launcher.communicate(timeout=world.LIMIT)
+        self.launcher = None
+        self.application.wait_gone()
+        reply = json.loads(printed)
+        return reply["result"], reply["extras"]
+
+    def type_into(self, label, text):
+        extents = screen.wait_for_control(label, "entry")
+        world.run("xdotool", "mousemove", str(extents.x + extents.width // 2), str(extents.y + extents.height // 2),
+                  "click", "1")
+        screen.wait_still(0.2)
+        screen.key("ctrl+a")
+        screen.key("BackSpace")
+        if text:
+            world.run("xdotool", "type", "--delay", "5", text)
+        screen.wait_still(0.2)
+
+    def fill(self, server=f"http://127.0.0.1:{PORT}", number=NUMBER, code=""):
+        self.type_into("Share server", server)
+        self.type_into("Your phone number", number)
+        self.type_into("Invitation code", code)
+
+    def sign_in(self, **fields):
+        self.fill(**fields)
+        screen.key("Return")
+
+    def expect(self, sentence, picture=None):
+        screen.wait_for_control(sentence)
+        if picture:
+            self.picture(picture)
+
+    def picture(self, name):
+        os.makedirs(SEEN, exist_ok=True)
+        screen.wait_still()
+        screen.screenshot(os.path.join(SEEN, f"signin-{name}.png"))
+
+    def close(self):
+        screen.key("Escape")
+        return self.reply()
+
+    def account(self):
+        with open(ACCOUNT, encoding="utf-8") as file:
+            return json.load(file)
+
+    def tls(self, name="127.0.0.1"):
+        folder = os.path.join(os.environ["PELLIKO_STATE"], "files", self._testMethodName)
+        os.makedirs(folder, exist_ok=True)
+        certificate, key = tls_server.make_certificate(folder, name)
+        end = tls_server.TlsEnd(certificate, key, PORT)
+        self.addCleanup(end.close)
+        return end, certificate
+
+
+class SigningIn(SignInCase):
+    def test_the_launcher_is_told_who_signed_in(self):
+        self.launch()
+        self.picture("empty")
+        self.sign_in(number="+49 151 12345678", code=account_command("invite"))
+        result, extras = self.reply()
+        self.assertEqual(0, result)
+        self.assertEqual({"imsi", "accessToken", "duid", "pushToken", "msisdn"}, set(extras))
+        self.assertEqual(NUMBER, extras["msisdn"])
+        self.assertRegex(extras["imsi"], r"^262\d{12}$")
+        account = self.account()
+        self.assertEqual(stat.S_IMODE(os.stat(ACCOUNT).st_mode), 0o600)
+        self.assertEqual((account["server"], account["number"], account["imsi"]),
+                         (f"http://127.0.0.1:{PORT}", NUMBER, extras["imsi"]))
+        self.assertNotIn(account["token"], json.dumps(extras))
+        answer = world.run("curl", "-sS", "-H", f"Authorization: Bearer {account['token']}",
+                           f"http://127.0.0.1:{PORT}/api/v1/account")
+        self.assertEqual(NUMBER, json.loads(answer)["number"])
+
+    def test_over_tls_with_a_certificate_of_ones_own(self):
+        end, certificate = self.tls()
+        world.activation_environment(SSL_CERT_FILE=certificate)
+        self.addCleanup(world.activation_environment, SSL_CERT_FILE="")
+        self.launch()
+        self.sign_in(server=f"127.0.0.1:{end.port}/", code=account_command("invite"))
+        self.assertEqual(0, self.reply()[0])
+        self.assertEqual(self.account()["server"], f"https://127.0.0.1:{end.port}")
+
+    def test_who_has_an_account_sees_nothing(self):
+        world.run("pelliko-service", "account", "--server", "http://127.0.0.1:1", "--number", NUMBER,
+                  "--imsi", "262011234567890", input="secrettoken\n")
+        printed = world.run("app-launch", "--app", APP, "--operation", OPERATION, "--wait-reply")
+        reply = json.loads(printed)
+        self.assertEqual((0, "262011234567890"), (reply["result"], reply["extras"]["imsi"]))
+        self.assertNotIn("secrettoken", printed)
+
+
+class Failing(SignInCase):
+    def test_every_failure_says_what_it_is(self):
+        """One window lives through all of them: each leaves a form that works."""
+        with socket.create_server(("127.0.0.1", 0)) as free:
+            closed = free.getsockname()[1]
+        hotel = tls_server.WrongServer()
+        self.addCleanup(hotel.close)
+        untrusted, _ = self.tls()
+        code = account_command("invite")
+        used = account_command("invite")
+        self.launch()
+        steps = [
+            ("server_missing", dict(server="", code=code), "Enter the address of your share server."),
+            ("insecure", dict(server="http://share.example.org", code=code),
+             "The address has to begin with https://, so that nobody can read along."),
+            ("number", dict(number="0151 12345678", code=code), NO_NUMBER),
+            ("code_missing", dict(), "Enter the invitation code that you were given."),
+            ("unreachable", dict(server=f"http://127.0.0.1:{closed}", code=code), UNREACHABLE),
+            ("certificate", dict(server=f"https://127.0.0.1:{untrusted.port}", code=code), CERTIFICATE),
+            ("no-tls", dict(server=f"https://127.0.0.1:{PORT}", code=code), NO_SERVER),
+            ("hotel", dict(server=f"http://127.0.0.1:{hotel.port}", code=code), NO_SERVER),
+            ("unknown", dict(code="A" * 22), UNKNOWN),
+            ("taken", dict(number="+447700900100", code=code), TAKEN),
+        ]
+        for name, fields, sentence in steps:
+            with self.subTest(name):
+                self.sign_in(**fields)
+                self.expect(sentence, name)
+                self.assertFalse(os.path.exists(ACCOUNT))
+        body = json.dumps({"number": "+4915100000000", "code": used})
+        world.run("curl", "-sSf", "-H", "Idempotency-Key: other", "-d", body,
+                  f"http://127.0.0.1:{PORT}/api/v1/accounts")
+        self.sign_in(code=used)
+        self.expect(USED_UP, "used-up")
+        result, extras = self.close()
+        self.assertEqual((-1, {"errorCode": "code_used_up", "errorMessage": USED_UP}), (result, extras))
+        self.assertFalse(os.path.exists(ACCOUNT))
+        account_command("remove", "--number", "+4915100000000")
+
+    def test_a_certificate_for_another_host_is_wrong(self):
+        end, certificate = self.tls("other.example")
+        world.activation_environment(SSL_CERT_FILE=certificate)
+        self.addCleanup(world.activation_environment, SSL_CERT_FILE="")
+        self.launch()
+        self.sign_in(server=f"https://127.0.0.1:{end.port}", code="A" * 22)
+        self.expect(CERTIFICATE)
+        result, extras = self.close()
+        self.assertEqual((-1, "certificate"), (result, extras["errorCode"]))
+
+
+class Cancelling(SignInCase):
+    def test_escape_changes_nothing(self):
+        self.launch()
+        self.assertEqual((-2, {}), self.close())
+        self.assertFalse(os.path.exists(ACCOUNT))
+
+    def test_the_cancel_button_and_the_window_s_own(self):
+        self.launch()
+        screen.press("Cancel", "button")
+        self.assertEqual((-2, {}), self.reply())
+        self.launch()
+        screen.key("alt+F4")
+        self.assertEqual((-2, {}), self.reply())
+
+    def test_while_the_server_works_and_then_again(self):
+        """The server has made the account when the window is closed: the same code still works here."""
+        gate = tls_server.Gate(PORT)
+        self.addCleanup(gate.close)
+        self.addCleanup(gate.release)
+        code = account_command("invite")
+        self.launch()
+        self.sign_in(server=f"http://127.0.0.1:{gate.port}", code=code)
+        self.assertTrue(gate.asked.wait(world.LIMIT))
+        self.picture("working")
+        self.assertEqual((-2, {}), self.close())
+        self.assertFalse(os.path.exists(ACCOUNT))
+        self.launch()
+        self.sign_in(code=code)
+        self.assertEqual(0, self.reply()[0])
+        self.assertEqual(NUMBER, self.account()["number"])
+
+    def test_a_program_that_dies_leaves_the_former_account(self):
+        with open(ACCOUNT, "w", encoding="utf-8") as file:
+            file.write("{broken")
+        self.launch()
+        self.fill(code=account_command("invite"))
+        os.kill(self.application.process_id(), 9)
+        self.assertEqual(-2, self.reply()[0])
+        with open(ACCOUNT, encoding="utf-8") as file:
+            self.assertEqual("{broken", file.read())
+
+
+class ByItself(SignInCase):
+    def start(self):
+        self.program = subprocess.Popen(["korrin"])
+        self.addCleanup(self.stop)
+
+    def stop(self):
+        self.program.kill()
+        self.program.wait()
+        self.application.wait_gone()
+
+    def test_signs_in_shows_the_account_and_signs_out(self):
+        self.start()
+        screen.wait_for_control("Sign in", "button")
+        screen.wait_still()
+        self.sign_in(code=account_command("invite"))
+        screen.wait_for_control("You are signed in")
+        self.picture("done")
+        names = [name for name, _role, _extents, _enabled in screen.controls()]
+        self.assertIn(NUMBER, names)
+        self.assertIn(f"http://127.0.0.1:{PORT}", names)
+        screen.press("Sign out", "button")
+        self.expect("To sign in with this number again you will need a new code. Press once more to sign out.",
+                    "sign-out")
+        self.assertTrue(os.path.exists(ACCOUNT))
+        screen.press("Sign out", "button")
+        screen.wait_for_control("Sign in", "button")
+        self.assertFalse(os.path.exists(ACCOUNT))
+        screen.wait_still()
+        screen.key("Escape")
+        self.assertEqual(0, self.program.wait(world.LIMIT))
+
+    def test_the_keyboard_alone_is_enough(self):
+        self.start()
+        screen.wait_for_control("Sign in", "button")
+        screen.wait_still()
+        # The server is proposed, so the number has the focus.
+        world.run("xdotool", "type", "--delay", "5", NUMBER)
+        screen.key("Tab")
+        world.run("xdotool", "type", "--delay", "5", account_command("invite"))
+        screen.key("Tab")
+        screen.key("Tab")
+        screen.key("Return")
+        screen.wait_for_control("You are signed in")
+        screen.wait_still()
+        screen.key("Return")
+        self.assertEqual(0, self.program.wait(world.LIMIT))
+        self.assertEqual(NUMBER, self.account()["number"])
+
+    def test_speaks_german(self):
+        setter = os.path.join(os.environ["PELLIKO_BUILD"], "tests", "key-setter")
+        subprocess.run([setter, "--text", "db/menu_widget/language", "de_DE.UTF-8"], check=True)
+        self.addCleanup(subprocess.run, [setter, "--text", "db/menu_widget/language", "en_GB.UTF-8"], check=True)
+        self.start()
+        screen.wait_for_control("Anmelden", "button")
+        screen.wait_still()
+        self.picture("german")
+        names = [name for name, _role, _extents, _enabled in screen.controls()]
+        for text in ("Bei Pelliko anmelden", "Ihre Telefonnummer", "Einladungscode", "Abbrechen"):
+            self.assertIn(text, names)
+        screen.key("Escape")
+        self.assertEqual(0, self.program.wait(world.LIMIT))
+
+
+if __name__ == "__main__":
+    unittest.main(verbosity=2)
