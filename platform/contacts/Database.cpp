@@ -15,13 +15,12 @@ namespace pelliko::contacts
 namespace
 {
 
-constexpr int schema_version = 1;
+constexpr int schema_version = 2;
 constexpr int busy_timeout_ms = 5000;
 
 // A row of contacts in the service's book stands for one phone number of its person: number_id
 // names it, sync2 holds the service's letters. AUTOINCREMENT keeps an id from being given out
-// twice, since other programs remember number ids. number_trigrams finds a number by any part of
-// it.
+// twice, since other programs remember number ids.
 constexpr const char *schema = R"sql(
 CREATE TABLE address_books (
     id INTEGER PRIMARY KEY,
@@ -63,20 +62,41 @@ CREATE INDEX numbers_by_number ON numbers (number);
 CREATE INDEX numbers_by_folded ON numbers (folded);
 CREATE INDEX numbers_by_cleaned ON numbers (cleaned);
 CREATE INDEX numbers_by_normalized ON numbers (normalized);
-CREATE VIRTUAL TABLE number_trigrams USING fts5 (
-    folded, content = 'numbers', content_rowid = 'id', tokenize = 'trigram', columnsize = 0);
+)sql";
+
+// Finds a number by any part of it: every place of a number begins a row of the six characters from
+// there on, fewer at its end. A full-text index of three characters was tried; what it reads grows
+// with the store, as a thousand threes are shared by all numbers.
+constexpr const char *parts = R"sql(
+CREATE TABLE number_parts (
+    part TEXT NOT NULL,
+    number_id INTEGER NOT NULL,
+    PRIMARY KEY (part, number_id)) WITHOUT ROWID;
+CREATE INDEX number_parts_by_number ON number_parts (number_id);
+CREATE VIEW parts_of_numbers AS
+    SELECT substr(folded, place.key + 1, 6) AS part, numbers.id AS number_id
+    FROM numbers, json_each('[' || replace(hex(zeroblob(length(folded))), '00', '0,') || '0]') AS place
+    WHERE place.key < length(folded);
 CREATE TRIGGER number_added AFTER INSERT ON numbers BEGIN
-    INSERT INTO number_trigrams (rowid, folded) VALUES (new.id, new.folded);
+    INSERT OR IGNORE INTO number_parts
+    SELECT part, number_id FROM parts_of_numbers WHERE number_id = new.id;
 END;
 CREATE TRIGGER number_removed AFTER DELETE ON numbers BEGIN
-    INSERT INTO number_trigrams (number_trigrams, rowid, folded)
-    VALUES ('delete', old.id, old.folded);
+    DELETE FROM number_parts WHERE number_id = old.id;
 END;
 CREATE TRIGGER number_changed AFTER UPDATE OF folded ON numbers BEGIN
-    INSERT INTO number_trigrams (number_trigrams, rowid, folded)
-    VALUES ('delete', old.id, old.folded);
-    INSERT INTO number_trigrams (rowid, folded) VALUES (new.id, new.folded);
+    DELETE FROM number_parts WHERE number_id = old.id;
+    INSERT OR IGNORE INTO number_parts
+    SELECT part, number_id FROM parts_of_numbers WHERE number_id = new.id;
 END;
+)sql";
+
+// Version 1 had a full-text index in the place of the parts.
+constexpr const char *from_version_1 = R"sql(
+DROP TRIGGER number_added;
+DROP TRIGGER number_removed;
+DROP TRIGGER number_changed;
+DROP TABLE number_trigrams;
 )sql";
 
 void addBook(SQLite::Database &database, int id, const char *name, int mode)
@@ -109,6 +129,13 @@ void prepareTables(SQLite::Database &database)
         database.exec(schema);
         addBook(database, device_book, "Device", changeable);
         addBook(database, service_book, service_book_name, read_only);
+    }
+    if (version == 1)
+        database.exec(from_version_1);
+    if (version < schema_version) {
+        database.exec(parts);
+        database.exec(
+            "INSERT OR IGNORE INTO number_parts SELECT part, number_id FROM parts_of_numbers");
         database.exec("PRAGMA user_version = " + std::to_string(schema_version));
     }
     transaction.commit();

@@ -11,27 +11,28 @@ namespace pelliko::contacts
 namespace
 {
 
-// Shorter texts have no trigram; longer ones are looked up by their end, because beginnings
-// (country, network) are shared by very many numbers.
-constexpr size_t shortest_in_index = 3;
-constexpr size_t longest_in_index = 8;
+// As many characters as a row of number_parts has.
+constexpr size_t longest_part = 6;
 
+// The last character is counted up, so it must not be the last one there is.
 bool isIndexable(const std::string &folded)
 {
-    return folded.size() >= shortest_in_index &&
-           std::all_of(folded.begin(), folded.end(),
-                       [](char c) { return c >= ' ' && c <= '~' && c != '"'; });
+    return !folded.empty() &&
+           std::all_of(folded.begin(), folded.end(), [](char c) { return c >= ' ' && c <= '~'; });
 }
 
+// A text is looked up by its end, because beginnings (country, network) are shared by very many
+// numbers; a short one is the beginning of a part.
 SqlText contains(const Property &property, const std::string &folded)
 {
     const std::string test = "instr(" + std::string(property.folded) + ", ?) > 0";
     if (property.matching != Matching::NumberText || !isIndexable(folded))
         return {test, {folded}};
-    const std::string end =
-        folded.substr(folded.size() - std::min(folded.size(), longest_in_index));
-    return {"n.id IN (SELECT rowid FROM number_trigrams WHERE number_trigrams MATCH ?) AND " + test,
-            {'"' + end + '"', folded}};
+    const std::string first = folded.substr(folded.size() - std::min(folded.size(), longest_part));
+    std::string beyond = first;
+    ++beyond.back();
+    return {"n.id IN (SELECT number_id FROM number_parts WHERE part >= ? AND part < ?) AND " + test,
+            {first, beyond, folded}};
 }
 
 // instr and substr give % and _ of a match value no meaning, which LIKE would.

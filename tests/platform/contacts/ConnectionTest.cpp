@@ -110,12 +110,36 @@ TEST_F(ContactsConnection, AFileThatIsNoStoreFailsToConnect)
     EXPECT_EQ(read(), CONTACTS_ERROR_IPC);
 }
 
+TEST_F(ContactsConnection, AStoreOfTheFirstVersionKeepsItsPeople)
+{
+    const int id = add("Ann", {"+447700900123"}).front();
+    sql("DROP TRIGGER number_added; DROP TRIGGER number_removed; DROP TRIGGER number_changed;"
+        "DROP VIEW parts_of_numbers; DROP TABLE number_parts;"
+        "CREATE VIRTUAL TABLE number_trigrams USING fts5 (folded, content = 'numbers',"
+        "    content_rowid = 'id', tokenize = 'trigram', columnsize = 0);"
+        "CREATE TRIGGER number_added AFTER INSERT ON numbers BEGIN SELECT 1; END;"
+        "CREATE TRIGGER number_removed AFTER DELETE ON numbers BEGIN SELECT 1; END;"
+        "CREATE TRIGGER number_changed AFTER UPDATE ON numbers BEGIN SELECT 1; END;"
+        "PRAGMA user_version = 1;");
+    ASSERT_EQ(contacts_connect(), CONTACTS_ERROR_NONE);
+    const int other = add("Bob", {"+447700900124"}).front();
+    const auto found = [](const char *part) {
+        return integers(
+            query(_contacts_number._uri, textFilter(_contacts_number._uri, _contacts_number.number,
+                                                    CONTACTS_MATCH_CONTAINS, part)),
+            _contacts_number.id);
+    };
+    EXPECT_EQ(found("7700900123"), std::vector<int>{id});
+    EXPECT_EQ(found("900124"), std::vector<int>{other});
+    EXPECT_EQ(contacts_disconnect(), CONTACTS_ERROR_NONE);
+}
+
 TEST_F(ContactsConnection, AStoreOfANewerVersionIsRefusedUnchanged)
 {
     add("Ann", {"1"});
     sql("PRAGMA user_version = 1000");
     EXPECT_EQ(contacts_connect(), CONTACTS_ERROR_DB);
-    sql("PRAGMA user_version = 1");
+    sql("PRAGMA user_version = 2");
     EXPECT_EQ(contacts_connect(), CONTACTS_ERROR_NONE);
     EXPECT_EQ(contacts_disconnect(), CONTACTS_ERROR_NONE);
 }

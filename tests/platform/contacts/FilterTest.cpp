@@ -153,6 +153,22 @@ TEST_F(ContactsFilter, PartsThatLookLikeAFullTextQueryMeanThemselves)
     EXPECT_EQ(numbersBy(number, contains, "100 OR 800"), Ids{});
 }
 
+TEST_F(ContactsFilter, EveryPartOfANumberFindsIt)
+{
+    const std::string whole = "+447700900123";
+    const int id = add("A", {whole}).front();
+    add("B", {"5"});
+    for (size_t start = 0; start < whole.size(); ++start) {
+        for (size_t length = 1; length <= whole.size() - start; ++length) {
+            const std::string part = whole.substr(start, length);
+            EXPECT_EQ(numbersBy(_contacts_number.number, CONTACTS_MATCH_CONTAINS, part.c_str()),
+                      Ids{id})
+                << part;
+        }
+    }
+    EXPECT_EQ(numbersBy(_contacts_number.number, CONTACTS_MATCH_CONTAINS, "9001234"), Ids{});
+}
+
 TEST_F(ContactsFilter, AChangedOrRemovedNumberIsNoLongerFound)
 {
     ContactCard ann = card("Ann", "+44 7700 900123");
