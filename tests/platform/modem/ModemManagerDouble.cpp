@@ -1,7 +1,10 @@
 #include "ModemManagerDouble.h"
 
 #include <csignal>
+#include <optional>
 #include <stdexcept>
+
+#include <sys/wait.h>
 
 namespace modem_testing
 {
@@ -59,21 +62,35 @@ bool waitUntil(const std::function<bool()> &condition)
     return condition();
 }
 
+namespace
+{
+
+bool waitForName(GDBusConnection *bus, bool wanted)
+{
+    // Nothing is known until the bus has answered.
+    std::optional<bool> owned;
+    const auto appeared = [](GDBusConnection *, const gchar *, const gchar *, gpointer state) {
+        *static_cast<std::optional<bool> *>(state) = true;
+    };
+    const auto vanished = [](GDBusConnection *, const gchar *, gpointer state) {
+        *static_cast<std::optional<bool> *>(state) = false;
+    };
+    const guint watch = g_bus_watch_name_on_connection(bus, name, G_BUS_NAME_WATCHER_FLAGS_NONE,
+                                                       appeared, vanished, &owned, nullptr);
+    const bool came = waitUntil([&] { return owned == wanted; });
+    g_bus_unwatch_name(watch);
+    return came;
+}
+
+} // namespace
+
 ModemManagerDouble::ModemManagerDouble() : bus_(connectToBus()), process_(start())
 {
-    bool owned = false;
-    const auto appeared = [](GDBusConnection *, const gchar *, const gchar *, gpointer flag) {
-        *static_cast<bool *>(flag) = true;
-    };
-    const guint watch = g_bus_watch_name_on_connection(bus_, name, G_BUS_NAME_WATCHER_FLAGS_NONE,
-                                                       appeared, nullptr, &owned, nullptr);
-    const bool there = waitUntil([&] { return owned; });
-    g_bus_unwatch_name(watch);
+    if (!waitForName(bus_, true))
+        throw std::runtime_error("the double did not start");
     g_dbus_connection_signal_subscribe(bus_, name, "org.freedesktop.DBus.Mock", "MethodCalled",
                                        path, nullptr, G_DBUS_SIGNAL_FLAGS_NONE, onSignal, nullptr,
                                        nullptr);
-    if (!there)
-        throw std::runtime_error("the double did not start");
 }
 
 ModemManagerDouble::~ModemManagerDouble()
@@ -178,7 +195,11 @@ size_t ModemManagerDouble::stored(const std::string &modem)
 
 void ModemManagerDouble::freeze()
 {
+    // The signal is only on its way when it was sent; the kernel tells when the process stands.
+    const auto process = static_cast<id_t>(std::stoi(g_subprocess_get_identifier(process_)));
     g_subprocess_send_signal(process_, SIGSTOP);
+    siginfo_t stopped{};
+    waitid(P_PID, process, &stopped, WSTOPPED);
 }
 
 void ModemManagerDouble::wake()
@@ -190,6 +211,8 @@ void ModemManagerDouble::kill()
 {
     g_subprocess_force_exit(process_);
     g_subprocess_wait(process_, nullptr, nullptr);
+    // The bus hears of it a little later.
+    waitForName(bus_, false);
 }
 
 } // namespace modem_testing

@@ -25,7 +25,7 @@ class ModemManagerDouble
 public:
     // Returns when it owns its name.
     ModemManagerDouble();
-    // Returns when the process has ended.
+    // Returns when the process has ended and its name is free.
     ~ModemManagerDouble();
     ModemManagerDouble(const ModemManagerDouble &) = delete;
     ModemManagerDouble &operator=(const ModemManagerDouble &) = delete;

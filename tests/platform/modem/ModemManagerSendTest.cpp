@@ -128,9 +128,9 @@ TEST(ModemManagerSms, FailsInTimeWhenNoAnswerComes)
     service.addModem(1);
     service.setSending("silent");
     const auto start = std::chrono::steady_clock::now();
-    EXPECT_EQ(ModemManagerService(5s, 1s).sendSms(0, number, "Hello"),
+    EXPECT_EQ(ModemManagerService(5s, 4s).sendSms(0, number, "Hello"),
               "cannot send the message: the modem service did not answer in time");
-    EXPECT_LT(std::chrono::steady_clock::now() - start, 10s);
+    EXPECT_LT(std::chrono::steady_clock::now() - start, 30s);
     EXPECT_EQ(service.attempts().size(), 1U);
 }
 
