@@ -27,6 +27,15 @@ function(pelliko_library name)
   target_link_libraries(${name} PUBLIC ${arg_PUBLIC} PRIVATE pelliko_options ${arg_PRIVATE})
 endfunction()
 
+# pelliko_precompile(TARGET HEADERS...): headers of ready-made parts that most files of TARGET begin with are
+# parsed once. Only where the tests are built, again and again; the release build shows that each file still
+# includes what it uses, and its compile commands suit other compilers' tools.
+function(pelliko_precompile target)
+  if(PELLIKO_TESTS)
+    target_precompile_headers(${target} PRIVATE ${ARGN})
+  endif()
+endfunction()
+
 # pelliko_program(NAME SOURCES... [LIBS libs...]): a program that is installed and put into bin/ of the build.
 function(pelliko_program name)
   cmake_parse_arguments(arg "" "" "SOURCES;LIBS" ${ARGN})

@@ -6,19 +6,28 @@ set(pelliko_test_options ${PELLIKO_FEWER_CHECKS} -pthread)
 
 if(PELLIKO_TESTS)
   enable_testing()
+endif()
 
-  # What nearly every test file begins with, compiled once for all test programs. Only headers of ready-made
-  # parts belong here: a change of our own then never rebuilds it, and each file still includes what it uses.
-  set(pelliko_test_headers_source "${CMAKE_BINARY_DIR}/test-headers.cpp")
-  file(CONFIGURE OUTPUT "${pelliko_test_headers_source}" CONTENT "")
-  add_library(pelliko_test_headers OBJECT "${pelliko_test_headers_source}")
-  set_target_properties(pelliko_test_headers PROPERTIES POSITION_INDEPENDENT_CODE OFF)
-  target_compile_options(pelliko_test_headers PRIVATE -fPIE ${pelliko_test_options})
-  target_link_libraries(pelliko_test_headers PRIVATE pelliko_options GTest::gmock)
-  target_precompile_headers(pelliko_test_headers PRIVATE
-    <gmock/gmock.h> <gtest/gtest.h> <nlohmann/json.hpp>
+# pelliko_test_headers(NAME HEADERS... [LIBS libs...]): what many test files begin with, compiled once for all
+# their programs. Only headers of ready-made parts belong here: a change of our own then never rebuilds it,
+# and each file still includes what it uses. Headers that few use do not: what their inline functions need
+# of templates is made again in every file.
+function(pelliko_test_headers name)
+  cmake_parse_arguments(arg "" "" "LIBS" ${ARGN})
+  set(source "${CMAKE_BINARY_DIR}/${name}.cpp")
+  file(CONFIGURE OUTPUT "${source}" CONTENT "")
+  add_library(${name} OBJECT "${source}")
+  set_target_properties(${name} PROPERTIES POSITION_INDEPENDENT_CODE OFF)
+  target_compile_options(${name} PRIVATE -fPIE ${pelliko_test_options})
+  target_link_libraries(${name} PRIVATE pelliko_options GTest::gmock ${arg_LIBS})
+  target_precompile_headers(${name} PRIVATE ${arg_UNPARSED_ARGUMENTS}
+    <gmock/gmock.h> <gtest/gtest.h>
     <algorithm> <array> <chrono> <filesystem> <fstream> <functional> <map> <memory> <optional> <string>
     <string_view> <vector>)
+endfunction()
+
+if(PELLIKO_TESTS)
+  pelliko_test_headers(pelliko_test_headers)
 endif()
 
 # How a world is asked for: what scripts/session is to start beside the two buses.
@@ -29,15 +38,19 @@ set(pelliko_session_modem --no-display --no-server --modem ofono:262011234567890
 set(pelliko_session_phone --modem ofono)
 set(pelliko_session_full)
 
-# pelliko_test(NAME SOURCES... [LIBS libs...] [SESSION none|bus|display|server|modem|phone|full] [TIMEOUT seconds])
+# pelliko_test(NAME SOURCES... [LIBS libs...] [SESSION none|bus|display|server|modem|phone|full] [TIMEOUT seconds]
+#              [PRECOMPILED headers])
 # One GoogleTest program; NAME names the module under test.
 function(pelliko_test name)
-  cmake_parse_arguments(arg "" "SESSION;TIMEOUT" "SOURCES;LIBS" ${ARGN})
+  cmake_parse_arguments(arg "" "SESSION;TIMEOUT;PRECOMPILED" "SOURCES;LIBS" ${ARGN})
   add_executable(${name} ${arg_SOURCES})
   set_target_properties(${name} PROPERTIES RUNTIME_OUTPUT_DIRECTORY "${CMAKE_BINARY_DIR}/tests")
   target_link_libraries(${name} PRIVATE pelliko_options ${arg_LIBS} GTest::gmock GTest::gtest_main)
   target_compile_options(${name} PRIVATE ${pelliko_test_options})
-  target_precompile_headers(${name} REUSE_FROM pelliko_test_headers)
+  if(NOT arg_PRECOMPILED)
+    set(arg_PRECOMPILED pelliko_test_headers)
+  endif()
+  target_precompile_headers(${name} REUSE_FROM ${arg_PRECOMPILED})
   target_compile_definitions(${name} PRIVATE PELLIKO_SOURCE_DIR="${PROJECT_SOURCE_DIR}"
                                              PELLIKO_BUILD_DIR="${CMAKE_BINARY_DIR}")
   if(NOT arg_SESSION)
