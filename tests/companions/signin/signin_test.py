@@ -83,7 +83,7 @@ class SignInCase(unittest.TestCase):
         screen.key("ctrl+a")
         screen.key("BackSpace")
         if text:
-            world.run("xdotool", "type", "--delay", "5", text)
+            world.run("xdotool", "type", "--delay", "5", "--", text)
         screen.wait_still(0.2)
 
     def fill(self, server=f"http://127.0.0.1:{PORT}", number=NUMBER, code=""):
@@ -287,9 +287,9 @@ class ByItself(SignInCase):
         screen.wait_for_control("Sign in", "button")
         screen.wait_still()
         # The server is proposed, so the number has the focus.
-        world.run("xdotool", "type", "--delay", "5", NUMBER)
+        world.run("xdotool", "type", "--delay", "5", "--", NUMBER)
         screen.key("Tab")
-        world.run("xdotool", "type", "--delay", "5", account_command("invite"))
+        world.run("xdotool", "type", "--delay", "5", "--", account_command("invite"))
         screen.key("Tab")
         screen.key("Tab")
         screen.key("Return")
