@@ -167,6 +167,9 @@ std::unique_ptr<SQLite::Database> openDatabase(Access access)
     database->createFunction("fold", 1, true, nullptr, foldFunction);
     database->exec("PRAGMA journal_mode = WAL");
     database->exec("PRAGMA foreign_keys = ON");
+    // A large store stays as quick as a small one once it is warm; only pages that are used take
+    // room.
+    database->exec("PRAGMA cache_size = -65536");
     prepareTables(*database);
     database->exec(access == Access::Read ? "PRAGMA query_only = ON" : "PRAGMA synchronous = FULL");
     return database;

@@ -17,10 +17,22 @@ namespace
 template <typename T> using Owned = std::unique_ptr<T, void (*)(gpointer)>;
 
 // The library walks over texts by their letters and must not meet bytes that are none.
-Owned<char> validText(const std::string &text)
+class ValidText
 {
-    return {g_utf8_make_valid(text.data(), static_cast<gssize>(text.size())), g_free};
-}
+public:
+    explicit ValidText(const std::string &text) : m_text(text.c_str()), m_made(nullptr, g_free)
+    {
+        if (g_utf8_validate_len(text.data(), text.size(), nullptr))
+            return;
+        m_made.reset(g_utf8_make_valid(text.data(), static_cast<gssize>(text.size())));
+        m_text = m_made.get();
+    }
+    [[nodiscard]] const char *get() const { return m_text; }
+
+private:
+    const char *m_text; // of the caller's text, or made
+    Owned<char> m_made;
+};
 
 EVCardAttribute *append(EVCard *vcard, const char *name)
 {
@@ -32,7 +44,7 @@ EVCardAttribute *append(EVCard *vcard, const char *name)
 void appendText(EVCard *vcard, const char *name, const std::string &text)
 {
     if (!text.empty())
-        e_vcard_attribute_add_value(append(vcard, name), validText(text).get());
+        e_vcard_attribute_add_value(append(vcard, name), ValidText(text).get());
 }
 
 // The store knows the name as it is spoken. Taking it apart would be a guess that is wrong in many
@@ -42,10 +54,10 @@ void appendName(EVCard *vcard, const ContactCard &card)
     const std::string &name = card.display_name.empty() && !card.numbers.empty()
                                   ? card.numbers.front().number
                                   : card.display_name;
-    const Owned<char> text = validText(name);
+    const ValidText text(name);
     e_vcard_attribute_add_value(append(vcard, "FN"), text.get());
     EVCardAttribute *parts = append(vcard, "N");
-    for (const char *part : {"", const_cast<const char *>(text.get()), "", "", ""})
+    for (const char *part : {"", text.get(), "", "", ""})
         e_vcard_attribute_add_value(parts, part);
 }
 
@@ -68,8 +80,8 @@ void appendNumber(EVCard *vcard, const CardNumber &number)
             e_vcard_attribute_param_add_value(types, known.word);
     }
     if (!number.label.empty()) {
-        const Owned<char> label = validText("X-" + parameterText(number.label));
-        e_vcard_attribute_param_add_value(types, label.get());
+        const std::string label = "X-" + parameterText(number.label);
+        e_vcard_attribute_param_add_value(types, ValidText(label).get());
     }
     if (number.is_default)
         e_vcard_attribute_param_add_value(types, "PREF");
@@ -77,7 +89,7 @@ void appendNumber(EVCard *vcard, const CardNumber &number)
         e_vcard_attribute_add_param(attribute, types);
     else
         e_vcard_attribute_param_free(types);
-    e_vcard_attribute_add_value(attribute, validText(number.number).get());
+    e_vcard_attribute_add_value(attribute, ValidText(number.number).get());
 }
 
 const char *photoType(std::string_view bytes)
