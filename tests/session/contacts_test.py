@@ -84,8 +84,9 @@ class Contacts(share_case.ShareCase):
         self.assertEqual(["+49 1", "+49 2"], [tel.value for tel in cards[0].contents["tel"]])
 
     def test_a_contact_that_does_not_exist_shares_nothing(self):
+        log = world.Follower(world.APP_LOG)
         share_contacts(["99999"], [], "share")
-        world.wait_for(lambda: "_createVcf failed!" in self.log_lines(), "the log to say that it failed")
+        log.wait(lambda lines: any(line.endswith("_createVcf failed!") for line in lines), "the log to say that it failed")
         self.assertEqual([], self.posted())
         subprocess.run(["kill", str(self.application.process_id())], check=True)
         self.application.wait_gone()
