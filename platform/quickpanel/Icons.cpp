@@ -14,7 +14,8 @@ struct Rule {
 };
 
 // The first word that occurs in the picture's name decides.
-constexpr std::array<Rule, 6> pictures{{
+constexpr std::array<Rule, 7> pictures{{
+    {"caller_id", "avatar-default"},
     {"fail", "dialog-error"},
     {"error", "dialog-error"},
     {"upload_complete", "pelliko-upload-complete"},

@@ -2,12 +2,14 @@
 
 #include "AppLog/AppLog.h"
 #include "PellikoApp/ContactVcard.h"
+#include "PellikoApp/ServiceSwitch.h"
 #include "PellikoApp/ShareRequest.h"
 #include "PellikoApp/SmsSender.h"
 #include "PellikoApp/TextArray.h"
 #include "PellikoApp/Window.h"
 
 #include <cstring>
+#include <pelliko_operations.h>
 
 namespace pelliko
 {
@@ -133,6 +135,20 @@ Next _onContacts(const Launch &launch, PellikoAppData *ad)
     return Next::wait;
 }
 
+Next _onDeregistered(const Launch &, PellikoAppData *)
+{
+    LOG_DEBUG("Deregistered operation");
+    forgetAccount();
+    return Next::quit;
+}
+
+Next _onServiceOff(const Launch &, PellikoAppData *ad)
+{
+    LOG_DEBUG("Service OFF operation");
+    switchServiceOff(ad);
+    return Next::quit;
+}
+
 struct OperationRow {
     const char *operation;
     Next (*handle)(const Launch &launch, PellikoAppData *ad);
@@ -144,6 +160,8 @@ constexpr OperationRow operations[] = {
     {APP_CONTROL_OPERATION_MULTI_SHARE, _onMultiShare},
     {APP_CONTROL_OPERATION_SEND_TEXT, _onSendText},
     {APP_CONTROL_OPERATION_DEFAULT, _onDefault},
+    {APP_CONTROL_OPERATION_DEREGISTERED, _onDeregistered},
+    {APP_CONTROL_OPERATION_SERVICE_OFF, _onServiceOff},
 };
 
 } // namespace

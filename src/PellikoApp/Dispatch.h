@@ -21,7 +21,8 @@ struct Launch {
 enum class Next {
     run,   ///< the operation is to be done
     leave, ///< the request could not be understood
-    wait   ///< a worker is at it, and the operation follows it
+    wait,  ///< a worker is at it, and the operation follows it
+    quit   ///< the application is ending: there is nothing more to do
 };
 
 /// Reads the request into the record as its operation asks; the operation itself is not done here.

@@ -3,6 +3,7 @@
 #include "AppLog/AppLog.h"
 #include "PellikoApp/Decimal.h"
 
+#include <cstdio>
 #include <cstring>
 #include <glib.h>
 #include <memory>
@@ -221,6 +222,14 @@ void deleteUploadDataFromDb(int32_t request_id)
         LOG_DEBUG("Records deleted successfully...");
     else
         _logExecutionError(result.text(), result.code);
+}
+
+void deleteUploadInfoDb()
+{
+    if (remove(databasePath) == 0)
+        LOG_DEBUG("Database file deleted successfully...!!!");
+    else
+        LOG_ERROR("Database deletion failed...!!!");
 }
 
 } // namespace pelliko

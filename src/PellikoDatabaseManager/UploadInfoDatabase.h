@@ -22,4 +22,8 @@ bool readUploadDataFromDb();
 /// Deletes the row of that request id; a missing row is no error.
 void deleteUploadDataFromDb(int32_t request_id);
 
+/// Removes the file with all rows. Nothing else of this process may follow: what is written later
+/// is lost with the file, whose handle stays open.
+void deleteUploadInfoDb();
+
 } // namespace pelliko

@@ -26,6 +26,7 @@ TEST(Icons, AHandsetsPicturesBecomeThemedIcons)
         {"/usr/apps/x/noti_download_complete.png", "document-save"},
         // The folder's name says nothing about the picture.
         {"/usr/apps/upload/other.png", "dialog-information"},
+        {"reserved:default_caller_id", "avatar-default"},
         {"reserved://quickpanel/ani/uploading", "pelliko-upload"},
         {"reserved://indicator/ani/uploading", "pelliko-upload"},
     };

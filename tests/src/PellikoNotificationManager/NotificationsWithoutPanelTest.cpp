@@ -1,10 +1,15 @@
+#include "PellikoNotificationManager/NotificationBackup.h"
 #include "PellikoNotificationManager/NotificationPrimitives.h"
+#include "PellikoNotificationManager/ReceivedShareNotifications.h"
+#include "PellikoNotificationManager/SenderNames.h"
 #include "PellikoNotificationManager/UploadNotifications.h"
 #include "platform/quickpanel/support/Bus.h"
 #include "support/AppWorld.h"
 
+#include <app_preference.h>
 #include <cstdlib>
 #include <filesystem>
+#include <glib.h>
 #include <gmock/gmock.h>
 
 namespace pelliko::test
@@ -123,6 +128,29 @@ TEST_F(NotificationsWithoutPanel, TheOtherStatesOnlyLogTheirFailure)
     EXPECT_THAT(lastLine(), MatchesRegex("_notificationInsert failed \\[-[0-9]+\\]"));
     EXPECT_EQ(ad->is_resume_by_reboot, 1) << "the ticker was not posted";
     EXPECT_EQ(ad->has_upload_resume, 1);
+}
+
+TEST_F(NotificationsWithoutPanel, SendersOfSharesThatCouldNotBeAnnouncedAreKept)
+{
+    ad->sender_name = g_strdup("Ann");
+    addSenderName("Ann");
+    ad->token_length = 2;
+    takePanelAway();
+    EXPECT_EQ(addPushNotification(ad), -1);
+    ad->token_length = 0;
+    EXPECT_STREQ(g_sender_info[0], "Ann");
+    EXPECT_THAT(lastLine(), MatchesRegex("notification_post fail, noti_err = -[0-9]+"));
+}
+
+TEST_F(NotificationsWithoutPanel, SwitchingTheServiceOffKeepsNoTokens)
+{
+    preference_set_int(shareNotiBackupedKey, 2);
+    preference_set_string(shareNotiTokensKey, "T1|T2");
+    takePanelAway();
+    backupNotiInfo(ad);
+    int count = -1;
+    EXPECT_EQ(preference_get_int(shareNotiBackupedKey, &count), PREFERENCE_ERROR_NONE);
+    EXPECT_EQ(count, 0);
 }
 
 } // namespace

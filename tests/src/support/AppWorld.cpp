@@ -1,6 +1,8 @@
 #include "support/AppWorld.h"
 
 #include "PellikoDatabaseManager/UploadInfoDatabase.h"
+#include "PellikoNotificationManager/NotificationBackup.h"
+#include "PellikoNotificationManager/SenderNames.h"
 #include "PellikoUploadDataManager/RecipientTexts.h"
 #include "PellikoUploadDataManager/Recipients.h"
 #include "PellikoUploadManager/UsagePreferences.h"
@@ -60,7 +62,8 @@ void _readLaunchRequest(notification_h notification, Posted &result)
     if (app_control_get_operation(request, &text) == APP_CONTROL_ERROR_NONE)
         result.operation = _takeText(text);
     for (const char *key : {"recipient_count", "recipient_index_list", "recipient_list",
-                            "total_files", "upload_status", "upload_request_id", "total_size"}) {
+                            "total_files", "upload_status", "upload_request_id", "total_size",
+                            "contents_token", "share_type", "view_type", "remoteShare"}) {
         text = nullptr;
         if (app_control_get_extra_data(request, key, &text) == APP_CONTROL_ERROR_NONE)
             result.extras[key] = _takeText(text);
@@ -92,6 +95,21 @@ int _rowCb(void *data, int, char **values, char **)
     return 0;
 }
 
+void _resetPush(PellikoAppData *ad)
+{
+    replaceContentsTokens(ad, nullptr, 0);
+    ad->sender_name_fallback = nullptr;
+    ad->thumbnails_count = 0;
+    for (char **text : {&ad->sender_msisdn, &ad->sender_name, &ad->sender_image_path}) {
+        g_free(*text);
+        *text = nullptr;
+    }
+    for (char *&slot : g_sender_info) {
+        g_free(slot);
+        slot = nullptr;
+    }
+}
+
 // The record lives as long as the process: what a test may have set is set back.
 void _resetRecord(PellikoAppData *ad)
 {
@@ -117,6 +135,7 @@ void _resetRecord(PellikoAppData *ad)
     g_cancel_in_progress = 0;
     g_noti_press_data = {};
     setRecipientTexts(nullptr, nullptr);
+    _resetPush(ad);
 }
 
 } // namespace
