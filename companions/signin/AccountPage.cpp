@@ -1,11 +1,14 @@
 #include "AccountPage.h"
 
-#include "Texts.h"
+#include "Language.h"
 
 #include <utility>
 
 namespace pelliko::signin
 {
+
+using namespace companion;
+
 namespace
 {
 

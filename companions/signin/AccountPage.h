@@ -19,7 +19,7 @@ public:
         std::function<void()> close;
     };
 
-    AccountPage(const Page &page, const korrin::Account &account, Wishes wishes);
+    AccountPage(const companion::Page &page, const korrin::Account &account, Wishes wishes);
     AccountPage(const AccountPage &) = delete;
     AccountPage &operator=(const AccountPage &) = delete;
 

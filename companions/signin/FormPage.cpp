@@ -1,11 +1,13 @@
 #include "FormPage.h"
 
-#include "Texts.h"
+#include "Language.h"
 
 #include <utility>
 
 namespace pelliko::signin
 {
+
+using namespace companion;
 
 FormPage::FormPage(const Page &page, const Typed &proposal, Wishes wishes)
     : wishes_(std::move(wishes))
@@ -20,7 +22,7 @@ FormPage::FormPage(const Page &page, const Typed &proposal, Wishes wishes)
                        ELM_INPUT_PANEL_LAYOUT_PHONENUMBER);
     code_ = addField(page.column, mark("Invitation code"), "", ELM_INPUT_PANEL_LAYOUT_NORMAL);
     message_ = addText(page.column, "error", "");
-    progress_ = addProgress(page.column);
+    progress_ = addProgress(page.column, translated(mark("Please wait")));
     Evas_Object *row = addRow(page.column);
     addButton(row, "popup", mark("Cancel"), onCancel, this);
     submit_ = addButton(row, "popup/primary", mark("Sign in"), onSubmit, this);

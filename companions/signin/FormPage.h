@@ -1,6 +1,7 @@
 // The page with the form.
 #pragma once
 
+#include "Field.h"
 #include "SignIn.h"
 #include "Widgets.h"
 
@@ -20,7 +21,7 @@ public:
         std::function<void()> cancel;
     };
 
-    FormPage(const Page &page, const Typed &proposal, Wishes wishes);
+    FormPage(const companion::Page &page, const Typed &proposal, Wishes wishes);
     FormPage(const FormPage &) = delete;
     FormPage &operator=(const FormPage &) = delete;
 
@@ -37,9 +38,9 @@ private:
     static void onEnter(void *page, Evas_Object *entry, void *);
 
     Wishes wishes_;
-    Field server_;
-    Field number_;
-    Field code_;
+    companion::Field server_;
+    companion::Field number_;
+    companion::Field code_;
     Evas_Object *message_;
     Evas_Object *progress_;
     Evas_Object *submit_;

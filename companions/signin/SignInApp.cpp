@@ -1,6 +1,8 @@
 #include "SignInApp.h"
 
+#include "Language.h"
 #include "Texts.h"
+#include "Theme.h"
 
 #include <app.h>
 #include <dlog.h>
@@ -11,6 +13,9 @@
 
 namespace pelliko::signin
 {
+
+using namespace companion;
+
 namespace
 {
 
@@ -47,7 +52,7 @@ int SignInApp::onStart(int argc, char **argv)
 
 bool SignInApp::onCreate()
 {
-    useLanguage();
+    useLanguage("korrin");
     useTheme();
     return true;
 }
@@ -81,7 +86,7 @@ void SignInApp::show()
 
 void SignInApp::newPage()
 {
-    page_ = addPage();
+    page_ = addPage("korrin", mark("Pelliko account"));
     evas_object_smart_callback_add(page_.window, "delete,request", onWindowClosed, this);
     eext_object_event_callback_add(page_.column, EEXT_CALLBACK_BACK, onBack, this);
 }

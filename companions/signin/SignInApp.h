@@ -42,7 +42,7 @@ private:
     LaunchReplies replies_;
     /// What went wrong last, for those who launched this and are left without an account.
     std::optional<Failure> failure_;
-    Page page_;
+    companion::Page page_;
     std::unique_ptr<FormPage> form_;
     std::unique_ptr<AccountPage> account_;
 };

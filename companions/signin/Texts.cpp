@@ -1,25 +1,17 @@
 #include "Texts.h"
 
-#include <Elementary.h>
-#include <app.h>
-#include <app_common.h>
-#include <vconf-keys.h>
-#include <vconf.h>
+#include "Language.h"
 
 #include <algorithm>
 #include <array>
-#include <clocale>
-#include <cstdlib>
-#include <cstring>
-#include <libintl.h>
-#include <memory>
 
 namespace pelliko::signin
 {
 namespace
 {
 
-using CText = std::unique_ptr<char, decltype(&free)>;
+using companion::mark;
+using companion::translated;
 
 struct Sentence {
     const char *failure;
@@ -55,43 +47,7 @@ constexpr std::array sentences{
     Sentence{"internal", mark("The server failed. Try again later.")},
 };
 
-// Message catalogues are looked up by LANGUAGE as soon as the locale is any but "C".
-void applyLanguage()
-{
-    const CText language(vconf_get_str(VCONFKEY_LANGSET), free);
-    if (language) {
-        setenv("LANG", language.get(), 1);
-        setenv("LANGUAGE", (std::string(language.get()) + ":en").c_str(), 1);
-    }
-    const char *locale = setlocale(LC_ALL, "");
-    if (!locale || std::strcmp(setlocale(LC_MESSAGES, nullptr), "C") == 0)
-        setlocale(LC_ALL, "C.UTF-8");
-    elm_language_set(language ? language.get() : "");
-}
-
-void onLanguage(app_event_info_h, void *)
-{
-    applyLanguage();
-}
-
 } // namespace
-
-void useLanguage()
-{
-    const CText resources(app_get_resource_path(), free);
-    const std::string folder = std::string(resources ? resources.get() : "") + "locale";
-    bindtextdomain(textDomain, folder.c_str());
-    bind_textdomain_codeset(textDomain, "UTF-8");
-    textdomain(textDomain);
-    applyLanguage();
-    app_event_handler_h handler = nullptr;
-    ui_app_add_event_handler(&handler, APP_EVENT_LANGUAGE_CHANGED, onLanguage, nullptr);
-}
-
-const char *translated(const char *text)
-{
-    return dgettext(textDomain, text);
-}
 
 std::string failureText(const std::string &failure, long long retryAfterSeconds)
 {

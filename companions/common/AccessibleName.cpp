@@ -6,7 +6,7 @@
 
 #include <Elementary.h>
 
-namespace pelliko::signin
+namespace pelliko::companion
 {
 
 void setAccessibleName(Evas_Object *object, const char *name)
@@ -14,4 +14,4 @@ void setAccessibleName(Evas_Object *object, const char *name)
     efl_access_object_i18n_name_set(object, name);
 }
 
-} // namespace pelliko::signin
+} // namespace pelliko::companion

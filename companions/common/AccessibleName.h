@@ -3,10 +3,10 @@
 
 #include <Evas.h>
 
-namespace pelliko::signin
+namespace pelliko::companion
 {
 
 /// Replaces the text that they would find in the control.
 void setAccessibleName(Evas_Object *object, const char *name);
 
-} // namespace pelliko::signin
+} // namespace pelliko::companion

@@ -1,0 +1,51 @@
+#include "ListRow.h"
+
+#include "AccessibleName.h"
+#include "Widgets.h"
+
+namespace pelliko::companion
+{
+namespace
+{
+
+void addIcon(Evas_Object *row, const char *name)
+{
+    Evas_Object *icon = elm_icon_add(row);
+    if (!elm_icon_standard_set(icon, name))
+        elm_icon_standard_set(icon, "text-x-generic");
+    elm_object_part_content_set(row, "icon", icon);
+}
+
+} // namespace
+
+bool operator==(const RowTexts &a, const RowTexts &b)
+{
+    return a.title == b.title && a.second == b.second && a.third == b.third;
+}
+
+Evas_Object *addListRow(Evas_Object *box, const RowTexts &texts, const char *icon,
+                        Evas_Smart_Cb pressed, void *data)
+{
+    Evas_Object *row = elm_button_add(box);
+    elm_object_style_set(row, texts.third.empty() ? "companion/row" : "companion/row/three");
+    if (icon)
+        addIcon(row, icon);
+    setRowTexts(row, texts);
+    evas_object_smart_callback_add(row, "clicked", pressed, data);
+    append(box, row);
+    return row;
+}
+
+void setRowTexts(Evas_Object *row, const RowTexts &texts)
+{
+    elm_object_part_text_set(row, nullptr, texts.title.c_str());
+    elm_object_part_text_set(row, "companion.second", texts.second.c_str());
+    if (!texts.third.empty())
+        elm_object_part_text_set(row, "companion.third", texts.third.c_str());
+    std::string name = texts.title + ", " + texts.second;
+    if (!texts.third.empty())
+        name += ", " + texts.third;
+    setAccessibleName(row, name.c_str());
+}
+
+} // namespace pelliko::companion
