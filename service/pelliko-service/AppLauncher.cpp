@@ -12,6 +12,7 @@ constexpr const char *applicationPath = "/com/velmora/pelliko";
 constexpr const char *launchInterface = "com.velmora.Platform.Application1";
 constexpr const char *leavingError = "com.velmora.Platform.Error.Leaving";
 constexpr const char *operationDefault = "http://tizen.org/appcontrol/operation/default";
+constexpr const char *operationSend = "http://tizen.org/appcontrol/operation/send";
 constexpr const char *operationSendText = "http://tizen.org/appcontrol/operation/send_text";
 
 // Owns the reply or the error of one launch while it is looked at.
@@ -76,6 +77,18 @@ bool surelyNotSent(const GError *error)
            g_error_matches(error, G_DBUS_ERROR, G_DBUS_ERROR_UNKNOWN_INTERFACE);
 }
 
+Answered receiptFor(std::function<void(LaunchResult)> done)
+{
+    return [done = std::move(done)](GVariant *reply, const GError *error) {
+        if (reply) {
+            done(LaunchResult::received);
+            return;
+        }
+        g_message("the application did not confirm: %s", error->message);
+        done(surelyNotSent(error) ? LaunchResult::notSent : LaunchResult::unknown);
+    };
+}
+
 bool saysResumed(GVariant *reply)
 {
     gint result = -1;
@@ -123,14 +136,16 @@ void AppLauncher::launchSms(const SmsLaunch &data, std::function<void(LaunchResu
     addText(extras, "file_count", std::to_string(data.fileCount));
     addTexts(extras, "to_msisdn", data.numbers);
     launch(bus_, operationSendText, g_variant_builder_end(&extras), false,
-           [done = std::move(done)](GVariant *reply, const GError *error) {
-               if (reply) {
-                   done(LaunchResult::received);
-                   return;
-               }
-               g_message("the application did not confirm: %s", error->message);
-               done(surelyNotSent(error) ? LaunchResult::notSent : LaunchResult::unknown);
-           });
+           receiptFor(std::move(done)));
+}
+
+void AppLauncher::launchPush(const std::vector<std::string> &tokens,
+                             std::function<void(LaunchResult)> done)
+{
+    GVariantBuilder extras;
+    g_variant_builder_init(&extras, G_VARIANT_TYPE_VARDICT);
+    addTexts(extras, "contents_token_list", tokens);
+    launch(bus_, operationSend, g_variant_builder_end(&extras), false, receiptFor(std::move(done)));
 }
 
 void AppLauncher::launchResume(const std::vector<int32_t> &ids, std::function<void(bool)> done)

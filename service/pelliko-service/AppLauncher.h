@@ -18,6 +18,8 @@ public:
     AppLauncher &operator=(const AppLauncher &) = delete;
 
     void launchSms(const SmsLaunch &launch, std::function<void(LaunchResult)> done) override;
+    void launchPush(const std::vector<std::string> &tokens,
+                    std::function<void(LaunchResult)> done) override;
     void launchResume(const std::vector<int32_t> &ids, std::function<void(bool)> done) override;
 
 private:

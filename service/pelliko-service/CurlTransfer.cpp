@@ -60,6 +60,9 @@ CurlTransfer::CurlTransfer(uint64_t number, HttpRequest request, Progress progre
 {
     setOptions();
     setBody();
+    if (request_.sink && !request_.endless) {
+        setProgress();
+    }
     curl_easy_setopt(easy_, CURLOPT_HTTPHEADER, headers_);
 }
 
@@ -78,8 +81,10 @@ void CurlTransfer::setOptions()
     curl_easy_setopt(easy_, CURLOPT_NOSIGNAL, 1L);
     curl_easy_setopt(easy_, CURLOPT_USERAGENT, "pelliko-service");
     curl_easy_setopt(easy_, CURLOPT_CONNECTTIMEOUT, connectSeconds);
-    curl_easy_setopt(easy_, CURLOPT_LOW_SPEED_LIMIT, 1L);
-    curl_easy_setopt(easy_, CURLOPT_LOW_SPEED_TIME, stallSeconds);
+    if (!request_.endless) {
+        curl_easy_setopt(easy_, CURLOPT_LOW_SPEED_LIMIT, 1L);
+        curl_easy_setopt(easy_, CURLOPT_LOW_SPEED_TIME, stallSeconds);
+    }
     curl_easy_setopt(easy_, CURLOPT_WRITEFUNCTION, onWrite);
     curl_easy_setopt(easy_, CURLOPT_WRITEDATA, this);
     curl_easy_setopt(easy_, CURLOPT_HEADERFUNCTION, onHeader);
@@ -108,9 +113,7 @@ void CurlTransfer::setBody()
         curl_easy_setopt(easy_, CURLOPT_READDATA, this);
         curl_easy_setopt(easy_, CURLOPT_SEEKFUNCTION, onSeek);
         curl_easy_setopt(easy_, CURLOPT_SEEKDATA, this);
-        curl_easy_setopt(easy_, CURLOPT_XFERINFOFUNCTION, onProgress);
-        curl_easy_setopt(easy_, CURLOPT_XFERINFODATA, this);
-        curl_easy_setopt(easy_, CURLOPT_NOPROGRESS, 0L);
+        setProgress();
     } else if (request_.method == "HEAD") {
         curl_easy_setopt(easy_, CURLOPT_NOBODY, 1L);
     } else if (request_.method == "POST") {
@@ -122,11 +125,48 @@ void CurlTransfer::setBody()
     curl_easy_setopt(easy_, CURLOPT_CUSTOMREQUEST, request_.method.c_str());
 }
 
+void CurlTransfer::setProgress()
+{
+    curl_easy_setopt(easy_, CURLOPT_XFERINFOFUNCTION, onProgress);
+    curl_easy_setopt(easy_, CURLOPT_XFERINFODATA, this);
+    curl_easy_setopt(easy_, CURLOPT_NOPROGRESS, 0L);
+}
+
+bool CurlTransfer::goodAnswer() const
+{
+    long status = 0;
+    curl_easy_getinfo(easy_, CURLINFO_RESPONSE_CODE, &status);
+    return status >= 200 && status < 300;
+}
+
+bool CurlTransfer::takesPiece(std::string_view piece)
+{
+    BodySink &sink = *request_.sink;
+    long status = 0;
+    curl_easy_getinfo(easy_, CURLINFO_RESPONSE_CODE, &status);
+    const bool taken = (std::exchange(sinkBegun_, true) || sink.begin(status)) && sink.take(piece);
+    if (!taken) {
+        localFailure_ = sink.fault();
+    }
+    return taken;
+}
+
+// An empty body brings no piece.
+void CurlTransfer::endSink()
+{
+    if (takesPiece({}) && !request_.sink->end()) {
+        localFailure_ = request_.sink->fault();
+    }
+}
+
 HttpAnswer CurlTransfer::answer(CURLcode result)
 {
     curl_easy_getinfo(easy_, CURLINFO_RESPONSE_CODE, &answer_.status);
-    if (!readFailure_.empty()) {
-        answer_.failure = readFailure_;
+    if (request_.sink && result == CURLE_OK && goodAnswer()) {
+        endSink();
+    }
+    if (!localFailure_.empty()) {
+        answer_.failure = localFailure_;
     } else if (result != CURLE_OK && answer_.status < 400) {
         // A refusal that came before the whole body was sent is an answer all the same.
         answer_.failure = failureName(result);
@@ -142,7 +182,7 @@ size_t CurlTransfer::onRead(char *buffer, size_t size, size_t count, void *self)
     const int64_t wanted = std::min(room, range.length - transfer.position_);
     const int64_t got = range.file->read(buffer, wanted, range.offset + transfer.position_);
     if (got < 0 || (got == 0 && wanted > 0)) {
-        transfer.readFailure_ = got < 0 ? "file_unreadable" : "file_changed";
+        transfer.localFailure_ = got < 0 ? "file_unreadable" : "file_changed";
         return CURL_READFUNC_ABORT;
     }
     transfer.position_ += got;
@@ -160,8 +200,12 @@ int CurlTransfer::onSeek(void *self, curl_off_t offset, int origin)
 
 size_t CurlTransfer::onWrite(char *data, size_t size, size_t count, void *self)
 {
-    std::string &body = static_cast<CurlTransfer *>(self)->answer_.body;
+    auto &transfer = *static_cast<CurlTransfer *>(self);
     const size_t length = size * count;
+    if (transfer.request_.sink && transfer.goodAnswer()) {
+        return transfer.takesPiece({data, length}) ? length : CURL_WRITEFUNC_ERROR;
+    }
+    std::string &body = transfer.answer_.body;
     body.append(data, std::min(length, longestAnswer - body.size()));
     return length;
 }
@@ -180,14 +224,20 @@ size_t CurlTransfer::onHeader(char *data, size_t size, size_t count, void *self)
     return length;
 }
 
-int CurlTransfer::onProgress(void *self, curl_off_t, curl_off_t, curl_off_t, curl_off_t sent)
+int CurlTransfer::onProgress(void *self, curl_off_t, curl_off_t received, curl_off_t,
+                             curl_off_t sent)
 {
     auto &transfer = *static_cast<CurlTransfer *>(self);
+    const bool receives = transfer.request_.sink != nullptr;
+    if (receives && !transfer.goodAnswer()) {
+        return 0;
+    }
+    const curl_off_t bytes = receives ? received : sent;
     const auto now = std::chrono::steady_clock::now();
-    if (sent != transfer.reported_ && now - transfer.lastReport_ >= reportInterval) {
-        transfer.reported_ = sent;
+    if (bytes != transfer.reported_ && now - transfer.lastReport_ >= reportInterval) {
+        transfer.reported_ = bytes;
         transfer.lastReport_ = now;
-        transfer.progress_(sent);
+        transfer.progress_(bytes);
     }
     return 0;
 }

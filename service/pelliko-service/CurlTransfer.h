@@ -13,7 +13,7 @@ namespace pelliko::service
 class CurlTransfer
 {
 public:
-    using Progress = std::function<void(int64_t bytesSent)>;
+    using Progress = std::function<void(int64_t bytes)>;
 
     /** @param sendRate most bytes a second of the body, 0 for no limit */
     CurlTransfer(uint64_t number, HttpRequest request, Progress progress, int64_t sendRate);
@@ -30,11 +30,15 @@ public:
 private:
     void setOptions();
     void setBody();
+    void setProgress();
+    bool goodAnswer() const;
+    bool takesPiece(std::string_view piece);
+    void endSink();
     static size_t onRead(char *buffer, size_t size, size_t count, void *self);
     static int onSeek(void *self, curl_off_t offset, int origin);
     static size_t onWrite(char *data, size_t size, size_t count, void *self);
     static size_t onHeader(char *data, size_t size, size_t count, void *self);
-    static int onProgress(void *self, curl_off_t, curl_off_t, curl_off_t, curl_off_t sent);
+    static int onProgress(void *self, curl_off_t, curl_off_t received, curl_off_t, curl_off_t sent);
 
     uint64_t number_;
     HttpRequest request_;
@@ -45,7 +49,8 @@ private:
     int64_t position_ = 0; // within the range
     int64_t reported_ = 0;
     std::chrono::steady_clock::time_point lastReport_;
-    std::string readFailure_;
+    std::string localFailure_; // what went wrong on this side of the connection
+    bool sinkBegun_ = false;
     HttpAnswer answer_;
 };
 

@@ -7,6 +7,7 @@
 #include <map>
 #include <memory>
 #include <string>
+#include <string_view>
 #include <vector>
 
 namespace pelliko::service
@@ -19,12 +20,30 @@ struct FileRange {
     int64_t length = 0;
 };
 
+/** Takes the body of a good answer piece by piece. All calls come from the transfer thread. */
+class BodySink
+{
+public:
+    virtual ~BodySink() = default;
+
+    /** Before the first piece, and before end() when there is none. @return whether to go on */
+    virtual bool begin(long status) = 0;
+    /** @return whether to go on */
+    virtual bool take(std::string_view piece) = 0;
+    /** The whole body was taken. @return whether that is well */
+    virtual bool end() = 0;
+    /** Why it does not go on: a name of the error table. */
+    virtual std::string fault() const = 0;
+};
+
 struct HttpRequest {
     std::string method;
     std::string url;
     std::vector<std::string> headers; ///< "Name: value"
     std::string body;                 ///< used when there is no range
     FileRange range;
+    std::shared_ptr<BodySink> sink{}; ///< takes the body of an answer below 300, when there is one
+    bool endless = false; ///< an answer that may be silent for long: the sender watches it itself
 };
 
 struct HttpAnswer {
@@ -45,7 +64,8 @@ struct HttpAnswer {
 class HttpSender
 {
 public:
-    using Progress = std::function<void(int64_t bytesSent)>;
+    /** Bytes sent, or of a request with a sink those that it took. */
+    using Progress = std::function<void(int64_t bytes)>;
     using Done = std::function<void(const HttpAnswer &)>;
 
     virtual ~HttpSender() = default;

@@ -33,6 +33,10 @@ public:
 
     virtual void launchSms(const SmsLaunch &launch, std::function<void(LaunchResult)> done) = 0;
 
+    /** Tells of received shares. */
+    virtual void launchPush(const std::vector<std::string> &tokens,
+                            std::function<void(LaunchResult)> done) = 0;
+
     /** @param done receives whether the application answered that it takes the ids over */
     virtual void launchResume(const std::vector<int32_t> &ids, std::function<void(bool)> done) = 0;
 };

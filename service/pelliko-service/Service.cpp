@@ -1,7 +1,11 @@
 #include "Service.h"
 
+#include "AccountWatch.h"
 #include "AppLauncher.h"
+#include "PushChannel.h"
+#include "PushDelivery.h"
 #include "ServiceObject.h"
+#include "SharesObject.h"
 #include "TransferThread.h"
 
 #include <gio/gio.h>
@@ -13,6 +17,7 @@ namespace pelliko::service
 {
 namespace
 {
+constexpr int64_t historySeconds = 30LL * 24 * 3600;
 constexpr const char *busName = "com.velmora.pelliko.Service";
 
 // The parts that need the queue; made when it is loaded.
@@ -20,9 +25,9 @@ class Engine : public Orphans
 {
 public:
     Engine(const Settings &settings, GDBusConnection *bus, ServiceObject &object,
-           std::unique_ptr<UploadQueue> queue)
-        : queue_(std::move(queue)), http_(settings.sendRate),
-          gate_([this] { uploads_.networkChanged(); }),
+           SharesObject &shares, std::unique_ptr<UploadQueue> queue)
+        : shares_(shares), queue_(std::move(queue)), journal_(*queue_), http_(settings.sendRate),
+          gate_([this] { networkChanged(); }),
           launcher_(bus, [this] { resume_.applicationGone(); }),
           context_{*queue_,
                    http_,
@@ -37,20 +42,56 @@ public:
               [&object](const std::string &listener, int32_t id, const RequestReport &report) {
                   object.emit(listener, id, report);
               },
-              [this] { resume_.lookSoon(); }),
-          resume_(context_, *this)
+              [this] { resume_.lookSoon(); }, [this] { shares_.changed(); }),
+          resume_(context_, *this), received_(context_, journal_, [this] { shares_.changed(); }),
+          downloads_(context_, received_,
+                     [this](const DownloadKey &key, const DownloadProgress &progress) {
+                         shares_.emitProgress(key, progress);
+                     }),
+          delivery_(context_, journal_, [this] { shares_.changed(); }),
+          push_(context_, journal_, [this] { delivery_.kick(); }),
+          account_(settings.accountFile, [this] { accountChanged(); })
     {
         uploads_.load();
+        journal_.dropBefore(timers_.epochSeconds() - historySeconds);
         object.open(context_, uploads_, resume_);
+        shares_.open({context_, uploads_, received_, downloads_});
         resume_.lookAfter(settings.graceMs);
+        accountChanged();
     }
+
+    Engine(const Engine &) = delete;
+    Engine &operator=(const Engine &) = delete;
+
+    ~Engine() override { shares_.close(); }
 
     std::vector<int32_t> orphans() const override { return uploads_.orphans(); }
     bool isOrphan(int32_t id) const override { return uploads_.isOrphan(id); }
     void abandon(int32_t id) override { uploads_.abandon(id); }
 
 private:
+    void networkChanged()
+    {
+        uploads_.networkChanged();
+        push_.networkChanged();
+        goOn();
+    }
+
+    void accountChanged()
+    {
+        push_.accountChanged();
+        goOn();
+    }
+
+    void goOn()
+    {
+        delivery_.kick();
+        received_.kick();
+    }
+
+    SharesObject &shares_;
     std::unique_ptr<UploadQueue> queue_;
+    ReceivedJournal journal_;
     LoopTimers timers_;
     TransferThread http_;
     MonitorGate gate_;
@@ -58,6 +99,11 @@ private:
     RequestContext context_;
     Uploads uploads_;
     ResumeLauncher resume_;
+    ReceivedShares received_;
+    Downloads downloads_;
+    PushDelivery delivery_;
+    PushChannel push_;
+    AccountWatch account_;
 };
 
 struct Run {
@@ -67,6 +113,7 @@ struct Run {
     int status = 0;
     bool named = false;
     std::unique_ptr<ServiceObject> object;
+    std::unique_ptr<SharesObject> shares;
     std::unique_ptr<Engine> engine;
 
     void stop(int result)
@@ -105,7 +152,8 @@ void onQueueLoaded(GObject *, GAsyncResult *result, gpointer data)
         return;
     }
     try {
-        run.engine = std::make_unique<Engine>(run.settings, run.bus, *run.object, std::move(queue));
+        run.engine = std::make_unique<Engine>(run.settings, run.bus, *run.object, *run.shares,
+                                              std::move(queue));
     } catch (const std::exception &fault) {
         g_warning("the queue %s cannot be read: %s", run.settings.queueFile.c_str(), fault.what());
         run.stop(1);
@@ -145,10 +193,11 @@ int runService(const Settings &settings)
         return 1;
     }
     g_autoptr(GMainLoop) loop = g_main_loop_new(nullptr, FALSE);
-    Run run{settings, loop, bus, 0, false, nullptr, nullptr};
+    Run run{settings, loop, bus, 0, false, nullptr, nullptr, nullptr};
     const guint term = g_unix_signal_add(SIGTERM, onTerminate, &run);
     const guint interrupt = g_unix_signal_add(SIGINT, onTerminate, &run);
     run.object = std::make_unique<ServiceObject>(bus);
+    run.shares = std::make_unique<SharesObject>(bus);
     const guint name =
         g_bus_own_name_on_connection(bus, busName, G_BUS_NAME_OWNER_FLAGS_DO_NOT_QUEUE,
                                      onNameAcquired, onNameLost, &run, nullptr);
@@ -158,6 +207,7 @@ int runService(const Settings &settings)
     g_source_remove(interrupt);
     run.object.reset();
     run.engine.reset();
+    run.shares.reset();
     return run.status;
 }
 

@@ -19,6 +19,7 @@ struct Settings {
     int64_t firstLaunchRetryMs = 2'000;        ///< first wait after a failed launch
     int64_t longestLaunchRetryMs = 600'000;    ///< the waits double up to this
     int64_t claimMs = 30'000;                  ///< how long a resumed application may take to claim
+    int64_t pushSilenceMs = 75'000;            ///< a silent push stream is taken to be dead
     int64_t graceMs = 3'000; ///< after a start: time for living clients to come back
 };
 

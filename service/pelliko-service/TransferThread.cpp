@@ -1,8 +1,7 @@
 #include "TransferThread.h"
 
 #include "CurlTransfer.h"
-
-#include <glib.h>
+#include "LoopTask.h"
 
 #include <mutex>
 #include <thread>
@@ -13,31 +12,8 @@ namespace pelliko::service
 namespace
 {
 constexpr int idleWaitMs = 600'000; // the thread is woken for everything that matters
-constexpr long connectionsPerHost = 8;
-
-using Task = std::function<void()>;
-
-gboolean runTask(gpointer data)
-{
-    (*static_cast<Task *>(data))();
-    return G_SOURCE_REMOVE;
-}
-
-void deleteTask(gpointer data)
-{
-    std::unique_ptr<Task>(static_cast<Task *>(data));
-}
-
-// An own source, for g_main_context_invoke() might run the task right here when the loop stands
-// still.
-void onMainLoop(Task task)
-{
-    GSource *source = g_idle_source_new();
-    g_source_set_priority(source, G_PRIORITY_DEFAULT);
-    g_source_set_callback(source, runTask, new Task(std::move(task)), deleteTask);
-    g_source_attach(source, nullptr);
-    g_source_unref(source);
-}
+// Eight for transfers, and the push stream.
+constexpr long connectionsPerHost = 9;
 } // namespace
 
 // What runs on the thread. Orders come through a list under a lock, results go to the main loop.
@@ -74,7 +50,7 @@ public:
     }
 
 private:
-    void order(Task task)
+    void order(LoopTask task)
     {
         {
             const std::lock_guard lock(mutex_);
@@ -99,7 +75,7 @@ private:
 
     bool takeOrders()
     {
-        std::vector<Task> orders;
+        std::vector<LoopTask> orders;
         {
             const std::lock_guard lock(mutex_);
             if (stop_) {
@@ -107,7 +83,7 @@ private:
             }
             orders.swap(orders_);
         }
-        for (Task &task : orders) {
+        for (LoopTask &task : orders) {
             task();
         }
         return true;
@@ -117,8 +93,8 @@ private:
     {
         auto transfer = std::make_unique<CurlTransfer>(
             number, std::move(request),
-            [this, number](int64_t sent) {
-                post([number, sent](TransferThread &owner) { owner.onProgress(number, sent); });
+            [this, number](int64_t bytes) {
+                post([number, bytes](TransferThread &owner) { owner.onProgress(number, bytes); });
             },
             sendRate_);
         curl_multi_add_handle(multi_, transfer->handle());
@@ -164,7 +140,7 @@ private:
     std::weak_ptr<TransferThread *> owner_;
     int64_t sendRate_;
     std::mutex mutex_;
-    std::vector<Task> orders_;
+    std::vector<LoopTask> orders_;
     bool stop_ = false;
     std::map<uint64_t, std::unique_ptr<CurlTransfer>> transfers_;
     CURLM *multi_;
@@ -195,12 +171,12 @@ void TransferThread::cancel(uint64_t transfer)
     }
 }
 
-void TransferThread::onProgress(uint64_t transfer, int64_t bytesSent)
+void TransferThread::onProgress(uint64_t transfer, int64_t bytes)
 {
     const auto found = callbacks_.find(transfer);
     if (found != callbacks_.end() && found->second.progress) {
         const Progress progress = found->second.progress;
-        progress(bytesSent);
+        progress(bytes);
     }
 }
 

@@ -26,7 +26,7 @@ private:
     };
     class Loop;
 
-    void onProgress(uint64_t transfer, int64_t bytesSent);
+    void onProgress(uint64_t transfer, int64_t bytes);
     void onDone(uint64_t transfer, const HttpAnswer &answer);
 
     std::map<uint64_t, Callbacks> callbacks_;

@@ -66,8 +66,40 @@ ALTER TABLE recipients ADD COLUMN fault TEXT NOT NULL DEFAULT '';
 ALTER TABLE recipients ADD COLUMN joined INTEGER NOT NULL DEFAULT 0;
 )sql";
 
+// What others share with this user, how far the pushes are, and what is no longer shown.
+constexpr const char *withReceived = R"sql(
+ALTER TABLE requests ADD COLUMN withdrawn INTEGER NOT NULL DEFAULT 0;
+ALTER TABLE requests ADD COLUMN forgotten INTEGER NOT NULL DEFAULT 0;
+CREATE TABLE push_positions (
+  account TEXT PRIMARY KEY,
+  stored INTEGER NOT NULL,
+  acknowledged INTEGER NOT NULL
+) WITHOUT ROWID;
+CREATE TABLE received (
+  id INTEGER PRIMARY KEY AUTOINCREMENT,
+  token TEXT NOT NULL UNIQUE,
+  received_at INTEGER NOT NULL,
+  known INTEGER NOT NULL DEFAULT 0,
+  told INTEGER NOT NULL DEFAULT 0,
+  launches INTEGER NOT NULL DEFAULT 0,
+  forgotten INTEGER NOT NULL DEFAULT 0,
+  sender TEXT NOT NULL DEFAULT '',
+  created_at INTEGER NOT NULL DEFAULT 0,
+  expires INTEGER NOT NULL DEFAULT 0,
+  state INTEGER NOT NULL DEFAULT 0
+);
+CREATE TABLE received_files (
+  share INTEGER NOT NULL REFERENCES received (id) ON DELETE CASCADE,
+  position INTEGER NOT NULL,
+  name TEXT NOT NULL,
+  size INTEGER NOT NULL,
+  type TEXT NOT NULL,
+  PRIMARY KEY (share, position)
+) WITHOUT ROWID;
+)sql";
+
 /** The way from each version of the layout to the next; a fresh file goes all of it. */
-constexpr std::array layouts{firstLayout, withForms};
+constexpr std::array layouts{firstLayout, withForms, withReceived};
 
 std::unique_ptr<SQLite::Database> openDatabase(const std::string &file)
 {
@@ -182,7 +214,8 @@ std::optional<QueuedRequest> UploadQueue::find(int32_t id)
     SQLite::Statement query(
         *db_,
         "SELECT state, wifi_only, reshare_of, idempotency_key, share, url, expires, sms_state,"
-        " sms_attempts, end_status, error, delivered FROM requests WHERE id = ?");
+        " sms_attempts, end_status, error, delivered, withdraw, withdrawn, created_at, forgotten"
+        " FROM requests WHERE id = ?");
     query.bind(1, id);
     if (!query.executeStep()) {
         return std::nullopt;
@@ -201,6 +234,10 @@ std::optional<QueuedRequest> UploadQueue::find(int32_t id)
     request.endStatus = query.getColumn(9).getInt();
     request.error = query.getColumn(10).getInt();
     request.delivered = query.getColumn(11).getInt() != 0;
+    request.withdraw = query.getColumn(12).getInt() != 0;
+    request.withdrawn = query.getColumn(13).getInt() != 0;
+    request.createdAt = query.getColumn(14).getInt64();
+    request.forgotten = query.getColumn(15).getInt() != 0;
     readFiles(request);
     readRecipients(request);
     return request;
@@ -250,6 +287,11 @@ std::vector<int32_t> UploadQueue::ids(const char *sql)
 std::vector<int32_t> UploadQueue::allIds()
 {
     return ids("SELECT id FROM requests ORDER BY id");
+}
+
+std::vector<int32_t> UploadQueue::shownIds()
+{
+    return ids("SELECT id FROM requests WHERE forgotten = 0 ORDER BY id DESC");
 }
 
 std::vector<int32_t> UploadQueue::openIds()
@@ -308,6 +350,7 @@ void UploadQueue::setEnded(int32_t id, int status, int error, bool withdraw, int
 void UploadQueue::setDelivered(int32_t id)
 {
     execute(*db_, "UPDATE requests SET delivered = 1 WHERE id = ?", id);
+    dropForgotten(id);
 }
 
 std::vector<int32_t> UploadQueue::withdrawals()
@@ -318,6 +361,29 @@ std::vector<int32_t> UploadQueue::withdrawals()
 void UploadQueue::withdrawalDone(int32_t id)
 {
     execute(*db_, "UPDATE requests SET withdraw = 0 WHERE id = ?", id);
+    dropForgotten(id);
+}
+
+void UploadQueue::setWithdrawn(int32_t id)
+{
+    execute(*db_,
+            "UPDATE requests SET withdrawn = 1, withdraw = 1 WHERE id = ? AND state = 2"
+            " AND withdrawn = 0",
+            id);
+}
+
+void UploadQueue::forget(int32_t id)
+{
+    execute(*db_, "UPDATE requests SET forgotten = 1 WHERE id = ? AND state = 2", id);
+    dropForgotten(id);
+}
+
+void UploadQueue::dropForgotten(int32_t id)
+{
+    execute(*db_,
+            "DELETE FROM requests WHERE id = ? AND forgotten = 1 AND state = 2 AND delivered = 1"
+            " AND withdraw = 0",
+            id);
 }
 
 void UploadQueue::forgetBefore(int64_t epochSeconds)

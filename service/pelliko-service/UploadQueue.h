@@ -65,6 +65,10 @@ struct QueuedRequest {
     int endStatus = 0; ///< a PellikoUploadStatus once it has ended
     int error = 0;
     bool delivered = false; ///< a client has confirmed the end, or nobody is going to
+    bool withdraw = false;  ///< the share is still to be taken off the server
+    bool withdrawn = false; ///< the user took the finished share back
+    bool forgotten = false; ///< not shown any more
+    int64_t createdAt = 0;
 };
 
 /**
@@ -86,6 +90,8 @@ public:
     std::optional<QueuedRequest> find(int32_t id);
     /** Every request, oldest first. */
     std::vector<int32_t> allIds();
+    /** Every request that was not forgotten, newest first. */
+    std::vector<int32_t> shownIds();
     /** Requests that have not ended, or whose end no client has heard of. */
     std::vector<int32_t> openIds();
 
@@ -104,14 +110,23 @@ public:
     std::vector<int32_t> withdrawals();
     void withdrawalDone(int32_t id);
 
+    /** The user takes a finished share back: it is to be withdrawn. */
+    void setWithdrawn(int32_t id);
+    /** The request is shown no more. It goes when nothing is left to be done for it. */
+    void forget(int32_t id);
+
     /** Forgets requests that ended, and were heard of, before that time. */
     void forgetBefore(int64_t epochSeconds);
+
+    /** The file itself, for what else is kept in it; borrowed. */
+    SQLite::Database &database() { return *db_; }
 
 private:
     void migrate();
     void readFiles(QueuedRequest &request);
     void readRecipients(QueuedRequest &request);
     std::vector<int32_t> ids(const char *sql);
+    void dropForgotten(int32_t id);
 
     std::unique_ptr<SQLite::Database> db_;
 };

@@ -9,6 +9,7 @@ namespace pelliko::service
 namespace
 {
 constexpr int invalidParameter = -22;
+constexpr int errorUnknown = -2;
 constexpr int64_t historySeconds = 30LL * 24 * 3600;
 
 RequestReport endOf(const QueuedRequest &record)
@@ -17,9 +18,10 @@ RequestReport endOf(const QueuedRequest &record)
 }
 } // namespace
 
-Uploads::Uploads(RequestContext &context, Emit emit, std::function<void()> orphaned)
+Uploads::Uploads(RequestContext &context, Emit emit, std::function<void()> orphaned,
+                 std::function<void()> changed)
     : context_(context), emit_(std::move(emit)), orphaned_(std::move(orphaned)),
-      withdrawals_(context)
+      changed_(std::move(changed)), withdrawals_(context, changed_)
 {
 }
 
@@ -72,6 +74,7 @@ int Uploads::accept(const std::string &listener, const NewRequest &request, int3
     }
     g_message("request %d: %zu files, %zu recipients", id, request.files.size(),
               request.recipients.size());
+    changed_();
     return 0;
 }
 
@@ -123,6 +126,36 @@ int Uploads::cancel(int32_t id)
         return errorRefused;
     }
     found->second->cancel();
+    return 0;
+}
+
+int Uploads::withdraw(int32_t id)
+{
+    if (cancel(id) == 0) {
+        return 0;
+    }
+    const auto record = context_.queue.find(id);
+    if (!record || record->forgotten ||
+        record->endStatus != static_cast<int>(Status::shareFinished)) {
+        return errorUnknown;
+    }
+    context_.queue.setWithdrawn(id);
+    changed_();
+    withdrawals_.kick();
+    return 0;
+}
+
+int Uploads::forget(int32_t id)
+{
+    const auto record = context_.queue.find(id);
+    if (!record || record->forgotten) {
+        return errorUnknown;
+    }
+    if (record->state != RequestState::ended) {
+        return errorRefused;
+    }
+    context_.queue.forget(id);
+    changed_();
     return 0;
 }
 
@@ -199,6 +232,7 @@ void Uploads::onReport(int32_t id, const RequestReport &report)
         // Not from inside the request's own function.
         context_.timers.after(0, [this, id] { onEnd(id); });
     }
+    changed_();
     if (const auto listener = listeners_.find(id); listener != listeners_.end()) {
         emit_(listener->second, id, report);
     }

@@ -20,8 +20,10 @@ public:
     /**
      * @param emit     hands a report to its listener
      * @param orphaned called when a request may have lost, or never had, a listener
+     * @param changed  called when a list of requests would be different
      */
-    Uploads(RequestContext &context, Emit emit, std::function<void()> orphaned);
+    Uploads(RequestContext &context, Emit emit, std::function<void()> orphaned,
+            std::function<void()> changed);
 
     /** Goes on with everything that the queue holds. */
     void load();
@@ -34,6 +36,11 @@ public:
     int cancel(int32_t id);
     int resume(const std::string &listener, int32_t id);
     void confirmEnd(const std::string &listener, int32_t id);
+
+    /** Takes a share back, whether it is complete or not. @return 0 or an error code */
+    int withdraw(int32_t id);
+    /** Takes an ended request off the lists. @return 0 or an error code */
+    int forget(int32_t id);
 
     /** A client has gone: it listens no more. */
     void listenerGone(const std::string &listener);
@@ -60,6 +67,7 @@ private:
     RequestContext &context_;
     Emit emit_;
     std::function<void()> orphaned_;
+    std::function<void()> changed_;
     Withdrawals withdrawals_;
     std::map<int32_t, std::unique_ptr<Request>> requests_;
     std::map<int32_t, RequestReport> undelivered_; ///< ends that no client has confirmed

@@ -7,8 +7,8 @@
 namespace pelliko::service
 {
 
-Withdrawals::Withdrawals(RequestContext &context)
-    : context_(context),
+Withdrawals::Withdrawals(RequestContext &context, std::function<void()> changed)
+    : context_(context), changed_(std::move(changed)),
       backoff_(context.settings.firstRetryMs, context.settings.longestRetryMs, context.random)
 {
 }
@@ -119,6 +119,7 @@ void Withdrawals::done()
     }
     g_message("request %d: its share is off the server", current_);
     backoff_.reset();
+    changed_();
     next();
 }
 

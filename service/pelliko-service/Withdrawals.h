@@ -11,7 +11,8 @@ namespace pelliko::service
 class Withdrawals
 {
 public:
-    explicit Withdrawals(RequestContext &context);
+    /** @param changed called when a share is off the server */
+    Withdrawals(RequestContext &context, std::function<void()> changed);
     ~Withdrawals();
     Withdrawals(const Withdrawals &) = delete;
     Withdrawals &operator=(const Withdrawals &) = delete;
@@ -29,6 +30,7 @@ private:
     void again();
 
     RequestContext &context_;
+    std::function<void()> changed_;
     Backoff backoff_;
     int32_t current_ = 0;
     uint64_t transfer_ = 0;

@@ -36,6 +36,8 @@ void addSettings(CLI::App &app, Settings &settings)
     time("--longest-launch-retry", settings.longestLaunchRetryMs,
          "Longest wait after a failed launch (ms)");
     time("--claim", settings.claimMs, "Time to claim requests after a resume launch (ms)");
+    time("--push-silence", settings.pushSilenceMs,
+         "Silence after which the push stream is taken to be dead (ms)");
     time("--grace", settings.graceMs, "Time for living clients to come back after a start (ms)");
 }
 } // namespace

@@ -119,6 +119,40 @@ int pelliko_upload_info_get_handle(int32_t request_id, pelliko_upload_info_h *in
 int pelliko_upload_info_get_file_info(pelliko_upload_info_h info, char ***file_list,
                                       int32_t *file_count, int64_t *total_size);
 
+/** What the service knows of one received share; valid during the callback only. */
+typedef struct pelliko_push_info_s *pelliko_push_info_h;
+
+/**
+ * The answer to pelliko_push_info_request(), once per request, on a thread of this library that
+ * does nothing else; no lock is held, and the next request may be made from inside.
+ *
+ * @param result         0, or why nothing is known: a code of this file or of pelliko_shares.h
+ * @param contents_token as it was asked for; borrowed
+ * @param info           never NULL; with a result other than 0 each of the functions below fails
+ * with it
+ */
+typedef void (*pelliko_push_info_cb)(int result, const char *contents_token,
+                                     pelliko_push_info_h info, void *user_data);
+
+/** Asks for a received share and returns at once. Any thread.
+ * @return an error, and no callback, only when a parameter is NULL */
+int pelliko_push_info_request(const char *contents_token, pelliko_push_info_cb callback,
+                              void *user_data);
+
+/** The number of files. */
+int pelliko_push_info_get_content_info_count(pelliko_push_info_h info, unsigned int *count);
+
+/** The size of a file in bytes. @param index from 0 */
+int pelliko_content_info_get_file_size(pelliko_push_info_h info, unsigned int index,
+                                       uint32_t *size);
+
+/** The share's end in seconds since the epoch. */
+int pelliko_push_info_get_expired_time(pelliko_push_info_h info, unsigned long long *expired_time);
+
+/** The sender's number. @param msisdn receives a text for free(); untouched on an error, as when
+ * the sender is not known */
+int pelliko_push_info_get_sender_msisdn(pelliko_push_info_h info, char **msisdn);
+
 #ifdef __cplusplus
 }
 #endif

@@ -73,6 +73,22 @@ public:
     {
         finish({{}, status, body, std::move(headers)});
     }
+    /** Answers the oldest request for that address. */
+    void answerTo(const std::string &end, long status, const std::string &body)
+    {
+        const auto found = to(end);
+        ASSERT_NE(found, open.end()) << end;
+        const Done done = found->second.done;
+        open.erase(found);
+        done({{}, status, body, {}});
+    }
+    bool asked(const std::string &end) { return to(end) != open.end(); }
+    std::map<uint64_t, Sent>::iterator to(const std::string &end)
+    {
+        return std::find_if(open.begin(), open.end(), [&end](const auto &entry) {
+            return entry.second.request.url.ends_with(end);
+        });
+    }
     void refuseConnection() { finish({"unreachable", 0, {}, {}}); }
     const HttpRequest &oldest() const { return open.begin()->second.request; }
 
@@ -108,6 +124,12 @@ public:
         launches.push_back(launch);
         answer = std::move(done);
     }
+    void launchPush(const std::vector<std::string> &tokens,
+                    std::function<void(LaunchResult)> done) override
+    {
+        pushes.push_back(tokens);
+        answerPush = std::move(done);
+    }
     void launchResume(const std::vector<int32_t> &ids, std::function<void(bool)> done) override
     {
         resumes.push_back(ids);
@@ -116,6 +138,8 @@ public:
 
     std::vector<SmsLaunch> launches;
     std::function<void(LaunchResult)> answer;
+    std::vector<std::vector<std::string>> pushes;
+    std::function<void(LaunchResult)> answerPush;
     std::vector<std::vector<int32_t>> resumes;
     std::function<void(bool)> answerResume;
 };

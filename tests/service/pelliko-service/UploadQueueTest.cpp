@@ -135,6 +135,23 @@ TEST_F(Queue, keepsWhatWasFoundOutBesideWhatTheClientSaid)
     EXPECT_EQ(recipients[1].joined, Joined::unknown);
 }
 
+TEST_F(Queue, whatIsForgottenGoesWhenNothingIsLeftToDo)
+{
+    const int32_t id = add();
+    queue->forget(id); // has not ended
+    EXPECT_THAT(queue->shownIds(), ElementsAre(id));
+    queue->setEnded(id, 7, 0, false, 100);
+    queue->setWithdrawn(id);
+    EXPECT_THAT(queue->withdrawals(), ElementsAre(id));
+    queue->forget(id);
+    EXPECT_THAT(queue->shownIds(), testing::IsEmpty());
+    EXPECT_TRUE(queue->find(id)->withdrawn);
+    queue->withdrawalDone(id);
+    EXPECT_TRUE(queue->find(id)) << "no client has heard its end";
+    queue->setDelivered(id);
+    EXPECT_FALSE(queue->find(id));
+}
+
 TEST_F(Queue, aQueueOfTheFirstLayoutIsTakenOver)
 {
     const int32_t id = add();
@@ -145,6 +162,10 @@ TEST_F(Queue, aQueueOfTheFirstLayoutIsTakenOver)
                            "ALTER TABLE recipients DROP COLUMN e164;"
                            "ALTER TABLE recipients DROP COLUMN fault;"
                            "ALTER TABLE recipients DROP COLUMN joined;"
+                           "ALTER TABLE requests DROP COLUMN withdrawn;"
+                           "ALTER TABLE requests DROP COLUMN forgotten;"
+                           "DROP TABLE push_positions; DROP TABLE received_files;"
+                           "DROP TABLE received;"
                            "PRAGMA user_version = 1",
                            nullptr, nullptr, nullptr),
               SQLITE_OK);
