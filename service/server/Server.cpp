@@ -1,6 +1,7 @@
 #include "Server.h"
 
 #include "Sweeper.h"
+#include "http/Capacity.h"
 #include "http/Connection.h"
 #include "http/Router.h"
 
@@ -14,6 +15,7 @@
 #include <boost/asio/steady_timer.hpp>
 #include <boost/asio/use_awaitable.hpp>
 
+#include <algorithm>
 #include <chrono>
 #include <csignal>
 #include <cstdio>
@@ -32,28 +34,31 @@ constexpr auto asTuple = asio::as_tuple(asio::use_awaitable);
 
 /// Threads that wait for the disk; more than cores, since they wait.
 constexpr std::size_t poolThreads = 8;
-/// Beyond this, callers wait in the system's queue until somebody leaves.
-constexpr std::size_t connectionLimit = 2000;
 /// How long a stop waits for requests in hand.
 constexpr std::chrono::seconds stopPatience{10};
 /// When the system refuses a connection for want of descriptors or memory.
 constexpr std::chrono::seconds acceptPause{1};
 
+Limits limitsOf(const Config &config, const Capacity &capacity)
+{
+    Limits limits = config.limits;
+    limits.pushStreams = std::min(limits.pushStreams, capacity.pushStreams);
+    return limits;
+}
+
 } // namespace
 
 struct Server::State {
     State(const Config &config, Metadata &metadata, Blobs &blobs, std::function<Seconds()> now)
-        : timeouts(config.timeouts), pool(poolThreads), context{metadata,
-                                                                blobs,
-                                                                pool,
-                                                                writes,
-                                                                config.limits,
-                                                                std::move(now),
-                                                                config.publicUrl,
-                                                                [this] { sweeper.wake(); }},
+        : timeouts(config.timeouts), pool(poolThreads),
+          pushes(io.get_executor(), limitsOf(config, capacity)),
+          context{metadata,         blobs, pool, writes, pushes, config.limits, std::move(now),
+                  config.publicUrl, {},    {}},
           sweeper(io.get_executor(), context), acceptor(io), signals(io, SIGTERM, SIGINT),
           stopTimer(io), room(io, asio::steady_timer::time_point::max())
     {
+        context.wakeSweeper = [this] { sweeper.wake(); };
+        context.announcePushes = [this](const auto &accounts) { pushes.announce(accounts); };
     }
 
     void listen(const ListenAddress &address);
@@ -63,10 +68,12 @@ struct Server::State {
     Task<void> cutAfterPatience();
     void stop();
 
+    const Capacity capacity = claimCapacity();
     Timeouts timeouts;
     asio::io_context io{1};
     StoragePool pool;
     ActiveWrites writes;
+    PushHub pushes;
     Context context;
     Sweeper sweeper;
     tcp::acceptor acceptor;
@@ -114,7 +121,7 @@ Task<void> Server::State::serve(std::shared_ptr<Connection> connection)
 Task<void> Server::State::acceptAll()
 {
     while (!stopping) {
-        if (connections.size() >= connectionLimit) {
+        if (connections.size() >= capacity.connections) {
             co_await room.async_wait(asTuple);
             continue;
         }
@@ -158,6 +165,7 @@ void Server::State::stop()
     room.cancel();
     sweeper.stop();
     writes.stopAll();
+    pushes.stop();
     for (const auto &connection : std::set(connections))
         connection->finish();
     asio::co_spawn(io, cutAfterPatience(), asio::detached);
@@ -195,6 +203,7 @@ void Server::run()
     asio::co_spawn(m_state->io, m_state->acceptAll(), asio::detached);
     asio::co_spawn(m_state->io, m_state->waitForSignals(), asio::detached);
     asio::co_spawn(m_state->io, m_state->sweeper.run(), asio::detached);
+    asio::co_spawn(m_state->io, m_state->pushes.run(), asio::detached);
     m_state->io.run();
 }
 

@@ -105,6 +105,11 @@ void addServe(CLI::App &app, ServeOptions &options)
                      "Attempts to register from one address in an hour")
         ->check(CLI::PositiveNumber)
         ->capture_default_str();
+    command
+        ->add_option("--push-keepalive", limits.pushKeepAlive,
+                     "Seconds between two signs of life on a push stream")
+        ->check(CLI::PositiveNumber)
+        ->capture_default_str();
     command->add_option("--head-timeout", options.headTimeout, "Seconds for a whole request head")
         ->check(CLI::PositiveNumber)
         ->capture_default_str();

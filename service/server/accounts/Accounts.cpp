@@ -30,9 +30,14 @@ std::string tokenOf(const Request &request)
 
 } // namespace
 
+std::string tokenHashOf(const Request &request)
+{
+    return sha256(tokenOf(request));
+}
+
 Task<Account> authenticate(Exchange &exchange, Context &context)
 {
-    const std::string hash = sha256(tokenOf(exchange.request()));
+    const std::string hash = tokenHashOf(exchange.request());
     std::optional<Account> account =
         co_await context.pool.run([&] { return context.metadata.findAccount(hash); });
     if (!account)

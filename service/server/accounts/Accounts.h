@@ -8,6 +8,9 @@
 namespace pelliko::server
 {
 
+/// The hash of the token that the request carries; without one that may be a token it is refused.
+[[nodiscard]] std::string tokenHashOf(const Request &request);
+
 /// The account whose token the request carries; anything else is refused.
 Task<Account> authenticate(Exchange &exchange, Context &context);
 

@@ -6,6 +6,7 @@
 #include <nlohmann/json.hpp>
 
 #include <algorithm>
+#include <vector>
 
 namespace pelliko::server
 {
@@ -74,6 +75,17 @@ void checkOutcome(RegisterResult result)
     }
 }
 
+/// The phone that had the account before is to hear of no push any more.
+Task<void> endFormerStreams(Context &context, const std::string &tokenHash)
+{
+    const auto account =
+        co_await context.pool.run([&] { return context.metadata.findAccount(tokenHash); });
+    if (!account)
+        co_return;
+    const std::vector<std::int64_t> accounts{account->id};
+    context.announcePushes(accounts);
+}
+
 } // namespace
 
 Task<void> registerAccount(Exchange &exchange, Context &context)
@@ -88,6 +100,7 @@ Task<void> registerAccount(Exchange &exchange, Context &context)
     const RegisterResult result =
         co_await context.pool.run([&] { return context.metadata.registerAccount(registration); });
     checkOutcome(result);
+    co_await endFormerStreams(context, registration.tokenHash);
     const nlohmann::json answer{{"number", registration.number}, {"token", token}};
     co_await exchange.respond(jsonResponse(Status::created, answer.dump()));
 }

@@ -12,6 +12,7 @@
 #include <boost/asio/write.hpp>
 
 #include <sys/sendfile.h>
+#include <sys/socket.h>
 
 #include <algorithm>
 #include <array>
@@ -31,6 +32,8 @@ constexpr auto asTuple = asio::as_tuple(asio::use_awaitable);
 
 /// An unread rest of a body up to this is read away; a longer one costs the connection.
 constexpr std::uint64_t drainLimit = 256 * 1024;
+/// A chunk up to this goes out in one packet with its frame; copying a longer one costs more.
+constexpr std::size_t joinedChunk = 4096;
 /// One call of the kernel's copy; bounds how long a thread of the pool serves one download.
 constexpr std::uint64_t sendStep = 1024 * 1024;
 
@@ -59,9 +62,12 @@ public:
     Task<void> write(std::string_view bytes) override;
     Task<void> sendFile(int file, std::uint64_t offset, std::uint64_t length) override;
     Task<void> endStream() override;
+    void watchPeer(std::function<void()> gone) override;
     [[nodiscard]] bool answered() const override { return m_answered; }
 
 private:
+    Task<void> awaitPeer(std::shared_ptr<ConnectionImpl> self);
+    [[nodiscard]] bool peerClosed();
     Task<void> watch(std::shared_ptr<ConnectionImpl> self);
     Task<bool> waitForRequest();
     Task<bool> serveOne();
@@ -78,6 +84,7 @@ private:
     HeadRefused m_headRefused;
     Watchdog m_watchdog;
     BodyReader m_reader;
+    std::function<void()> m_peerGone;
     bool m_idle = false;
     bool m_finishing = false;
     bool m_answered = false;
@@ -228,20 +235,53 @@ Task<void> ConnectionImpl::write(std::string_view bytes)
 {
     if (isHead() || bytes.empty())
         co_return;
-    if (m_chunked) {
-        std::array<char, 24> size{};
-        std::snprintf(size.data(), size.size(), "%zx\r\n", bytes.size());
-        co_await sendAll(size.data());
+    if (!m_chunked) {
+        co_await sendAll(bytes);
+        co_return;
     }
+    std::array<char, 24> size{};
+    std::snprintf(size.data(), size.size(), "%zx\r\n", bytes.size());
+    if (bytes.size() <= joinedChunk) {
+        const std::string chunk = size.data() + std::string(bytes) + "\r\n";
+        co_await sendAll(chunk);
+        co_return;
+    }
+    co_await sendAll(size.data());
     co_await sendAll(bytes);
-    if (m_chunked)
-        co_await sendAll("\r\n");
+    co_await sendAll("\r\n");
 }
 
 Task<void> ConnectionImpl::endStream()
 {
     if (m_chunked && !isHead())
         co_await sendAll("0\r\n\r\n");
+}
+
+void ConnectionImpl::watchPeer(std::function<void()> gone)
+{
+    m_peerGone = std::move(gone);
+    if (m_peerGone) {
+        asio::co_spawn(m_socket.get_executor(), awaitPeer(shared_from_this()), asio::detached);
+        return;
+    }
+    boost::system::error_code ignored;
+    m_socket.cancel(ignored);
+}
+
+Task<void> ConnectionImpl::awaitPeer(std::shared_ptr<ConnectionImpl> self)
+{
+    if (self->m_reader.hasBufferedBytes())
+        co_return;
+    auto [error] = co_await self->m_socket.async_wait(tcp::socket::wait_read, asTuple);
+    if (self->m_peerGone && (error || self->peerClosed()))
+        std::exchange(self->m_peerGone, {})();
+}
+
+bool ConnectionImpl::peerClosed()
+{
+    char byte = 0;
+    const ssize_t count = ::recv(m_socket.native_handle(), &byte, 1, MSG_PEEK | MSG_DONTWAIT);
+    return count == 0 || (count < 0 && errno != EAGAIN && errno != EINTR);
 }
 
 Task<void> ConnectionImpl::sendAll(std::string_view bytes)

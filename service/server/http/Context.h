@@ -2,6 +2,7 @@
 
 #include "accounts/AttemptLimiter.h"
 #include "http/StoragePool.h"
+#include "push/PushHub.h"
 #include "shares/Limits.h"
 #include "store/Blobs.h"
 #include "store/Metadata.h"
@@ -9,6 +10,7 @@
 
 #include <functional>
 #include <string>
+#include <vector>
 
 namespace pelliko::server
 {
@@ -19,6 +21,7 @@ struct Context {
     Blobs &blobs;
     StoragePool &pool;
     ActiveWrites &writes;
+    PushHub &pushes;
     Limits limits;
     /// Seconds since the epoch.
     std::function<Seconds()> now;
@@ -26,6 +29,9 @@ struct Context {
     std::string publicUrl;
     /// Called when bytes became unneeded or a deadline was set.
     std::function<void()> wakeSweeper;
+    /// Called when these accounts have new pushes, or another token than before. With several
+    /// servers on one store this is where each tells the others.
+    std::function<void(const std::vector<std::int64_t> &)> announcePushes;
     AttemptLimiter registrations{limits.registrations, limits.registrationWindow};
 };
 

@@ -28,6 +28,7 @@ enum class Error {
     headerTooLarge,
     internal,
     noSpace,
+    busy,
     numberInvalid,
     numberTaken,
     codeUnknown,

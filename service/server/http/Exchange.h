@@ -7,6 +7,7 @@
 #include <cstddef>
 #include <cstdint>
 #include <exception>
+#include <functional>
 #include <optional>
 #include <span>
 #include <string>
@@ -59,6 +60,10 @@ public:
     /// Sends `length` bytes of an open file from `offset`; the kernel copies them.
     virtual Task<void> sendFile(int file, std::uint64_t offset, std::uint64_t length) = 0;
     virtual Task<void> endStream() = 0;
+
+    /// Calls `gone` once when the peer closes its side while nothing is read or written; an empty
+    /// function ends the watch. Not told of a peer that has sent a further request already.
+    virtual void watchPeer(std::function<void()> gone) = 0;
 
     /// True once a head was sent: a refusal can no longer be told.
     [[nodiscard]] virtual bool answered() const = 0;

@@ -33,6 +33,7 @@ constexpr Phrase phrases[] = {
     {429, "Too Many Requests"},
     {431, "Request Header Fields Too Large"},
     {500, "Internal Server Error"},
+    {503, "Service Unavailable"},
     {507, "Insufficient Storage"},
 };
 

@@ -6,6 +6,8 @@
 #include "http/Errors.h"
 #include "pages/Download.h"
 #include "pages/LandingPage.h"
+#include "push/EventStream.h"
+#include "push/ReceivedEndpoints.h"
 #include "shares/ShareEndpoints.h"
 #include "store/StorageFailure.h"
 #include "tus/TusEndpoints.h"
@@ -83,6 +85,40 @@ Task<void> routeShares(Exchange &exchange, Context &context, Parts parts)
     }
 }
 
+Task<void> routePush(Exchange &exchange, Context &context, Parts parts)
+{
+    if (parts.empty()) {
+        requireGet(exchange.request());
+        co_await streamPushes(exchange, context);
+    } else if (parts.size() == 1 && parts[0] == "ack") {
+        if (exchange.request().method != "POST")
+            refuseMethod("POST");
+        co_await acknowledgePushes(exchange, context);
+    } else {
+        throw Refusal(Error::notFound);
+    }
+}
+
+Task<void> routeReceived(Exchange &exchange, Context &context, Parts parts)
+{
+    const std::string &method = exchange.request().method;
+    if (parts.empty()) {
+        requireGet(exchange.request());
+        co_await listReceived(exchange, context);
+    } else if (parts.size() == 1 && method == "DELETE") {
+        co_await forgetReceived(exchange, context, parts[0]);
+    } else if (parts.size() == 1) {
+        if (method != "GET" && method != "HEAD")
+            refuseMethod("GET, HEAD, DELETE");
+        co_await showReceived(exchange, context, parts[0]);
+    } else if (parts.size() == 3 && parts[1] == "files") {
+        requireGet(exchange.request());
+        co_await downloadReceived(exchange, context, parts[0], parts[2]);
+    } else {
+        throw Refusal(Error::notFound);
+    }
+}
+
 Task<void> routeLinks(Exchange &exchange, Context &context, Parts parts)
 {
     requireGet(exchange.request());
@@ -115,6 +151,10 @@ Task<void> routeApi(Exchange &exchange, Context &context, Parts parts)
     } else if (room == "account" && parts.empty()) {
         requireGet(exchange.request());
         co_await showAccount(exchange, context);
+    } else if (room == "push") {
+        co_await routePush(exchange, context, std::move(parts));
+    } else if (room == "received") {
+        co_await routeReceived(exchange, context, std::move(parts));
     } else if (room == "joined" && parts.empty()) {
         if (exchange.request().method != "POST")
             refuseMethod("POST");

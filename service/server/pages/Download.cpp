@@ -140,7 +140,11 @@ Task<void> downloadFile(Exchange &exchange, Context &context, std::string token,
     const LinkRecord link = co_await findLiveLink(context, token);
     if (index >= link.share.files.size())
         throw Refusal(Error::notFound);
-    const FileRecord &file = link.share.files[index];
+    co_await sendShareFile(exchange, context, link.share.files[index]);
+}
+
+Task<void> sendShareFile(Exchange &exchange, Context &context, const FileRecord &file)
+{
     const std::string etag = etagOf(file);
     if (listsEtag(exchange.request().header("If-None-Match"), etag)) {
         Response unchanged = makeResponse(Status::notModified, {{"ETag", etag}});

@@ -26,6 +26,10 @@ struct Limits {
     /// Attempts to register from one address within the window.
     std::size_t registrations = 20;
     std::int64_t registrationWindow = 3600;
+    /// Open push streams, in all and of one account, and the seconds between their signs of life.
+    std::size_t pushStreams = 10000;
+    std::size_t pushStreamsPerAccount = 8;
+    std::int64_t pushKeepAlive = 25;
 };
 
 } // namespace pelliko::server

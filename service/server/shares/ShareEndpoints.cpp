@@ -98,8 +98,9 @@ Task<void> finishShare(Exchange &exchange, Context &context, std::string key)
         break;
     }
     context.wakeSweeper();
+    context.announcePushes(result.pushed);
     co_await exchange.respond(
-        jsonResponse(Status::ok, finishedJson(result.share, context.publicUrl + "/s/" + token)));
+        jsonResponse(Status::ok, finishedJson(result, context.publicUrl + "/s/" + token)));
 }
 
 Task<void> withdrawShare(Exchange &exchange, Context &context, std::string key)

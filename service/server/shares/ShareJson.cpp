@@ -135,12 +135,9 @@ std::string shareListJson(const std::vector<ShareRecord> &shares)
     return json{{"shares", std::move(records)}}.dump();
 }
 
-std::string finishedJson(const ShareRecord &share, const std::string &url)
+std::string finishedJson(const FinishResult &result, const std::string &url)
 {
-    json numbers = json::array();
-    for (const Recipient &recipient : share.recipients)
-        numbers.push_back(recipient.number);
-    return json{{"url", url}, {"expires", share.deadline}, {"sms", std::move(numbers)}}.dump();
+    return json{{"url", url}, {"expires", result.share.deadline}, {"sms", result.sms}}.dump();
 }
 
 } // namespace pelliko::server

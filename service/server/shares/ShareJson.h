@@ -26,6 +26,6 @@ struct ShareRequest {
 [[nodiscard]] std::string shareJson(const ShareRecord &share);
 [[nodiscard]] std::string shareListJson(const std::vector<ShareRecord> &shares);
 /// The answer to "finish".
-[[nodiscard]] std::string finishedJson(const ShareRecord &share, const std::string &url);
+[[nodiscard]] std::string finishedJson(const FinishResult &result, const std::string &url);
 
 } // namespace pelliko::server

@@ -129,6 +129,31 @@ struct FinishResult {
     enum class Outcome { finished, missing, incomplete, gone };
     Outcome outcome = Outcome::missing;
     ShareRecord share;
+    /// Recipients without an account, each number once, in the share's order.
+    std::vector<std::string> sms;
+    /// Accounts that have a new push, each once.
+    std::vector<std::int64_t> pushed;
+};
+
+/// "Somebody shared this with you", waiting until its account acknowledges it.
+struct Push {
+    /// Grows within the account and is never used twice.
+    std::int64_t id = 0;
+    std::string contentToken;
+};
+
+/// How an account names a share that it received: by the push's id, or else by the hash of its
+/// content token.
+struct ReceivedKey {
+    std::int64_t push = 0;
+    std::string tokenHash;
+};
+
+/// A share as the account sees it that received it.
+struct ReceivedRecord {
+    std::int64_t push = 0;
+    std::string senderNumber;
+    ShareRecord share;
 };
 
 /// Which of these numbers have accounts, asked by an account that may ask for so many a day.
@@ -201,7 +226,8 @@ public:
                                                  Seconds now) = 0;
     /// Newest first.
     virtual std::vector<ShareRecord> listShares(std::int64_t account, Seconds now) = 0;
-    /// Ends the upload and replaces the link; `deadline` holds only for the first finish.
+    /// Ends the upload, replaces the link and makes a push for each account among the recipients
+    /// that has none for this share yet; `deadline` holds only for the first finish.
     virtual FinishResult finishShare(std::int64_t account, const std::string &key,
                                      const std::string &linkHash, Seconds now,
                                      Seconds deadline) = 0;
@@ -210,6 +236,21 @@ public:
     virtual std::optional<std::vector<std::string>>
     withdrawShare(std::int64_t account, const std::string &key, Seconds now) = 0;
     virtual std::optional<LinkRecord> findLink(const std::string &linkHash, Seconds now) = 0;
+
+    /// The account's oldest pushes that wait, with ids greater than `after`, some of them; an
+    /// `after` that was never given out counts as 0. Nothing when the token is no account's.
+    virtual std::optional<std::vector<Push>> waitingPushes(const std::string &tokenHash,
+                                                           std::int64_t after, Seconds now) = 0;
+    /// Ends the waiting of the pushes with ids of at most `upTo`; false when that was never given
+    /// out.
+    virtual bool acknowledgePushes(std::int64_t account, std::int64_t upTo) = 0;
+    /// Also shares that have ended, as long as they are remembered.
+    virtual std::optional<ReceivedRecord> findReceived(std::int64_t account, const ReceivedKey &key,
+                                                       Seconds now) = 0;
+    /// Newest first, without those that ended before their push was acknowledged.
+    virtual std::vector<ReceivedRecord> listReceived(std::int64_t account, Seconds now) = 0;
+    /// Hides a received share from its account; false when there is none. Forgetting again is true.
+    virtual bool forgetReceived(std::int64_t account, const ReceivedKey &key) = 0;
 
     virtual std::optional<UploadRecord> findUpload(std::int64_t account, const std::string &upload,
                                                    Seconds now) = 0;

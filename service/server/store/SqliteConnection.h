@@ -90,6 +90,13 @@ struct SqliteMetadata::Connection {
     /// Makes the share end in `state` at `now`; returns the keys of the blobs it had.
     std::vector<std::string> endShare(const ShareRow &share, ShareState state, Seconds now);
 
+    /// Sorts the share's recipients into those that get a push, which is made, and those of an SMS.
+    void tellRecipients(const ShareRow &share, FinishResult &result);
+    /// Makes the push unless the account has one for this share; true when it was made.
+    bool addPush(std::int64_t account, std::int64_t share);
+    /// The pushes of a share that has ended wait no more.
+    void dropPushes(std::int64_t share);
+
     RegisterResult redeem(const Registration &registration);
     bool repeat(const Registration &registration);
     bool makeOrRenew(const Registration &registration, bool renew);

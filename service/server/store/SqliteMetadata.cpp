@@ -94,8 +94,23 @@ CREATE TABLE redemptions (
 CREATE INDEX redemptions_by_account ON redemptions (account);
 )sql";
 
+// A push's plain token is kept while it waits; the hash stays, and tells what became of the share.
+constexpr const char *withPushes = R"sql(
+ALTER TABLE accounts ADD COLUMN last_push INTEGER NOT NULL DEFAULT 0;
+CREATE TABLE pushes (
+  account INTEGER NOT NULL REFERENCES accounts (id) ON DELETE CASCADE,
+  id INTEGER NOT NULL,
+  share INTEGER NOT NULL REFERENCES shares (id) ON DELETE CASCADE,
+  state INTEGER NOT NULL,
+  token TEXT,
+  token_hash BLOB NOT NULL UNIQUE,
+  PRIMARY KEY (account, id),
+  UNIQUE (share, account)) WITHOUT ROWID;
+CREATE INDEX pushes_waiting ON pushes (account, id) WHERE state = 0;
+)sql";
+
 /// The way from each version of the layout to the next; a fresh file goes all of it.
-constexpr std::array layouts{firstLayout, withEnds, withQuestions, withInvitations};
+constexpr std::array layouts{firstLayout, withEnds, withQuestions, withInvitations, withPushes};
 
 bool meansFull(int systemError)
 {

@@ -40,6 +40,14 @@ public:
     withdrawShare(std::int64_t account, const std::string &key, Seconds now) override;
     std::optional<LinkRecord> findLink(const std::string &linkHash, Seconds now) override;
 
+    std::optional<std::vector<Push>> waitingPushes(const std::string &tokenHash, std::int64_t after,
+                                                   Seconds now) override;
+    bool acknowledgePushes(std::int64_t account, std::int64_t upTo) override;
+    std::optional<ReceivedRecord> findReceived(std::int64_t account, const ReceivedKey &key,
+                                               Seconds now) override;
+    std::vector<ReceivedRecord> listReceived(std::int64_t account, Seconds now) override;
+    bool forgetReceived(std::int64_t account, const ReceivedKey &key) override;
+
     std::optional<UploadRecord> findUpload(std::int64_t account, const std::string &upload,
                                            Seconds now) override;
     bool recordOffset(const std::string &blob, std::uint64_t offset) override;

@@ -92,14 +92,14 @@ FinishResult SqliteMetadata::finishShare(std::int64_t account, const std::string
     return db.write([&]() -> FinishResult {
         std::optional<ShareRow> share = db.findShare(account, key, now);
         if (!share)
-            return {Outcome::missing, {}};
+            return {};
         ShareRecord &record = share->record;
         const bool first = record.state == ShareState::uploading;
         if (!first && record.state != ShareState::finished)
-            return {Outcome::gone, std::move(record)};
+            return {Outcome::gone, std::move(record), {}, {}};
         for (const FileRecord &file : record.files) {
             if (!file.complete())
-                return {Outcome::incomplete, std::move(record)};
+                return {Outcome::incomplete, std::move(record), {}, {}};
         }
         if (first)
             record.deadline = deadline;
@@ -107,7 +107,10 @@ FinishResult SqliteMetadata::finishShare(std::int64_t account, const std::string
         db.query("UPDATE shares SET state = ?, deadline = ?, link_hash = ? WHERE id = ?",
                  static_cast<int>(record.state), record.deadline, Bytes{linkHash}, share->id)
             .run();
-        return {Outcome::finished, std::move(record)};
+        FinishResult result{Outcome::finished, {}, {}, {}};
+        db.tellRecipients(*share, result);
+        result.share = std::move(record);
+        return result;
     });
 }
 
@@ -126,6 +129,7 @@ std::vector<std::string> SqliteMetadata::Connection::endShare(const ShareRow &sh
           share.id)
         .run();
     query("UPDATE files SET blob = NULL WHERE share = ?", share.id).run();
+    dropPushes(share.id);
     query("UPDATE shares SET state = ?, ended = ? WHERE id = ?", static_cast<int>(state), now,
           share.id)
         .run();

@@ -95,7 +95,8 @@ TEST(SqliteMetadata, AFileOfTheFirstLayoutIsTakenOver)
         metadata.withdrawShare(share.account, key, 1100);
     }
     SQLite::Database(database().string(), SQLite::OPEN_READWRITE)
-        .exec("DROP TABLE redemptions; DROP TABLE invitations; DROP TABLE questions;"
+        .exec("DROP TABLE pushes; ALTER TABLE accounts DROP COLUMN last_push;"
+              "DROP TABLE redemptions; DROP TABLE invitations; DROP TABLE questions;"
               "DROP INDEX shares_by_end; ALTER TABLE shares DROP COLUMN ended;"
               "PRAGMA user_version = 1");
     SqliteMetadata metadata(database());
@@ -108,6 +109,9 @@ TEST(SqliteMetadata, AFileOfTheFirstLayoutIsTakenOver)
     EXPECT_EQ(
         metadata.registerAccount({std::string(32, 'c'), "+491", std::string(32, 'n'), "k", 1500}),
         RegisterResult::registered);
+    EXPECT_FALSE(metadata.acknowledgePushes(account, 1));
+    EXPECT_TRUE(metadata.waitingPushes(std::string(32, 'n'), 0, 1500)->empty());
+    EXPECT_TRUE(metadata.listReceived(account, 1500).empty());
 }
 
 TEST(DirectoryBlobs, AFullStoreIsToldFromABrokenOne)
