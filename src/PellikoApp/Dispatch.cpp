@@ -7,6 +7,7 @@
 #include "PellikoApp/SmsSender.h"
 #include "PellikoApp/TextArray.h"
 #include "PellikoApp/Window.h"
+#include "PellikoUploadingDataManager/PressedNotification.h"
 
 #include <cstring>
 #include <pelliko_operations.h>
@@ -111,6 +112,16 @@ Next _onSendText(const Launch &launch, PellikoAppData *ad)
     return Next::run;
 }
 
+Next _onNotiPressed(const Launch &launch, PellikoAppData *ad)
+{
+    ensureMainWindow(launch.app, ad);
+    ad->operation_type = OPERATION_UPLOADING_NOTI_PRESSED;
+    LOG_DEBUG("Upload noti pressed !!");
+    is_noti_pressed = 1;
+    getUploadData(launch.request);
+    return Next::run;
+}
+
 Next _onDefault(const Launch &launch, PellikoAppData *ad)
 {
     ad->operation_type = OPERATION_DEFAULT;
@@ -159,6 +170,7 @@ constexpr OperationRow operations[] = {
     {APP_CONTROL_OPERATION_SHARE_TEXT, _onShareText},
     {APP_CONTROL_OPERATION_MULTI_SHARE, _onMultiShare},
     {APP_CONTROL_OPERATION_SEND_TEXT, _onSendText},
+    {APP_CONTROL_OPERATION_UPLOADING_NOTI_PRESSED, _onNotiPressed},
     {APP_CONTROL_OPERATION_DEFAULT, _onDefault},
     {APP_CONTROL_OPERATION_DEREGISTERED, _onDeregistered},
     {APP_CONTROL_OPERATION_SERVICE_OFF, _onServiceOff},

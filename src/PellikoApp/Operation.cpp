@@ -132,6 +132,14 @@ void _doShare(PellikoAppData *ad)
         bypassContactView(ad);
 }
 
+void _doNotiPressed(PellikoAppData *ad)
+{
+    LOG_DEBUG("Uploading noti pressed");
+    popup_update_enabled = 0;
+    reopenPopupView(ad);
+    popup_update_enabled = 1;
+}
+
 } // namespace
 
 void doOperation(PellikoAppData *ad)
@@ -150,6 +158,9 @@ void doOperation(PellikoAppData *ad)
     case OPERATION_SHARE:
     case OPERATION_MULTI_SHARE:
         _doShare(ad);
+        break;
+    case OPERATION_UPLOADING_NOTI_PRESSED:
+        _doNotiPressed(ad);
         break;
     default:
         break;

@@ -19,6 +19,7 @@ constexpr const char *applicationId = "com.velmora.pelliko";
 enum NotificationState : int {
     NOTI_STATE_PREPARING = 0,
     NOTI_STATE_PAUSED = 1,
+    NOTI_STATE_PAUSED_BY_SERVICE = 2, ///< read like "paused"; no notification carries it
     NOTI_STATE_SENDING = 3,
     NOTI_STATE_CANCELLED = 4, ///< of the status popup only
     NOTI_STATE_NOTIFYING = 5,

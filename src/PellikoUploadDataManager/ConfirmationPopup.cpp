@@ -5,11 +5,14 @@
 #include "PellikoApp/TextFormat.h"
 #include "PellikoApp/ThemeLayout.h"
 #include "PellikoApp/Window.h"
+#include "PellikoNotificationManager/NotificationPrimitives.h"
 #include "PellikoUploadDataManager/ConfirmationContents.h"
 #include "PellikoUploadDataManager/Recipients.h"
 #include "PellikoUploadDataManager/UploadAction.h"
 #include "PellikoUploadDataManager/UploadNotiData.h"
 #include "PellikoUploadManager/ExitPolicy.h"
+#include "PellikoUploadingDataManager/PressedNotification.h"
+#include "PellikoUploadingDataManager/StatusPopup.h"
 
 #include <Elementary.h>
 #include <efl_assist.h>
@@ -26,6 +29,7 @@ constexpr const char *domain = "pelliko";
 constexpr const char *popupStyle = "pelliko";
 
 int32_t g_total_recipients = 0;
+int g_status_check = 0;     ///< presses of the check box while a tapped upload is in hand
 int g_wifi_check_state = 0; ///< what the check box starts with when the popup is built again
 
 void _deletePopup(PellikoAppData *ad)
@@ -79,7 +83,14 @@ void _checkAreaSelectedCb(void *data, Evas_Object *, const char *, const char *)
 {
     auto *ad = static_cast<PellikoAppData *>(data);
     RETURN_IF_NULL(ad, "data is NULL");
-    _toggleWifiOnly(ad);
+    if (ad->operation_type != OPERATION_UPLOADING_NOTI_PRESSED) {
+        _toggleWifiOnly(ad);
+        return;
+    }
+    // An upload that has begun keeps the way it was told to take.
+    g_status_check = g_status_check ? 0 : 1;
+    LOG_DEBUG("request_id = %d", static_cast<int32_t>(g_noti_press_data.upload_request_id));
+    elm_check_state_set(ad->wifi_check_box, ad->wifi_check);
 }
 
 // The box itself is reached by the keyboard and by assistive programs only.
@@ -88,11 +99,32 @@ void _checkBoxChangedCb(void *data, Evas_Object *, void *)
     _toggleWifiOnly(static_cast<PellikoAppData *>(data));
 }
 
+// An upload that goes on needs the process; one that has ended does not.
+void _leaveStatusPopup(PellikoAppData *ad)
+{
+    switch (g_noti_press_data.upload_status) {
+    case NOTI_STATE_PREPARING:
+    case NOTI_STATE_PAUSED:
+    case NOTI_STATE_PAUSED_BY_SERVICE:
+    case NOTI_STATE_SENDING:
+    case NOTI_STATE_NOTIFYING:
+        _hideWindow(ad);
+        break;
+    default:
+        safeExit();
+        break;
+    }
+}
+
 void _uploadConfirmViewBackBtnCb(void *data, Evas_Object *, void *)
 {
     auto *ad = static_cast<PellikoAppData *>(data);
     RETURN_IF_NULL(ad, "data is NULL");
     _deletePopup(ad);
+    if (ad->operation_type == OPERATION_UPLOADING_NOTI_PRESSED) {
+        _leaveStatusPopup(ad);
+        return;
+    }
     const UploadNotiData *node =
         ad->upload_item ? getUploadNotiDataNode(ad->upload_item->request_id) : nullptr;
     if (!node || node->upload_status != PELLIKO_UPLOAD_STATUS_SHARE_FINISHED)
@@ -113,7 +145,8 @@ void _rotationChangedPopupCb(void *data, Evas_Object *, void *)
     RETURN_IF_NULL(ad, "data is NULL");
     LOG_DEBUG("ad->wifi_check = %d", ad->wifi_check);
     g_wifi_check_state = ad->wifi_check != 0;
-    if (ad->popup)
+    // A status popup finds its place by itself, and must not fall back to what was tapped.
+    if (ad->popup && !isStatusPopup(ad))
         _createPopupView(ad);
 }
 
@@ -140,13 +173,18 @@ Evas_Object *_addPopup(PellikoAppData *ad)
     ea_object_event_callback_add(popup, EA_CALLBACK_BACK, _uploadConfirmViewBackBtnCb, ad);
     elm_popup_align_set(popup, ELM_NOTIFY_ALIGN_FILL, 1.0);
     evas_object_size_hint_weight_set(popup, EVAS_HINT_EXPAND, EVAS_HINT_EXPAND);
-    elm_object_domain_translatable_part_text_set(popup, "title,text", domain,
-                                                 "IDS_RSH_HEADER_SHARE_FILES_VIA_PELLIKO_ABB");
+    elm_object_domain_translatable_part_text_set(
+        popup, "title,text", domain,
+        ad->operation_type == OPERATION_UPLOADING_NOTI_PRESSED
+            ? "IDS_RSH_HEADER_SHARE_FILES_ABB"
+            : "IDS_RSH_HEADER_SHARE_FILES_VIA_PELLIKO_ABB");
     return popup;
 }
 
 const char *_layoutGroup(const PellikoAppData *ad)
 {
+    if (ad->operation_type == OPERATION_UPLOADING_NOTI_PRESSED)
+        return statusPopupGroup();
     const bool single = g_total_recipients == 1;
     if (ad->action_type == ACTION_RESHARE_UPLOAD)
         return single ? "confirmation_popup_reshare_view_single"
@@ -158,6 +196,10 @@ const char *_layoutGroup(const PellikoAppData *ad)
 void _addLayout(PellikoAppData *ad)
 {
     const char *group = _layoutGroup(ad);
+    if (!group) {
+        keepWhileAlive(&ad->popup_layout, elm_layout_add(ad->popup));
+        return;
+    }
     LOG_DEBUG("Setting %s", group);
     keepWhileAlive(&ad->popup_layout, addThemeLayout(ad->popup, ad->theme, group));
 }
@@ -175,6 +217,10 @@ void _addButton(PellikoAppData *ad, const char *part, const char *style, const c
 
 void _addContentsToPopup(PellikoAppData *ad, Evas_Object *layout)
 {
+    if (ad->operation_type == OPERATION_UPLOADING_NOTI_PRESSED) {
+        addStatusContents(ad, _uploadConfirmViewBackBtnCb);
+        return;
+    }
     addConfirmationContents(ad, layout, g_wifi_check_state != 0);
     elm_layout_signal_callback_add(layout, "check,clicked", "*", _checkAreaSelectedCb, ad);
     evas_object_smart_callback_add(ad->wifi_check_box, "changed", _checkBoxChangedCb, ad);
@@ -193,7 +239,8 @@ void _showPopup(PellikoAppData *ad)
 
 bool _needsNoConfirmation(const PellikoAppData *ad)
 {
-    return ad->action_type != ACTION_RESHARE_UPLOAD && ad->upload_item &&
+    return ad->operation_type != OPERATION_UPLOADING_NOTI_PRESSED &&
+           ad->action_type != ACTION_RESHARE_UPLOAD && ad->upload_item &&
            ad->upload_item->files_size <= 0;
 }
 
@@ -229,6 +276,17 @@ void _createPopupView(PellikoAppData *ad)
     }
     LOG_DEBUG("6MB limit not exceeded. Bypassing Confirmation popup view");
     _leaveAfterAction(ad, _performAction(ad));
+}
+
+Evas_Object *reopenPopupView(PellikoAppData *ad)
+{
+    RETURN_VALUE_IF_NULL(ad, nullptr, "data is NULL");
+    if (is_noti_pressed == 1)
+        g_cancel_in_progress = 0;
+    g_wifi_check_state = 0;
+    _createPopupView(ad);
+    _listenToWindow(ad);
+    return ad->popup_layout;
 }
 
 void bypassContactView(PellikoAppData *ad)

@@ -3,6 +3,8 @@
 #include "PellikoApp/AppData.h"
 #include "PellikoApp/TextFormat.h"
 #include "PellikoUploadDataManager/ConfirmationContents.h"
+#include "PellikoUploadDataManager/RecipientsRow.h"
+#include "PellikoUploadingDataManager/StatusPopup.h"
 
 #include <Elementary.h>
 
@@ -25,7 +27,12 @@ void updatePopupLanguage(PellikoAppData *ad)
 {
     if (!ad || !ad->popup || !ad->popup_layout)
         return;
+    if (isStatusPopup(ad)) {
+        setStatusTexts(ad);
+        return;
+    }
     setConfirmationTexts(ad, ad->popup_layout);
+    addRecipientsFromUploadData(ad);
     _setButton(ad->popup, "button1", "IDS_RSH_BUTTON_CANCEL_ABB2");
     _setButton(ad->popup, "button2", "IDS_RSH_BUTTON_SHARE_ABB5");
 }

@@ -1,6 +1,7 @@
 #include "PellikoUploadDataManager/Recipients.h"
 
 #include "AppLog/AppLog.h"
+#include "PellikoUploadDataManager/ContactsRecord.h"
 
 #include <algorithm>
 #include <cerrno>
@@ -23,47 +24,6 @@ namespace
 constexpr const char *serviceAddressBook = "ZORP_Universal_Contact";
 constexpr size_t numberIdTextSize = 50;
 
-// A record of the contacts store, destroyed with its children.
-class Record
-{
-public:
-    Record() = default;
-    Record(const Record &) = delete;
-    Record &operator=(const Record &) = delete;
-    ~Record()
-    {
-        if (handle_)
-            contacts_record_destroy(handle_, true);
-    }
-
-    // False after logging the store's error.
-    bool read(const char *view, int id)
-    {
-        const int ct_ret = contacts_db_get_record(view, id, &handle_);
-        if (ct_ret != CONTACTS_ERROR_NONE)
-            LOG_ERROR("contacts_db_get_record is failed ct_ret = %d", ct_ret);
-        return ct_ret == CONTACTS_ERROR_NONE;
-    }
-
-    int number(unsigned int property) const
-    {
-        int value = 0;
-        contacts_record_get_int(handle_, property, &value);
-        return value;
-    }
-
-    // Borrowed from the record; may be null.
-    const char *text(unsigned int property) const
-    {
-        char *value = nullptr;
-        contacts_record_get_str_p(handle_, property, &value);
-        return value;
-    }
-
-private:
-    contacts_record_h handle_ = nullptr;
-};
-
 // What the loop over the ids does after one of them.
 enum class Step { next, stop };
 
@@ -72,14 +32,14 @@ struct GFree {
 };
 
 struct RecipientRecords {
-    Record number;
-    Record contact;
-    Record person;
+    ContactsRecord number;
+    ContactsRecord contact;
+    ContactsRecord person;
     std::unique_ptr<char, GFree> number_text;
 };
 
 // The number without formatting characters, as a copy.
-char *_readNumber(const Record &record)
+char *_readNumber(const ContactsRecord &record)
 {
     const char *stored = record.text(_contacts_number.number);
     char *normalized = _makeNormalizedNumber(stored);

@@ -64,9 +64,9 @@ Evas_Object *_addDefaultImage(Evas_Object *item)
     return image;
 }
 
-void _setPicture(Evas_Object *item, const UploadRecipient &recipient)
+void _setPicture(Evas_Object *item, const RowPerson &person)
 {
-    Evas_Object *image = _addPersonImage(item, recipient.image_path);
+    Evas_Object *image = _addPersonImage(item, person.image_path);
     if (!image)
         image = _addDefaultImage(item);
     if (image)
@@ -90,13 +90,12 @@ void _setBadge(Evas_Object *item)
     elm_object_signal_emit(item, "pelliko,badge,shown", "pelliko");
 }
 
-Evas_Object *_addRecipient(Evas_Object *box, PellikoAppData *ad, const UploadRecipient &recipient)
+Evas_Object *_addPerson(Evas_Object *box, PellikoAppData *ad, const RowPerson &person)
 {
-    LOG_DEBUG("Adding recipient- name = %s", textOrNull(recipient.name));
     Evas_Object *item = addThemeLayout(box, ad->theme, "1icon.1text.remoteshare");
-    elm_object_part_text_set(item, "elm.text", recipient.name ? recipient.name : "");
-    _setPicture(item, recipient);
-    if (recipient.is_sms == 1)
+    elm_object_part_text_set(item, "elm.text", person.name ? person.name : "");
+    _setPicture(item, person);
+    if (person.by_sms)
         _setBadge(item);
     elm_object_signal_emit(item, "elm,state,disabled", "elm");
     evas_object_show(item);
@@ -116,11 +115,11 @@ Evas_Object *_addScroller(Evas_Object *parent, Elm_Theme *theme)
     return scroller;
 }
 
-Evas_Object *_addBox(Evas_Object *scroller)
+Evas_Object *_addBox(Evas_Object *scroller, RowCells cells)
 {
     Evas_Object *box = elm_box_add(scroller);
     elm_box_horizontal_set(box, EINA_TRUE);
-    elm_box_homogeneous_set(box, EINA_FALSE);
+    elm_box_homogeneous_set(box, cells == RowCells::equal);
     evas_object_size_hint_weight_set(box, EVAS_HINT_EXPAND, EVAS_HINT_EXPAND);
     evas_object_size_hint_align_set(box, EVAS_HINT_FILL, EVAS_HINT_FILL);
     elm_box_align_set(box, 0.5, 0.0);
@@ -130,21 +129,30 @@ Evas_Object *_addBox(Evas_Object *scroller)
 
 } // namespace
 
+void putRecipientsRow(PellikoAppData *ad, const std::vector<RowPerson> &people, RowCells cells)
+{
+    Evas_Object *layout = addThemeLayout(ad->popup_layout, ad->theme, "scroller.swallow");
+    Evas_Object *scroller = _addScroller(layout, ad->theme);
+    Evas_Object *box = _addBox(scroller, cells);
+    for (const RowPerson &person : people)
+        elm_box_pack_end(box, _addPerson(box, ad, person));
+    elm_object_part_content_set(layout, "elm.swallow.content", scroller);
+    // A content that takes an occupied place deletes the one before it.
+    elm_object_part_content_set(ad->popup_layout, rowPart, layout);
+}
+
 void addRecipientsFromUploadData(PellikoAppData *ad)
 {
     if (!ad || !ad->popup_layout || !ad->upload_item)
         return;
-    Evas_Object *layout = addThemeLayout(ad->popup_layout, ad->theme, "scroller.swallow");
-    Evas_Object *scroller = _addScroller(layout, ad->theme);
-    Evas_Object *box = _addBox(scroller);
+    std::vector<RowPerson> people;
     for (const Eina_List *node = ad->upload_item->recipient_list; node;
          node = eina_list_next(node)) {
         const auto *recipient = static_cast<const UploadRecipient *>(eina_list_data_get(node));
-        elm_box_pack_end(box, _addRecipient(box, ad, *recipient));
+        LOG_DEBUG("Adding recipient- name = %s", textOrNull(recipient->name));
+        people.push_back({recipient->name, recipient->image_path, recipient->is_sms == 1});
     }
-    elm_object_part_content_set(layout, "elm.swallow.content", scroller);
-    // A content that takes an occupied place deletes the one before it.
-    elm_object_part_content_set(ad->popup_layout, rowPart, layout);
+    putRecipientsRow(ad, people, RowCells::by_name);
 }
 
 } // namespace pelliko

@@ -219,6 +219,7 @@ void uploadResponseStatusCb(int status, const char *input_param, int progress_pe
     LOG_DEBUG("Percentage : %d", progress_percent);
     LOG_DEBUG("expired_time : %lld", static_cast<long long>(expired_time));
     g_current_node->upload_status = status;
+    notePopupDataRequest(request_id);
     if (error_code != 0) {
         _handleError(ad, status, error_code, request_id);
         return;

@@ -8,11 +8,14 @@
 #include "PellikoUploadDataManager/UploadNotiData.h"
 #include "PellikoUploadManager/ExitPolicy.h"
 #include "PellikoUploadManager/PeriodClock.h"
+#include "PellikoUploadingDataManager/PressedNotification.h"
+#include "PellikoUploadingDataManager/StatusPopup.h"
 
 #include <app_preference.h>
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <optional>
 
 namespace pelliko
 {
@@ -21,6 +24,9 @@ namespace
 {
 
 constexpr size_t popupDataSize = 20; ///< bytes of the hand-over text with its terminator
+
+std::optional<int> reportedRequest;   ///< whose report is being handled
+std::optional<int> handedOverRequest; ///< whose report the text in the store is
 
 struct PopupData {
     int status = 0;
@@ -64,6 +70,12 @@ CText _readPopupData()
         LOG_ERROR("Error in getting PREFERENCE KEY SHARE_UPDATE_POPUP_DATA");
     }
     return nullptr;
+}
+
+bool _isAboutPressed()
+{
+    return !handedOverRequest ||
+           *handedOverRequest == static_cast<int32_t>(g_noti_press_data.upload_request_id);
 }
 
 // Missing pieces read as zero.
@@ -135,6 +147,11 @@ void _updateUploadedData()
                   static_cast<long>(total));
 }
 
+void notePopupDataRequest(int request_id)
+{
+    reportedRequest = request_id;
+}
+
 void _updatePopupPreference(int status, double progress_percent, int error_code)
 {
     _logPopupData({status, progress_percent, error_code});
@@ -148,6 +165,7 @@ void _updatePopupPreference(int status, double progress_percent, int error_code)
         snprintf(text, sizeof(text), "%d+%f+%d", status, progress_percent, error_code);
     }
     LOG_DEBUG("new update_popup_data = %s", text);
+    handedOverRequest = reportedRequest;
     if (preference_set_string(updatePopupDataKey, text) == PREFERENCE_ERROR_NONE)
         LOG_DEBUG("PREFERENCE KEY SHARE_UPDATE_POPUP_DATA updated.");
     else
@@ -162,7 +180,10 @@ void _popupDataPreferenceUpdatedCb(const char * /*key*/, void * /*user_data*/)
                   "updated.");
     const CText text(value);
     LOG_DEBUG("update_popup_data = %s", textOrNull(text.get()));
-    _logPopupData(_parsePopupData(text.get()));
+    const PopupData data = _parsePopupData(text.get());
+    _logPopupData(data);
+    if (_isAboutPressed())
+        updatePopupStatus(data.status, data.progress_percent, data.error_code);
 }
 
 void _preferenceUpdatedCb(const char * /*key*/, void * /*user_data*/)

@@ -26,12 +26,17 @@ void _updateTimestamp();
 /// Adds the total size of g_current_node to the bytes of the period; the sum wraps at 32 bits.
 void _updateUploadedData();
 
+/// Tells whose reports are handed over from here on. Reports about the end of an upload are handed
+/// over whichever upload it is, and the status popup must not take another's for its own.
+void notePopupDataRequest(int request_id);
+
 /// Hands a status to the uploading-status popup through the preference store.
 /// @param status PellikoUploadStatus
 /// @param progress_percent 0 to 100
 void _updatePopupPreference(int status, double progress_percent, int error_code);
 
-/// Called on the main loop for every set of updatePopupDataKey.
+/// Called on the main loop for every set of updatePopupDataKey: updates the status popup when the
+/// text is about its upload.
 void _popupDataPreferenceUpdatedCb(const char *key, void *user_data);
 
 /// Called on the main loop for every set of shareSmsDoneKey: the first of "upload ended" and
