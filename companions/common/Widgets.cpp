@@ -85,6 +85,24 @@ void setText(Evas_Object *label, const std::string &words)
     setAccessibleName(label, words.c_str());
 }
 
+Evas_Object *addPlace(Evas_Object *box)
+{
+    Evas_Object *place = elm_box_add(box);
+    append(box, place);
+    return place;
+}
+
+void setPlaceText(Evas_Object *place, const char *style, const std::string &words)
+{
+    Eina_List *children = elm_box_children_get(place);
+    auto *label = static_cast<Evas_Object *>(eina_list_data_get(children));
+    eina_list_free(children);
+    if (words.empty())
+        elm_box_clear(place);
+    else
+        setText(label ? label : addText(place, style, ""), words);
+}
+
 Evas_Object *addButton(Evas_Object *box, const char *style, const char *text, Evas_Smart_Cb pressed,
                        void *data)
 {
@@ -114,6 +132,15 @@ Evas_Object *addProgress(Evas_Object *box, const char *name)
     append(box, progress);
     evas_object_hide(progress);
     return progress;
+}
+
+Evas_Object *addBar(Evas_Object *box, const char *name)
+{
+    Evas_Object *bar = elm_progressbar_add(box);
+    elm_object_style_set(bar, "companion");
+    setAccessibleName(bar, name);
+    append(box, bar);
+    return bar;
 }
 
 void setBusy(Evas_Object *progress, bool busy)

@@ -18,6 +18,11 @@ Evas_Object *addText(Evas_Object *box, const char *style, const char *text);
 /// Gives a label other words, which are not translated again.
 void setText(Evas_Object *label, const std::string &words);
 
+/// A place for words that are not always there: without them it has no height.
+Evas_Object *addPlace(Evas_Object *box);
+/// Words for a place, which are not translated again; none for none. `style` as of addText().
+void setPlaceText(Evas_Object *place, const char *style, const std::string &words);
+
 /// `style` is "popup/primary" for what goes on, "popup" for what goes back.
 Evas_Object *addButton(Evas_Object *box, const char *style, const char *text, Evas_Smart_Cb pressed,
                        void *data);
@@ -29,6 +34,10 @@ Evas_Object *addRow(Evas_Object *box);
 /// @param name what assistive programs call it
 Evas_Object *addProgress(Evas_Object *box, const char *name);
 void setBusy(Evas_Object *progress, bool busy);
+
+/// A bar that shows how far something is, 0.0 to 1.0 (elm_progressbar_value_set()).
+/// @param name what assistive programs call it
+Evas_Object *addBar(Evas_Object *box, const char *name);
 
 /// A window with one column of parts that scrolls when it is too long and is never wider than is
 /// good to read. The window is deleted by its owner.

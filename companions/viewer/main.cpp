@@ -1,0 +1,7 @@
+#include "ViewerApp.h"
+
+int main(int argc, char **argv)
+{
+    pelliko::viewer::ViewerApp app;
+    return app.start(argc, argv);
+}
