@@ -82,6 +82,22 @@ class Usage(share_case.ShareCase):
         self.application.wait_gone()
         self.assertEqual([], self.features())
 
+    def test_an_upload_that_is_taken_back(self):
+        world.stop_service()
+        world.activation_environment(PELLIKO_UPLOAD_RATE="1000000")
+        self.addCleanup(world.activation_environment, PELLIKO_UPLOAD_RATE="0")
+        self.addCleanup(world.stop_service)
+        world.share([self.file("film.mp4", share_case.random_bytes(40_000_000))], [self.ann])
+        self.confirm()
+        world.wait_for(lambda: any(i["progress"] > 0 for i in self.posted(event="update")), "some progress")
+        world.run("quickpanel-tool", "tap", "--app", world.APP, str(world.requests()[-1]["id"]))
+        screen.press("Cancel", "button")
+        self.panel.wait(lambda _items: self.posted(event="delete"), "the notification to go")
+        screen.press("OK", "button")
+        self.application.wait_gone()
+        self.assertEqual(["PK01", "PK02 Recent_personal", "PK03 Video", "PK05 1_10", "PK06 0_100MB", "PK08"],
+                         self.features())
+
     def test_nothing_is_collected_while_it_is_switched_off(self):
         world.run("velmora-log", "off")
         self.addCleanup(world.run, "velmora-log", "on")

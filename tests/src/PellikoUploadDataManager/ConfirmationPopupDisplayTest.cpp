@@ -165,6 +165,28 @@ TEST_F(ConfirmationPopup, LanguageChangeRetextsTheOpenPopup)
     EXPECT_STREQ(elm_object_text_get(button("button2")), "Teilen");
 }
 
+TEST_F(ConfirmationPopup, LanguageChangeRetextsEveryVariant)
+{
+    const std::vector<std::vector<test::Person>> people = {{{"Ann"}}, {{"Ann"}, {"Bo", true}}};
+    for (const int action : {ACTION_UPLOAD, ACTION_RESHARE_UPLOAD}) {
+        for (const auto &recipients : people) {
+            ad->action_type = action;
+            share(2, 1500000, recipients);
+            openPopup();
+            speak("de_DE.UTF-8");
+            EXPECT_EQ(layoutText("elm.text"), "Nur über WLAN teilen");
+            EXPECT_STREQ(elm_object_text_get(button("button1")), "Abbrechen");
+            EXPECT_STREQ(elm_object_text_get(button("button2")), "Teilen");
+            if (recipients.size() == 1)
+                EXPECT_EQ(layoutText("elm.text.info"), "2 Dateien <br>(1,43MB)");
+            else
+                EXPECT_EQ(layoutText("elm.swallow.label.text"), "Empfänger (2)");
+            EXPECT_THAT(body(), HasSubstr(action == ACTION_UPLOAD ? "WLAN" : "Server"));
+            speak("en_GB.UTF-8");
+        }
+    }
+}
+
 TEST_F(ConfirmationPopup, WholeRowOfTheCheckBoxAnswersToThePointer)
 {
     share(1, 1500, {{"Anna"}});

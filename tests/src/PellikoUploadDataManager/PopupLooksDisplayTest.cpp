@@ -2,6 +2,7 @@
 #include "PellikoUploadDataManager/ConfirmationPopup.h"
 
 #include "PellikoApp/ContactVcard.h"
+#include "PellikoUploadingDataManager/PressedNotification.h"
 #include "support/PopupScene.h"
 
 #include <algorithm>
@@ -245,6 +246,52 @@ TEST_P(PopupLooks, ProcessingContacts)
     evas_object_del(ad->processing_popup);
 }
 
+class StatusLooks : public PopupLooks
+{
+protected:
+    ~StatusLooks() override { g_noti_press_data = {}; }
+
+    void openStatus(const std::string &name, int state, std::vector<std::string> recipients)
+    {
+        g_noti_press_data = {};
+        g_noti_press_data.recipient_count = std::to_string(recipients.size());
+        g_noti_press_data.upload_status = state;
+        g_noti_press_data.total_files = 100;
+        g_noti_press_data.total_size = 1000 << 20;
+        g_noti_press_data.recipients = std::move(recipients);
+        ad->operation_type = OPERATION_UPLOADING_NOTI_PRESSED;
+        _createPopupView(ad);
+        const Evas_Object *ok = elm_object_part_content_get(button("button1"), "ok_button");
+        ASSERT_TRUE(settle(ok));
+        photograph("looks-status-" + name + "-" + size);
+        expectWholeTitle();
+        expectWholeLine(ok, "elm.text");
+        expectWholeBlock(part(ad->popup_layout, "elm.swallow.text"), "status line");
+    }
+};
+
+TEST_P(StatusLooks, SendingInGermanToOne)
+{
+    speak("de_DE.UTF-8");
+    openStatus("sending", 3, {std::string(longName) + "+SMS"});
+    expectWholeLine(ad->popup_layout, "elm.swallow.text.bottom.left");
+    const Evas_Object *label = part(ad->cancel_button, "elm.text");
+    EXPECT_LE(naturalWidth(label), boxOf(label).width);
+    const Box bar = boxOf(ad->progressbar), cancel = boxOf(ad->cancel_button);
+    EXPECT_LE(bar.x + bar.width, cancel.x);
+    EXPECT_GT(bar.width, 2 * cancel.width / 3);
+    expectInside(ad->cancel_button, "cancel");
+}
+
+TEST_P(StatusLooks, LongestEndInGermanToTen)
+{
+    speak("de_DE.UTF-8");
+    openStatus("failed", 9, std::vector<std::string>(10, std::string(longName) + "+SMS"));
+    EXPECT_EQ(items().size(), 10U);
+    expectWholeLine(ad->popup_layout, "elm.swallow.label.text");
+}
+
+INSTANTIATE_TEST_SUITE_P(TextSizes, StatusLooks, ::testing::Values(1.0, 1.3));
 INSTANTIATE_TEST_SUITE_P(TextSizes, PopupLooks, ::testing::Values(1.0, 1.3));
 
 } // namespace
