@@ -1,6 +1,7 @@
 #include "ListRow.h"
 
 #include "AccessibleName.h"
+#include "Icons.h"
 #include "Widgets.h"
 
 namespace pelliko::companion
@@ -10,9 +11,11 @@ namespace
 
 void addIcon(Evas_Object *row, const char *name)
 {
-    Evas_Object *icon = elm_icon_add(row);
-    if (!elm_icon_standard_set(icon, name))
-        elm_icon_standard_set(icon, "text-x-generic");
+    const std::string file = iconFile(name);
+    if (file.empty())
+        return;
+    Evas_Object *icon = elm_image_add(row);
+    elm_image_file_set(icon, file.c_str(), nullptr);
     elm_object_part_content_set(row, "icon", icon);
 }
 

@@ -6,7 +6,6 @@
 #include <dlog.h>
 #include <uxt_theme.h>
 
-#include <cstring>
 #include <string>
 #include <unistd.h>
 
@@ -24,19 +23,10 @@ void extendTheme(const std::string &file)
     elm_theme_extension_add(nullptr, file.c_str());
 }
 
-// The toolkit starts with the theme that is for applications' own icons and has none for files.
-void useIcons()
-{
-    const char *theme = elm_config_icon_theme_get();
-    if (!theme || !*theme || std::strcmp(theme, "hicolor") == 0)
-        elm_config_icon_theme_set("Adwaita");
-}
-
 } // namespace
 
 void useTheme()
 {
-    useIcons();
     const CText resources(app_get_resource_path());
     const CText shared(app_get_shared_resource_path());
     if (!resources || !shared)

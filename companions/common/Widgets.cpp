@@ -157,6 +157,8 @@ Page addPage(const char *name, const char *title, double align)
     Page page;
     page.window = elm_win_add(nullptr, name, ELM_WIN_BASIC);
     elm_win_title_set(page.window, translated(title));
+    elm_win_focus_highlight_enabled_set(page.window, EINA_TRUE);
+    elm_win_focus_highlight_style_set(page.window, "companion");
     addGround(page.window);
     page.scroller = addScroller(page.window);
     Evas_Object *middle = elm_box_add(page.window);

@@ -1,0 +1,176 @@
+"""The history and the viewer on a real service and a real share server: what they show is what a recipient finds."""
+
+import json
+import os
+import subprocess
+import unittest
+import urllib.error
+import urllib.request
+
+import share_case
+import screen
+import world
+
+HISTORY, VIEWER = "com.velmora.pelliko-history", "com.velmora.pelliko-viewer"
+SERVER = os.environ["PELLIKO_SERVER_URL"]
+SERVER_DATA = os.path.join(os.environ["PELLIKO_STATE"], "server")
+OWN_NUMBER = "+447700900100"
+DOWNLOADS = os.path.join(os.environ["HOME"], "Downloads")
+UNREACHABLE = "The share server cannot be reached. Check your connection and try again."
+
+
+class Sender:
+    """Somebody else with an account at the same server."""
+
+    def __init__(self, number):
+        self.token = world.run("pelliko-server", "account", "add", "--data", SERVER_DATA, "--number", number).strip()
+
+    def _call(self, method, path, body=b"", **headers):
+        request = urllib.request.Request(SERVER + path, data=body or None, method=method)
+        request.add_header("Authorization", "Bearer " + self.token)
+        for name, value in headers.items():
+            request.add_header(name.replace("_", "-"), value)
+        with urllib.request.urlopen(request, timeout=world.LIMIT) as answer:
+            text = answer.read()
+        return json.loads(text) if text else None
+
+    def share(self, files, key):
+        """Shares {name: bytes} with the user of this world and returns the share's name."""
+        record = self._call("POST", "/api/v1/shares", json.dumps(
+            {"files": [{"name": name, "size": len(data)} for name, data in files.items()],
+             "recipients": [{"number": OWN_NUMBER, "ccc": "44"}]}).encode(), Idempotency_Key=key)
+        for file in record["files"]:
+            self._call("PATCH", file["upload"], files[file["name"]], Tus_Resumable="1.0.0", Upload_Offset="0",
+                       Content_Type="application/offset+octet-stream")
+        self._call("POST", f"/api/v1/shares/{record['share']}/finish")
+        return record["share"]
+
+    def withdraw(self, share):
+        self._call("DELETE", f"/api/v1/shares/{share}")
+
+
+class CompanionsCase(share_case.ShareCase):
+    def setUp(self):
+        super().setUp()
+        self.companions = [world.BusName(HISTORY), world.BusName(VIEWER)]
+        self.addCleanup(self._end_companions)
+
+    def _end_companions(self):
+        for program in self.companions:
+            if program.owner:
+                os.kill(program.process_id(), 9)
+                program.wait_gone()
+
+    @staticmethod
+    def row(start):
+        return world.wait_for(lambda: next((name for name, role, _, _ in screen.controls()
+                                            if name.startswith(start) and "button" in role), None), f"a row “{start}”")
+
+
+class SentShares(CompanionsCase):
+    def share_one(self, name, data, person):
+        path = self.file(name, data)
+        world.share([path], [person])
+        self.confirm()
+        self.wait_sent_and_gone()
+        return self.messages(1)[0]
+
+    def test_a_withdrawn_share_is_gone_for_its_recipient(self):
+        data = share_case.random_bytes(30_000)
+        message = self.share_one("plan.pdf", data, world.add_contact("Ann Example", "+44 7700 900123"))
+        self.assert_downloads_equal(message, {"plan.pdf": data})
+        world.launch("default", app=HISTORY)
+        screen.press(self.row("Ann Example, 1 file, 30.0 kB, Available until "))
+        screen.press("Withdraw", "button")
+        screen.wait_for_control("No, go back", "button")
+        screen.press("Withdraw", "button")
+        screen.wait_for_control("Withdrawn")
+        with self.assertRaises(urllib.error.HTTPError) as refused:
+            urllib.request.urlopen(world.link_in(message["text"]), timeout=world.LIMIT)
+        self.assertEqual(410, refused.exception.code)
+        self.assertIn("withdrawn", refused.exception.read().decode())
+        self.picture("withdrawn")
+
+    def test_a_share_goes_again_to_somebody_from_the_contacts(self):
+        data = share_case.random_bytes(200_000)
+        cem = world.add_contact("Cem Example", "+44 7700 900777")
+        world.add_contact("Dora Example", "+44 7700 900888")
+        first = self.share_one("album.jpg", data, cem)
+        world.launch("default", app=HISTORY)
+        screen.press(self.row("Cem Example, 1 file, 200.0 kB, Available until "))
+        screen.press("Share again", "button")
+        screen.press("Dora Example, +44 7700 900888", "button")
+        screen.press("Share", "button")
+        screen.wait_for_control("Cancel", "button")  # the application asks
+        self.application.wait_here()
+        world.wait_for(lambda: len([1 for name, role, _, on in screen.controls() if name == "Share"]) > 0, "the popup")
+        screen.press("Share", "button")
+        self.outbox.wait(lambda lines: len(lines) - self.messages_before >= 2, "the second message")
+        self.application.wait_gone()
+        second = self.messages(2)[1]
+        self.assertEqual("+447700900888", second["to"])
+        self.assertNotEqual(world.link_in(first["text"]), world.link_in(second["text"]))
+        self.assert_downloads_equal(second, {"album.jpg": data})
+        self.row("Dora Example, 1 file, 200.0 kB, ")
+
+
+class ReceivedShares(CompanionsCase):
+    @classmethod
+    def setUpClass(cls):
+        world.add_contact("Sam Sender", "+44 7700 900555")
+        cls.sender = Sender("+447700900555")
+
+    def receive(self, files):
+        """Shares with this user and opens the viewer as the history's row does."""
+        share = self.sender.share(files, self._testMethodName)
+        world.requests()  # the service runs and listens
+        world.launch("view", "--extra", "view_type=received", "--extra", "remoteShare=remoteview", app=HISTORY)
+        many = "1 file" if len(files) == 1 else f"{len(files)} files"
+        screen.press(self.row(f"Sam Sender, {many}, "))
+        screen.press("Open", "button")
+        screen.wait_for_control("\u2068Sam Sender\u2069 shared with you")
+        return share
+
+    def saved(self):
+        return {name: world.sha256_of_file(os.path.join(DOWNLOADS, name)) for name in os.listdir(DOWNLOADS)}
+
+    def tearDown(self):
+        super().tearDown()
+        subprocess.run(["rm", "-rf", DOWNLOADS], check=True)
+
+    def test_what_is_saved_is_what_was_sent(self):
+        files = {"photo.jpg": share_case.random_bytes(700_000), "empty.txt": b"",
+                 "Grüße ☂.pdf": share_case.random_bytes(50_000, 2)}
+        share = self.receive(files)
+        screen.press("Save all", "button")
+        screen.wait_for_control("3 files were saved.")
+        self.picture("saved")
+        self.assertEqual({name: world.sha256(data) for name, data in files.items()}, self.saved())
+        self.sender.withdraw(share)
+        world.launch("launch_viewer", "--extra", "contents_token=" + self.token_of(), "--extra",
+                     "share_type=single_share", app=VIEWER)
+        screen.wait_for_control("The sender has withdrawn this share. Its files cannot be fetched any more.")
+
+    def token_of(self):
+        bus = world.Gio.bus_get_sync(world.Gio.BusType.SESSION)
+        shares = bus.call_sync(world.SERVICE, "/com/velmora/pelliko/Service", "com.velmora.pelliko.Shares1",
+                               "ListReceived", None, None, world.Gio.DBusCallFlags.NONE, -1, None).unpack()[0]
+        return shares[0]["token"]
+
+    def test_a_server_that_dies_while_saving_loses_nothing(self):
+        files = {"small.jpg": share_case.random_bytes(20_000), "film.mp4": share_case.random_bytes(150_000_000, 3)}
+        self.receive(files)
+        screen.press("Save all", "button")
+        self.row("film.mp4, 150.0 MB, Being saved, ")
+        world.kill_server()
+        screen.wait_for_control(UNREACHABLE + " 1 file was saved.", limit=150)
+        self.picture("server-gone")
+        self.assertEqual(world.sha256(files["small.jpg"]), self.saved()["small.jpg"])
+        world.start_server()
+        screen.press("Save all", "button")
+        self.row("film.mp4, 150.0 MB, Saved. Press to open")
+        self.assertEqual({name: world.sha256(data) for name, data in files.items()}, self.saved())
+
+
+if __name__ == "__main__":
+    unittest.main(verbosity=2)
