@@ -18,9 +18,10 @@ std::string downloadFolder()
 
 std::string iconName(const std::string &type, const std::string &name)
 {
-    g_autofree char *content = type.empty()
-                                   ? g_content_type_guess(name.c_str(), nullptr, 0, nullptr)
-                                   : g_content_type_from_mime_type(type.c_str());
+    // That type only says that the sender knew none.
+    const bool unknown = type.empty() || type == "application/octet-stream";
+    g_autofree char *content = unknown ? g_content_type_guess(name.c_str(), nullptr, 0, nullptr)
+                                       : g_content_type_from_mime_type(type.c_str());
     g_autofree char *icon = content ? g_content_type_get_generic_icon_name(content) : nullptr;
     return icon ? icon : "text-x-generic";
 }

@@ -73,6 +73,7 @@ class SentShares(CompanionsCase):
         world.share([path], [person])
         self.confirm()
         self.wait_sent_and_gone()
+        world.run("dunstctl", "close-all")  # its banners would lie over the history
         return self.messages(1)[0]
 
     def test_a_withdrawn_share_is_gone_for_its_recipient(self):
@@ -149,7 +150,8 @@ class ReceivedShares(CompanionsCase):
         self.sender.withdraw(share)
         world.launch("launch_viewer", "--extra", "contents_token=" + self.token_of(), "--extra",
                      "share_type=single_share", app=VIEWER)
-        screen.wait_for_control("The sender has withdrawn this share. Its files cannot be fetched any more.")
+        screen.wait_for_control("The sender has withdrawn this share. Its files cannot be fetched any more. "
+                                "3 files were saved.")
 
     def token_of(self):
         bus = world.Gio.bus_get_sync(world.Gio.BusType.SESSION)
