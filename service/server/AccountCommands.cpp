@@ -1,33 +1,72 @@
 #include "AccountCommands.h"
 
 #include "DataDirectory.h"
+#include "PhoneNumbers.h"
 #include "accounts/Accounts.h"
+#include "accounts/E164.h"
 #include "accounts/Invitations.h"
-#include "shares/ShareRules.h"
 #include "store/DirectoryBlobs.h"
 #include "store/SqliteMetadata.h"
 #include "text/Escape.h"
 
-#include <algorithm>
 #include <cstdio>
 #include <cstdlib>
 #include <ctime>
+#include <optional>
 
 namespace pelliko::server
 {
+namespace
+{
+
+// What a request could not name is no account's number either.
+numbers::NumberForm formOf(const std::string &written)
+{
+    numbers::NumberForm form = numbers::formOf(written, {}, {});
+    if (form.fault.empty() && !isE164(form.e164))
+        form = {{}, numbers::faultTooShort};
+    return form;
+}
+
+// The account's number as it is kept, found by it or by another way to write it; nothing when there
+// is no such account.
+std::optional<std::string> keptNumber(Metadata &metadata, const std::string &written)
+{
+    const std::string form = formOf(written).e164;
+    std::optional<std::string> found;
+    for (const Account &account : metadata.listAccounts()) {
+        if (account.number == written)
+            return account.number;
+        if (account.number == form)
+            found = account.number;
+    }
+    return found;
+}
+
+int failWithoutAccount(const std::string &number)
+{
+    std::fprintf(stderr, "pelliko-server: %s has no account.\n", number.c_str());
+    return EXIT_FAILURE;
+}
+
+} // namespace
 
 int addAccountCommand(const std::filesystem::path &data, const std::string &number,
                       const std::string &name)
 {
-    if (!isPhoneNumber(number)) {
-        std::fprintf(stderr, "pelliko-server: \"%s\" is not a phone number.\n", number.c_str());
+    const numbers::NumberForm form = formOf(number);
+    if (!form.fault.empty()) {
+        std::fprintf(stderr,
+                     "pelliko-server: \"%s\" has to be a phone number with its country, like "
+                     "+4915112345678: %s.\n",
+                     number.c_str(), numbers::faultSentence(form.fault));
         return EXIT_FAILURE;
     }
     makeDataDirectory(data);
     SqliteMetadata metadata(metadataFile(data));
-    const auto token = makeAccount(metadata, number, name, std::time(nullptr));
+    const auto token = makeAccount(metadata, form.e164, name, std::time(nullptr));
     if (!token) {
-        std::fprintf(stderr, "pelliko-server: %s has an account already.\n", number.c_str());
+        std::fprintf(stderr, "pelliko-server: %s has an account already.\n", form.e164.c_str());
         return EXIT_FAILURE;
     }
     std::printf("%s\n", token->c_str());
@@ -46,10 +85,9 @@ int listAccountsCommand(const std::filesystem::path &data)
 int removeAccountCommand(const std::filesystem::path &data, const std::string &number)
 {
     SqliteMetadata metadata(metadataFile(data));
-    if (!metadata.removeAccount(number)) {
-        std::fprintf(stderr, "pelliko-server: %s has no account.\n", number.c_str());
-        return EXIT_FAILURE;
-    }
+    const auto kept = keptNumber(metadata, number);
+    if (!kept || !metadata.removeAccount(*kept))
+        return failWithoutAccount(number);
     DirectoryBlobs blobs(blobsDirectory(data));
     for (auto keys = metadata.doomedBlobs(); !keys.empty(); keys = metadata.doomedBlobs()) {
         for (const std::string &key : keys) {
@@ -95,14 +133,11 @@ int renewAccountCommand(const std::filesystem::path &data, const std::string &nu
                         std::int64_t lifetime)
 {
     SqliteMetadata metadata(metadataFile(data));
-    const auto accounts = metadata.listAccounts();
-    if (std::none_of(accounts.begin(), accounts.end(),
-                     [&](const Account &account) { return account.number == number; })) {
-        std::fprintf(stderr, "pelliko-server: %s has no account.\n", number.c_str());
-        return EXIT_FAILURE;
-    }
+    const auto kept = keptNumber(metadata, number);
+    if (!kept)
+        return failWithoutAccount(number);
     const Seconds now = std::time(nullptr);
-    const std::string code = makeInvitation(metadata, number, 1, now, now + lifetime);
+    const std::string code = makeInvitation(metadata, *kept, 1, now, now + lifetime);
     std::printf("%s\n", code.c_str());
     return EXIT_SUCCESS;
 }

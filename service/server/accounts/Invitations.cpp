@@ -1,11 +1,11 @@
 #include "accounts/Invitations.h"
 
+#include "accounts/E164.h"
 #include "http/Errors.h"
 #include "text/Secrets.h"
 
 #include <nlohmann/json.hpp>
 
-#include <algorithm>
 #include <vector>
 
 namespace pelliko::server
@@ -49,7 +49,7 @@ Registration registrationOf(const Request &request, const std::string &text)
     registration.number = textOf(body, "number");
     const std::string code = textOf(body, "code");
     registration.keyHash = keyHashOf(request);
-    if (!isInternationalNumber(registration.number))
+    if (!isE164(registration.number))
         throw Refusal(Error::numberInvalid);
     if (!looksLikeToken(code))
         throw Refusal(Error::codeUnknown);
@@ -103,17 +103,6 @@ Task<void> registerAccount(Exchange &exchange, Context &context)
     co_await endFormerStreams(context, registration.tokenHash);
     const nlohmann::json answer{{"number", registration.number}, {"token", token}};
     co_await exchange.respond(jsonResponse(Status::created, answer.dump()));
-}
-
-bool isInternationalNumber(std::string_view number)
-{
-    constexpr std::size_t fewest = 7;
-    constexpr std::size_t most = 15;
-    if (number.size() < fewest + 1 || number.size() > most + 1 || number[0] != '+' ||
-        number[1] == '0')
-        return false;
-    number.remove_prefix(1);
-    return std::all_of(number.begin(), number.end(), [](char c) { return c >= '0' && c <= '9'; });
 }
 
 std::string makeInvitation(Metadata &metadata, const std::string &number, int uses, Seconds now,

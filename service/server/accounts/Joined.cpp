@@ -1,6 +1,7 @@
 #include "accounts/Joined.h"
 
 #include "accounts/Accounts.h"
+#include "accounts/E164.h"
 #include "http/Errors.h"
 
 #include <nlohmann/json.hpp>
@@ -63,13 +64,6 @@ Response responseOf(const JoinedAnswer &answer)
 }
 
 } // namespace
-
-bool isE164(std::string_view number)
-{
-    const auto isDigit = [](char c) { return c >= '0' && c <= '9'; };
-    return number.size() >= 8 && number.size() <= 16 && number[0] == '+' && number[1] != '0' &&
-           std::all_of(number.begin() + 1, number.end(), isDigit);
-}
 
 Task<void> showJoined(Exchange &exchange, Context &context)
 {

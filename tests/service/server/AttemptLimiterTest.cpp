@@ -1,5 +1,5 @@
 #include "accounts/AttemptLimiter.h"
-#include "accounts/Invitations.h"
+#include "accounts/E164.h"
 
 #include <gtest/gtest.h>
 
@@ -68,10 +68,10 @@ TEST(AttemptLimiter, OneHomeIsOneAddress)
 TEST(InvitationRules, NumbersAreInternational)
 {
     for (const char *good : {"+4915112345678", "+1201555", "+123456789012345"})
-        EXPECT_TRUE(isInternationalNumber(good)) << good;
+        EXPECT_TRUE(isE164(good)) << good;
     for (const char *bad : {"", "+", "4915112345678", "004915112345678", "+0151123456",
                             "+49 1511234", "+123456", "+1234567890123456", "+49151x2345678"})
-        EXPECT_FALSE(isInternationalNumber(bad)) << bad;
+        EXPECT_FALSE(isE164(bad)) << bad;
 }
 
 } // namespace

@@ -31,7 +31,7 @@ class Refusals(ServerCase):
     def test_another_accounts_share_and_upload_are_not_found(self):
         share = self.make_share(5)
         upload = share["files"][0]["upload"]
-        other = self.run_account("add", "--number", "+49222").strip()
+        other = self.run_account("add", "--number", "+493022222").strip()
         path = "/api/v1/shares/" + share["share"]
         for method, address in [("GET", path), ("DELETE", path), ("POST", path + "/finish")]:
             self.assert_refused(self.request(method, address, token=other), 404, "not_found")
