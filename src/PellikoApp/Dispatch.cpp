@@ -2,12 +2,14 @@
 
 #include "AppLog/AppLog.h"
 #include "PellikoApp/ContactVcard.h"
+#include "PellikoApp/PushReceiver.h"
 #include "PellikoApp/ServiceSwitch.h"
 #include "PellikoApp/ShareRequest.h"
 #include "PellikoApp/SmsSender.h"
 #include "PellikoApp/TextArray.h"
 #include "PellikoApp/Window.h"
 #include "PellikoUploadingDataManager/PressedNotification.h"
+#include "PellikoVelmoraLog/PellikoVelmoraLog.h"
 
 #include <cstring>
 #include <pelliko_operations.h>
@@ -104,6 +106,15 @@ Next _onMultiShare(const Launch &launch, PellikoAppData *ad)
     return Next::run;
 }
 
+Next _onSend(const Launch &launch, PellikoAppData *ad)
+{
+    LOG_DEBUG("Push message received !!");
+    PellikoVelmoraLog::getInstance()->insertVelmoraLogReceiveNotification();
+    receivePush(ad, launch.request);
+    _forwardPushAppControl(launch.request);
+    return Next::run;
+}
+
 Next _onSendText(const Launch &launch, PellikoAppData *ad)
 {
     LOG_DEBUG("Need to Send SMS to receiver !!");
@@ -153,6 +164,12 @@ Next _onDeregistered(const Launch &, PellikoAppData *)
     return Next::quit;
 }
 
+Next _onServiceOn(const Launch &, PellikoAppData *ad)
+{
+    LOG_DEBUG("Service ON operation");
+    return switchServiceOn(ad) ? Next::run : Next::quit;
+}
+
 Next _onServiceOff(const Launch &, PellikoAppData *ad)
 {
     LOG_DEBUG("Service OFF operation");
@@ -169,10 +186,12 @@ constexpr OperationRow operations[] = {
     {APP_CONTROL_OPERATION_SHARE, _onShare},
     {APP_CONTROL_OPERATION_SHARE_TEXT, _onShareText},
     {APP_CONTROL_OPERATION_MULTI_SHARE, _onMultiShare},
+    {APP_CONTROL_OPERATION_SEND, _onSend},
     {APP_CONTROL_OPERATION_SEND_TEXT, _onSendText},
     {APP_CONTROL_OPERATION_UPLOADING_NOTI_PRESSED, _onNotiPressed},
     {APP_CONTROL_OPERATION_DEFAULT, _onDefault},
     {APP_CONTROL_OPERATION_DEREGISTERED, _onDeregistered},
+    {APP_CONTROL_OPERATION_SERVICE_ON, _onServiceOn},
     {APP_CONTROL_OPERATION_SERVICE_OFF, _onServiceOff},
 };
 

@@ -7,6 +7,7 @@
 #include "PellikoApp/Dispatch.h"
 #include "PellikoApp/Language.h"
 #include "PellikoApp/Operation.h"
+#include "PellikoApp/PushReceiver.h"
 #include "PellikoApp/Telephony.h"
 #include "PellikoApp/Window.h"
 #include "PellikoDatabaseManager/UploadInfoDatabase.h"
@@ -121,6 +122,7 @@ bool PellikoApp::onCreate()
 
 void PellikoApp::onTerminate()
 {
+    finishPushes();
     releaseChangeableGui(getAppData());
 }
 

@@ -1,6 +1,7 @@
 #include "PellikoApp/ServiceSwitch.h"
 
 #include "AppLog/AppLog.h"
+#include "PellikoApp/PushReceiver.h"
 #include "PellikoDatabaseManager/UploadInfoDatabase.h"
 #include "PellikoNotificationManager/NotificationBackup.h"
 
@@ -23,8 +24,17 @@ void _deleteAllNotifications()
 
 } // namespace
 
+bool switchServiceOn(PellikoAppData *ad)
+{
+    if (announceKeptShares(ad))
+        return true;
+    elm_exit();
+    return false;
+}
+
 void switchServiceOff(PellikoAppData *ad)
 {
+    abandonPushes();
     backupNotiInfo(ad);
     _deleteAllNotifications();
     elm_exit();
@@ -32,6 +42,7 @@ void switchServiceOff(PellikoAppData *ad)
 
 void forgetAccount()
 {
+    abandonPushes();
     _deleteAllNotifications();
     deleteUploadInfoDb();
     deleteAllThumbnails();

@@ -80,6 +80,16 @@ bool startDetachedWorker(Work work)
     return started;
 }
 
+WorkerScope::WorkerScope()
+{
+    _count(1);
+}
+
+WorkerScope::~WorkerScope()
+{
+    _count(-1);
+}
+
 bool waitForWorkers(std::chrono::milliseconds bound)
 {
     Running &running = _running();
