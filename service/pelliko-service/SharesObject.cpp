@@ -96,7 +96,9 @@ void SharesObject::connectLists()
        }));
     on("handle-get-received", G_CALLBACK(+[](PellikoShares1 *, Invocation *call, const char *token,
                                              gboolean fresh, SharesObject *self) {
-           return self->hold(call, [=] { self->getReceived(call, token, fresh != FALSE); });
+           return self->hold(call, [=, token = std::string(token)] {
+               self->getReceived(call, token, fresh != FALSE);
+           });
        }));
 }
 
@@ -118,7 +120,7 @@ void SharesObject::connectChanges()
        }));
     on("handle-forget-received",
        G_CALLBACK(+[](PellikoShares1 *, Invocation *call, const char *token, SharesObject *self) {
-           return self->hold(call, [=] {
+           return self->hold(call, [=, token = std::string(token)] {
                pelliko_shares1_complete_forget_received(self->skeleton_, call,
                                                         self->parts_->received.forget(token));
            });
@@ -130,7 +132,10 @@ void SharesObject::connectDownloads()
     on("handle-download",
        G_CALLBACK(+[](PellikoShares1 *, Invocation *call, guint number, const char *token,
                       gint file, const char *directory, SharesObject *self) {
-           return self->hold(call, [=] { self->download(call, number, {token, file, directory}); });
+           return self->hold(call,
+                             [=, token = std::string(token), folder = std::string(directory)] {
+                                 self->download(call, number, {token, file, folder});
+                             });
        }));
     on("handle-cancel-download",
        G_CALLBACK(+[](PellikoShares1 *, Invocation *call, guint number, SharesObject *self) {
@@ -141,7 +146,8 @@ void SharesObject::connectDownloads()
        }));
 }
 
-// The parameters of a call live as long as its invocation, which is answered by the call.
+// A call outlives the emission that brought it, and with it the texts among its parameters: it owns
+// copies of those.
 gboolean SharesObject::hold(GDBusMethodInvocation *invocation, Call call)
 {
     if (!parts_) {
