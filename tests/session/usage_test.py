@@ -98,6 +98,11 @@ class Usage(share_case.ShareCase):
         self.assertEqual(["PK01", "PK02 Recent_personal", "PK03 Video", "PK05 1_10", "PK06 0_100MB", "PK08"],
                          self.features())
 
+    def test_a_received_share_is_one_record(self):
+        world.launch("send", "--extra-array", "contents_token_list=unheard-of")
+        self.application.wait_gone()
+        self.assertEqual(["PK10"], self.features())
+
     def test_nothing_is_collected_while_it_is_switched_off(self):
         world.run("velmora-log", "off")
         self.addCleanup(world.run, "velmora-log", "on")
