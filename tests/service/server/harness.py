@@ -28,6 +28,7 @@ class ServerCase(unittest.TestCase):
     """Starts a server with `options` and one account; everything is gone at the end of the case."""
 
     options = []
+    wrapper = []  # a command that the server is started by
 
     def setUp(self):
         self.directory = tempfile.mkdtemp(prefix="pelliko-server-")
@@ -47,7 +48,7 @@ class ServerCase(unittest.TestCase):
     def start(self, *more):
         reading, writing = os.pipe()
         self.process = subprocess.Popen(
-            [PROGRAM, "serve", "--data", self.data, "--listen", "127.0.0.1:0", "--ready-fd",
+            [*self.wrapper, PROGRAM, "serve", "--data", self.data, "--listen", "127.0.0.1:0", "--ready-fd",
              str(writing), *self.options, *more],
             pass_fds=[writing], stderr=subprocess.DEVNULL)
         os.close(writing)

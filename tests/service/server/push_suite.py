@@ -264,12 +264,13 @@ class Streams(PushCase):
         self.marker()
         self.assertEqual(stream.next()[0], 1)
 
-    def test_a_removed_account_is_told_by_sms(self):
+    def test_a_removed_account_is_told_by_sms_and_its_stream_ends(self):
         stream = self.listen()
         self.share_with(BERTA)
         self.assertEqual(stream.next()[0], 1)
         self.run_account("remove", "--number", BERTA)
         self.assertEqual(self.share_with(BERTA)[1]["sms"], [BERTA])
+        self.assertIsNone(stream.next(), "another process removed it, a later beat notices")
 
 
 class SlowReaders(PushCase):
@@ -322,6 +323,23 @@ class LeavingReaders(PushCase):
         last = self.listen()
         self.marker()
         self.assertEqual({stream.next()[0] for stream in [*streams[:7], last]}, {1})
+
+
+class FewDescriptors(PushCase):
+    wrapper = ["prlimit", "--nofile=160:160"]
+
+    def test_when_no_stream_fits_the_rest_goes_on(self):
+        tokens = [self.token, self.berta]
+        tokens += [self.run_account("add", "--number", f"+491511000000{i}").strip() for i in range(4)]
+        streams = [self.listen(token) for token in tokens[:5] for _ in range(8)]
+        refused = self.request("GET", "/api/v1/push", token=tokens[5])
+        self.assert_refused(refused, 503, "busy")
+        self.assertGreater(int(refused.headers["Retry-After"]), 0)
+        self.marker()
+        self.assertEqual(streams[8].next()[0], 1)
+        streams[0].client.sock.shutdown(socket.SHUT_WR)
+        self.assertIsNone(streams[0].next())
+        self.listen(tokens[5])
 
 
 class Acknowledging(PushCase):
