@@ -1,11 +1,8 @@
-#include "PellikoUploadDataManager/ConfirmationPopup.h"
-
+// What the popup shows, and how it is left.
+#include "ConfirmationPopupScene.h"
 #include "PellikoUploadDataManager/RecipientTexts.h"
 #include "PellikoUploadManager/ExitPolicy.h"
-#include "support/PopupScene.h"
-#include "support/UploadServiceDouble.h"
 
-#include <ContactsWriter.h>
 #include <contacts.h>
 #include <gmock/gmock.h>
 
@@ -14,53 +11,8 @@ namespace pelliko
 namespace
 {
 
+using test::ConfirmationPopup;
 using ::testing::Contains;
-using ::testing::HasSubstr;
-using ::testing::Not;
-using ::testing::StartsWith;
-
-class ConfirmationPopup : public test::PopupScene
-{
-protected:
-    // One for all: the client remembers who stood on the bus.
-    static void SetUpTestSuite()
-    {
-        PopupScene::SetUpTestSuite();
-        double_ = std::make_unique<test::UploadServiceDouble>();
-    }
-    static void TearDownTestSuite() { double_.reset(); }
-
-    ConfirmationPopup() { service.forget(); }
-    ~ConfirmationPopup() override
-    {
-        if (ad->popup)
-            evas_object_del(ad->popup);
-    }
-
-    void openPopup()
-    {
-        _createPopupView(ad);
-        ASSERT_TRUE(settle(button("button2")));
-    }
-
-    bool closes()
-    {
-        return waitUntil([this] { return ad->popup == nullptr; });
-    }
-
-    bool isOnScreen() const { return ad->win && evas_object_visible_get(ad->win); }
-
-    static inline std::unique_ptr<test::UploadServiceDouble> double_;
-    test::UploadServiceDouble &service = *double_;
-
-    /// Everything that hangs on the popup is forgotten with it.
-    void expectNothingLeft() const
-    {
-        EXPECT_EQ(ad->popup, nullptr);
-        EXPECT_EQ(ad->popup_layout, nullptr);
-        EXPECT_EQ(ad->wifi_check_box, nullptr);
-    }
-};
 
 TEST_F(ConfirmationPopup, OneRecipientGetsTheSingleLayoutWithASummary)
 {
@@ -326,110 +278,6 @@ TEST_F(ConfirmationPopup, PopupAfterHidingIsVisibleAgain)
     EXPECT_TRUE(isOnScreen());
     press(button("button1"));
     EXPECT_TRUE(closes());
-}
-
-TEST_F(ConfirmationPopup, ShareHandsTheFilesOverAndHides)
-{
-    service.answerRequests(0, 7);
-    share(1, 1500, {{"Ann"}});
-    ad->upload_item->files = eina_list_append(nullptr, g_strdup("/a/b.jpg"));
-    openPopup();
-    setRecipientTexts("Somebody else?", "99?"); // a report about another upload came in between
-    press(button("button2"));
-    ASSERT_TRUE(closes());
-    expectNothingLeft();
-    EXPECT_FALSE(isOnScreen());
-    EXPECT_THAT(service.calls(),
-                ::testing::ElementsAre("RequestUpload ((1, 0), [('', '+447700900123', 31)], "
-                                       "[b'/a/b.jpg'], false)"));
-    ASSERT_NE(g_upload_noti_data_list, nullptr);
-    EXPECT_EQ(g_upload_noti_data_list->request_id, 7);
-    EXPECT_EQ(g_upload_noti_data_list->upload_status, 2);
-    EXPECT_STREQ(g_upload_noti_data_list->recipient_list, "Ann?");
-    EXPECT_STREQ(g_upload_noti_data_list->recipient_index_list, "31?");
-    const auto lines = log.messages();
-    EXPECT_THAT(lines, Contains("Action type is ACTION_UPLOAD"));
-    EXPECT_EQ(lines.back(), "uploadStart ret = 0");
-}
-
-TEST_F(ConfirmationPopup, ReshareTakesTheNodeOfTheNewRequest)
-{
-    service.answerInfo(3, 5000);
-    service.answerRequests(0, 8);
-    ad->action_type = ACTION_RESHARE_UPLOAD;
-    ad->req_id_to_reshare = 5;
-    share(0, 0, {{"Ann"}});
-    openPopup();
-    press(button("button2"));
-    ASSERT_TRUE(closes());
-    EXPECT_EQ(service.calls().back(),
-              "RequestReshare ((1, 0), [('', '+447700900123', 31)], 5, false)");
-    UploadNotiData *node = getUploadNotiDataNode(8);
-    ASSERT_NE(node, nullptr);
-    EXPECT_EQ(node->upload_status, 2);
-    EXPECT_EQ(node->total_files, 3);
-    EXPECT_EQ(log.messages()[log.messages().size() - 2], "reshareUploadStart ret = 0");
-}
-
-TEST_F(ConfirmationPopup, EmptyShareStartsWithoutAsking)
-{
-    service.answerRequests(0, 7);
-    share(1, 0, {{"Ann"}});
-    ad->upload_item->files = eina_list_append(nullptr, g_strdup("/a/b.jpg"));
-    _createPopupView(ad);
-    expectNothingLeft();
-    EXPECT_FALSE(isOnScreen());
-    EXPECT_EQ(service.calls().size(), 1U);
-    EXPECT_THAT(log.messages(),
-                Contains("6MB limit not exceeded. Bypassing Confirmation popup view"));
-}
-
-TEST_F(ConfirmationPopup, ServerErrorEndsTheApplicationOnceThePopupIsGone)
-{
-    service.answerRequests(-16);
-    share(1, 1500, {{"Ann"}});
-    ad->upload_item->files = eina_list_append(nullptr, g_strdup("/a/b.jpg"));
-    openPopup();
-    press(button("button2"));
-    ASSERT_TRUE(closes());
-    EXPECT_EQ(g_upload_noti_data_list, nullptr);
-    const auto lines = log.messages();
-    EXPECT_THAT(lines, Contains("Upload error, ret = -16"));
-    EXPECT_THAT(lines, Contains("Popup is open.. can't exit"));
-    EXPECT_EQ(lines.back(), "No upload_data request id exist so app is exiting");
-}
-
-TEST_F(ConfirmationPopup, RefusedShareLeavesOlderUploadsAlone)
-{
-    service.answerRequests(-5);
-    addUploadNotiDataNode()->request_id = 3;
-    share(1, 1500, {{"Ann"}});
-    ad->upload_item->files = eina_list_append(nullptr, g_strdup("/a/b.jpg"));
-    openPopup();
-    press(button("button2"));
-    ASSERT_TRUE(closes());
-    ASSERT_NE(g_upload_noti_data_list, nullptr);
-    EXPECT_EQ(g_upload_noti_data_list->request_id, 3);
-    EXPECT_EQ(g_upload_noti_data_list->next, nullptr);
-    EXPECT_EQ(log.messages().back(), "upload_data request id is not 0 app can't exit");
-}
-
-TEST_F(ConfirmationPopup, StartingServiceOpensTheShareFailurePopupAndOkLeaves)
-{
-    service.beInitializing();
-    share(1, 1500, {{"Ann"}});
-    ad->upload_item->files = eina_list_append(nullptr, g_strdup("/a/b.jpg"));
-    openPopup();
-    press(button("button2"));
-    ASSERT_TRUE(closes());
-    EXPECT_TRUE(isOnScreen());
-    EXPECT_EQ(g_upload_noti_data_list, nullptr);
-    EXPECT_THAT(log.messages(), Contains("Error - PELLIKO_ERROR_SERVICE_INITIALIZING"));
-    EXPECT_THAT(log.messages(), Not(Contains(HasSubstr("exit"))));
-    pressKey("Escape");
-    EXPECT_TRUE(waitUntil([this] {
-        return log.messages().back() == "No upload_data request id exist so app is exiting";
-    }));
 }
 
 TEST_F(ConfirmationPopup, WithoutAShareTheNumberOfRecipientsStays)

@@ -1,18 +1,9 @@
-#include "PellikoUploadManager/UploadStatus.h"
-#include "PellikoDatabaseManager/UploadInfoDatabase.h"
-#include "PellikoNotificationManager/UploadNotifications.h"
-#include "PellikoUploadDataManager/Recipients.h"
-#include "PellikoUploadManager/UsagePreferences.h"
+// What each report of the service changes and writes while a share is on its way.
 #include "PellikoUploadingDataManager/PressedNotification.h"
-#include "support/AppWorld.h"
-#include "support/RefusingStore.h"
+#include "UploadStatusScene.h"
 
-#include <app_preference.h>
-#include <filesystem>
-#include <fstream>
 #include <glib.h>
 #include <pelliko_client.h>
-#include <regex>
 
 namespace pelliko::test
 {
@@ -62,13 +53,6 @@ const std::string inserted = "Populating tag from current node...\n"
                              "Request id found = 7\n"
                              "node->noti_priv_id = 7\n";
 
-const std::string popupNotMeant = "req_id = 7 and g_noti_press_data.upload_request_id = 0\n";
-
-const std::string rowDeleted = "Records deleted successfully...\n";
-
-const std::string historyAbsent = "request_id = 7, req_id = 7\n"
-                                  "History app is NOT running\n";
-
 std::string sending(const std::string &percent, const std::string &part)
 {
     return "Updating = %p\n"
@@ -92,54 +76,6 @@ std::string handOver(const std::string &status, const std::string &error)
 }
 
 const std::string leaving = "No upload_data request id exist so app is exiting\n";
-
-class UploadStatus : public AppWorld
-{
-protected:
-    // Request 7 as the confirmation leaves it: in the list, in the table, "preparing" posted.
-    UploadNotiData *start(int32_t request_id = 7, const char *path = "/a/b.jpg")
-    {
-        UploadNotiData *node = addNode(request_id, {path}, 2000, "Ann?", "31?");
-        writeUploadDataToDb(node);
-        shareInHand({path});
-        ad->upload_item->request_id = request_id;
-        addProgressNotification(0, &node->notif);
-        node->upload_status = 2;
-        log.restart();
-        return node;
-    }
-
-    void report(int status, int percent = 0, int error_code = 0, const char *input_param = nullptr,
-                int request_id = 7)
-    {
-        uploadResponseStatusCb(status, input_param, percent, 0, 0, error_code, request_id, ad);
-    }
-
-    // What was written since the last call, the start of the period without its value.
-    std::string written()
-    {
-        static const std::regex now("(share_time_last with value = )[0-9.]+");
-        std::string text = std::regex_replace(log.text(), now, "$1now");
-        log.restart();
-        return text;
-    }
-
-    static bool inList(int32_t request_id)
-    {
-        for (const UploadNotiData *node = g_upload_noti_data_list; node; node = node->next) {
-            if (node->request_id == request_id)
-                return true;
-        }
-        return false;
-    }
-
-    static int totalSize()
-    {
-        int total = 0;
-        preference_get_int(shareTotalSizeKey, &total);
-        return total;
-    }
-};
 
 TEST_F(UploadStatus, AShareGoesFromStartedToSent)
 {
@@ -202,28 +138,6 @@ TEST_F(UploadStatus, MessagesBeforeTheEndLetTheEndLeave)
         << end;
     ASSERT_TRUE(loop.runUntil([this] { return log.messages().size() >= 2; }));
     EXPECT_EQ(written(), "req_id = 7\n" + leaving);
-}
-
-TEST_F(UploadStatus, AShareThatOwesMessagesWaitsForThem)
-{
-    start();
-    g_has_sms_receiver = 1;
-    report(7);
-    const std::string end = written();
-    EXPECT_TRUE(end.ends_with(historyAbsent + "waiting for sending SMS\n" + popupNotMeant)) << end;
-    EXPECT_FALSE(inList(7));
-}
-
-TEST_F(UploadStatus, TheEndOfOneUploadDoesNotLeaveWhileAnotherIsPending)
-{
-    start();
-    addNode(8, {"/c"}, 1, "Ann?", "31?");
-    report(7);
-    const std::string end = written();
-    EXPECT_TRUE(end.ends_with("Exit app, no need to wait sending SMS\n"
-                              "upload_data request id is not 0 app can't exit\n"))
-        << end;
-    EXPECT_TRUE(inList(8));
 }
 
 TEST_F(UploadStatus, AnOpenPopupKeepsTheApplicationAndGetsTheEnd)
@@ -322,14 +236,6 @@ TEST_F(UploadStatus, ProgressWithAnErrorIsAFailure)
     EXPECT_EQ(written().find("Updating = "), std::string::npos);
 }
 
-TEST_F(UploadStatus, ShareFinishedWithAnErrorCountsNothing)
-{
-    start();
-    report(7, 0, -5);
-    EXPECT_EQ(totalSize(), 0);
-    EXPECT_EQ(posted("7")->extras.at("upload_status"), "9");
-}
-
 TEST_F(UploadStatus, ACancelledRequestIsGoneWithoutAskingTheExitRule)
 {
     start();
@@ -377,113 +283,6 @@ TEST_F(UploadStatus, StatusFourWithoutAnErrorKeepsTheUpload)
     report(4);
     EXPECT_TRUE(inList(7));
     EXPECT_EQ(rows(), (std::vector<int>{7}));
-}
-
-TEST_F(UploadStatus, AFileMadeForTheShareIsRemovedAtItsEnd)
-{
-    const std::string memo = "/opt/usr/apps/com.velmora.pelliko/shared/data/memo.txt";
-    std::ofstream(memo) << "memo";
-    start(7, memo.c_str());
-    report(7, 0, 0, memo.c_str());
-    EXPECT_FALSE(std::filesystem::exists(memo));
-    const std::string text = written();
-    EXPECT_NE(text.find("Input_param is matched as temp file path\nRemove file success.\n"),
-              std::string::npos)
-        << text;
-}
-
-TEST_F(UploadStatus, TheUsersOwnFileIsLeftAlone)
-{
-    const std::string photo = "/tmp/photo.jpg";
-    std::ofstream(photo) << "photo";
-    start(7, photo.c_str());
-    report(7, 0, 0, photo.c_str());
-    EXPECT_TRUE(std::filesystem::exists(photo));
-    EXPECT_EQ(written().find("Input_param"), std::string::npos);
-}
-
-TEST_F(UploadStatus, APathThatClimbsOutOfTheDirectoryIsLeftAlone)
-{
-    const std::string photo = "/opt/usr/apps/com.velmora.pelliko/shared/photo.jpg";
-    std::ofstream(photo) << "photo";
-    start();
-    report(7, 0, 0, "/opt/usr/apps/com.velmora.pelliko/shared/data/../photo.jpg");
-    EXPECT_TRUE(std::filesystem::exists(photo));
-}
-
-TEST_F(UploadStatus, ATempFileThatIsGoneAlreadyDoesNotStopTheShare)
-{
-    start();
-    report(7, 0, 0, "/opt/usr/apps/com.velmora.pelliko/shared/data/gone.txt");
-    const std::string text = written();
-    EXPECT_NE(text.find("Remove file failed [-1]\n"), std::string::npos) << text;
-    EXPECT_EQ(posted("7")->extras.at("upload_status"), "6");
-}
-
-TEST_F(UploadStatus, ThePeriodIsStampedAtItsFirstShareOnly)
-{
-    start(7);
-    report(7);
-    double first = 0.0;
-    ASSERT_EQ(preference_get_double(shareTimeLastKey, &first), PREFERENCE_ERROR_NONE);
-    EXPECT_NE(written().find("Updating preference for share_time_last"), std::string::npos);
-    start(8);
-    report(7, 0, 0, nullptr, 8);
-    EXPECT_EQ(written().find("Updating preference for share_time_last"), std::string::npos);
-    double second = 0.0;
-    preference_get_double(shareTimeLastKey, &second);
-    EXPECT_EQ(first, second);
-    EXPECT_EQ(totalSize(), 4000);
-}
-
-TEST_F(UploadStatus, AStoreThatRefusesTheDaysTotalsDoesNotStopTheEnd)
-{
-    start();
-    const RefusingStore full;
-    report(7);
-    const std::string text = std::regex_replace(written(), std::regex("p_err = -[0-9]+"), "p_err");
-    EXPECT_NE(text.find(rowDeleted +
-                        "Error in setting PREFERENCE KEY SHARE_TIME_LAST, p_err\n"
-                        "Error in setting PREFERENCE KEY SHARE_TIME_LAST\n"
-                        "Error in setting PREFERENCE KEY SHARE_TOTAL_SIZE, p_err\n"
-                        "Error in setting PREFERENCE SHARE_TOTAL_SIZE with share_total_size = "
-                        "2000.000000, p_err\n" +
-                        historyAbsent),
-              std::string::npos)
-        << text;
-    EXPECT_EQ(posted("7")->extras.at("upload_status"), "6");
-    EXPECT_FALSE(inList(7));
-}
-
-TEST_F(UploadStatus, APeriodStartOfAnotherTypeIsStampedAnew)
-{
-    preference_set_int(shareTimeLastKey, 5);
-    start();
-    report(7);
-    const std::string text = std::regex_replace(written(), std::regex("p_err = -[0-9]+"), "p_err");
-    EXPECT_NE(text.find("Error in getting PREFERENCE KEY SHARE_TIME_LAST, p_err\n"
-                        "Updating preference for share_time_last with value = now\n"),
-              std::string::npos)
-        << text;
-}
-
-TEST_F(UploadStatus, AReshareTellsItsNewRequestId)
-{
-    addNode(8, {}, 5000, "Ann?", "31?");
-    ad->reshared_request_id = 8;
-    log.restart();
-    report(7, 0, 0, nullptr, 8);
-    EXPECT_TRUE(log.has("request_id = 8, req_id = 8"));
-}
-
-TEST_F(UploadStatus, ANotificationThatWasSwipedAwayDoesNotStopTheEnd)
-{
-    start();
-    report(2, 40);
-    notification_delete_all(NOTIFICATION_TYPE_ONGOING);
-    report(5);
-    EXPECT_FALSE(inList(7));
-    EXPECT_TRUE(rows().empty());
 }
 
 } // namespace
