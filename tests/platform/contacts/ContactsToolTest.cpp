@@ -1,8 +1,8 @@
 // The program as a person runs it.
 #include <memory>
 
+#include <JsonValue.h>
 #include <glib.h>
-#include <nlohmann/json.hpp>
 
 #include "ContactsFixture.h"
 
@@ -47,10 +47,10 @@ TEST_F(ContactsTool, AddPrintsTheNumberIdAndListShowsIt)
     EXPECT_EQ(tool({"list"}).out, "number id\tname\tnumber\tjoined\tcontact id\n"
                                   "1\tAnn\t+44 7700 900123\tyes\t1\n"
                                   "2\t王小明\t+447700900124\tno\t3\n");
-    const auto expected = nlohmann::json::parse(R"([
+    const auto expected = pelliko::test::JsonValue::parse(R"([
         {"number_id": 1, "contact_id": 1, "name": "Ann", "number": "+44 7700 900123", "joined": true},
         {"number_id": 2, "contact_id": 3, "name": "王小明", "number": "+447700900124", "joined": false}])");
-    EXPECT_EQ(nlohmann::json::parse(tool({"list", "--json"}).out), expected);
+    EXPECT_EQ(pelliko::test::JsonValue::parse(tool({"list", "--json"}).out), expected);
 }
 
 TEST_F(ContactsTool, AnEmptyStoreListsAsAnEmptyArray)

@@ -7,16 +7,16 @@
 
 #include <sys/resource.h>
 
+#include <JsonValue.h>
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
-#include <nlohmann/json.hpp>
 
 #include "MessageBuilder.h"
 
 namespace
 {
 
-using nlohmann::json;
+using pelliko::test::JsonValue;
 using testing::ElementsAre;
 
 class Outbox : public testing::Test
@@ -44,20 +44,13 @@ protected:
         ASSERT_EQ(msg_open_msg_handle(&handle_), MSG_SUCCESS);
     }
 
-    std::vector<json> messages() const
-    {
-        std::vector<json> result;
-        std::ifstream file(path_);
-        for (std::string line; std::getline(file, line);)
-            result.push_back(json::parse(line));
-        return result;
-    }
+    std::vector<JsonValue> messages() const { return JsonValue::linesOf(path_); }
 
     std::vector<std::string> recipients() const
     {
         std::vector<std::string> result;
         for (const auto &message : messages())
-            result.push_back(message["to"]);
+            result.push_back(message["to"].text());
         return result;
     }
 
@@ -75,8 +68,8 @@ TEST_F(Outbox, OneMessageIsOneLine)
     EXPECT_EQ(sent[0]["to"], "+4915112345");
     EXPECT_EQ(sent[0]["text"], "Hallo \"Welt\"\nzweite Zeile äöü");
     EXPECT_EQ(sent[0]["sim"], 2);
-    EXPECT_TRUE(std::regex_match(sent[0]["time"].get<std::string>(),
-                                 std::regex(R"(\d{4}-\d\d-\d\dT\d\d:\d\d:\d\dZ)")));
+    EXPECT_TRUE(
+        std::regex_match(sent[0]["time"].text(), std::regex(R"(\d{4}-\d\d-\d\dT\d\d:\d\d:\d\dZ)")));
 }
 
 TEST_F(Outbox, ThreeRecipientsGiveThreeMessagesInOrder)
@@ -188,7 +181,7 @@ TEST_F(Outbox, ALineBrokenByAKilledWriterDoesNotSpoilTheNext)
     std::string line;
     std::getline(file, line);
     std::getline(file, line);
-    EXPECT_EQ(json::parse(line)["to"], "+491");
+    EXPECT_EQ(JsonValue::parse(line)["to"], "+491");
 }
 
 TEST_F(Outbox, ThreadsSendAtTheSameTimeWithoutMixingLines)

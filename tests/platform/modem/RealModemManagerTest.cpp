@@ -4,9 +4,9 @@
 #include <stdexcept>
 #include <thread>
 
+#include <JsonValue.h>
 #include <gio/gio.h>
 #include <gmock/gmock.h>
-#include <nlohmann/json.hpp>
 
 #include "ITapiNetwork.h"
 #include "ITapiSim.h"
@@ -25,6 +25,7 @@ using namespace std::chrono_literals;
 using pelliko::modem::currentModems;
 using pelliko::modem::ModemManagerService;
 using pelliko::modem::SimState;
+using pelliko::test::JsonValue;
 using testing::HasSubstr;
 
 constexpr const char *script = PELLIKO_SOURCE_DIR "/tests/platform/modem/real_modemmanager.py";
@@ -75,12 +76,8 @@ protected:
     static std::vector<std::string> delivered()
     {
         std::vector<std::string> result;
-        std::ifstream file(outbox_);
-        for (std::string line; std::getline(file, line);) {
-            const auto record = nlohmann::json::parse(line);
-            result.push_back(record["to"].get<std::string>() + ": " +
-                             record["text"].get<std::string>());
-        }
+        for (const auto &record : JsonValue::linesOf(outbox_))
+            result.push_back(record["to"].text() + ": " + record["text"].text());
         return result;
     }
     static std::string send(const std::string &text)

@@ -4,16 +4,16 @@
 
 #include <sys/wait.h>
 
+#include <JsonValue.h>
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
-#include <nlohmann/json.hpp>
 
 #include <app_control.h>
 
 #include "support/Bus.h"
 
 using namespace panel_testing;
-using nlohmann::json;
+using pelliko::test::JsonValue;
 
 namespace
 {
@@ -68,18 +68,19 @@ TEST_F(Tool, ListsEveryField)
 
     const Outcome outcome = tool("list --json");
     ASSERT_EQ(outcome.status, 0) << outcome.output;
-    const json list = json::parse(outcome.output);
+    const JsonValue list = JsonValue::parse(outcome.output);
     ASSERT_EQ(list.size(), 1u);
-    const json &item = list[0];
-    EXPECT_GT(item["id"], 0);
+    const JsonValue item = list[0];
+    EXPECT_GT(item["id"].number(), 0);
     EXPECT_EQ(item["tag"], "7");
     EXPECT_EQ(item["type"], 1);
     EXPECT_EQ(item["layout"], 5);
     EXPECT_EQ(item["display"], 9);
     EXPECT_EQ(item["title"], "Sending 3 files");
+    EXPECT_TRUE(item.contains("content"));
     EXPECT_EQ(item["content"], nullptr);
     EXPECT_EQ(item["texts"]["title"]["key"], "IDS_SENDING");
-    EXPECT_EQ(item["texts"]["title"]["values"], json::array({3}));
+    EXPECT_EQ(item["texts"]["title"]["values"], JsonValue::parse("[3]"));
     EXPECT_EQ(item["progress"], 0.5);
     EXPECT_EQ(item["images"]["indicator"], "/i.png");
     EXPECT_EQ(item["launch"]["app_id"], "com.velmora.pelliko");
@@ -129,26 +130,26 @@ TEST_F(Tool, WatchTellsWhatWasAndWhatComes)
     const auto lastSeq = [] {
         const std::string all = tool("history --json").output;
         const size_t lastLine = all.rfind('\n', all.size() - 2);
-        return json::parse(all.substr(lastLine == std::string::npos ? 0 : lastLine + 1))["seq"]
-            .get<int>();
+        return JsonValue::parse(all.substr(lastLine == std::string::npos ? 0 : lastLine + 1))["seq"]
+            .number();
     };
     post(NOTIFICATION_TYPE_NOTI, "marker", "marker");
-    const int since = lastSeq();
+    const int64_t since = lastSeq();
     post(NOTIFICATION_TYPE_NOTI, "before", "7");
     const std::string command =
         PELLIKO_BUILD_DIR "/bin/quickpanel-tool watch --count 3 --since " + std::to_string(since);
     FILE *watcher = popen(command.c_str(), "r");
     std::array<char, 8192> line{};
     ASSERT_NE(fgets(line.data(), line.size(), watcher), nullptr);
-    EXPECT_EQ(json::parse(line.data())["title"], "before");
+    EXPECT_EQ(JsonValue::parse(line.data())["title"], "before");
     post(NOTIFICATION_TYPE_NOTI, "after", "7");
     EXPECT_EQ(notification_status_message_post("done"), 0);
     ASSERT_NE(fgets(line.data(), line.size(), watcher), nullptr);
-    const json second = json::parse(line.data());
+    const JsonValue second = JsonValue::parse(line.data());
     EXPECT_EQ(second["title"], "after");
     EXPECT_TRUE(second.contains("replaced"));
     ASSERT_NE(fgets(line.data(), line.size(), watcher), nullptr);
-    EXPECT_EQ(json::parse(line.data())["message"], "done");
+    EXPECT_EQ(JsonValue::parse(line.data())["message"], "done");
     EXPECT_EQ(WEXITSTATUS(pclose(watcher)), 0);
 }
 

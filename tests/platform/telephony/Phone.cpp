@@ -44,13 +44,13 @@ std::string tell(const std::string &command)
     return answer;
 }
 
-std::vector<nlohmann::json> messages()
+std::vector<pelliko::test::JsonValue> messages()
 {
-    std::vector<nlohmann::json> result;
+    std::vector<pelliko::test::JsonValue> result;
     std::ifstream file(std::getenv("PELLIKO_SMS_OUTBOX"));
     file.seekg(forgotten);
     for (std::string line; std::getline(file, line);)
-        result.push_back(nlohmann::json::parse(line));
+        result.push_back(pelliko::test::JsonValue::parse(line));
     return result;
 }
 

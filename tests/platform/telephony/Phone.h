@@ -1,9 +1,9 @@
 // The simulated phone of a world that was made with a modem, and the real ofonod behind it.
 #pragma once
 
+#include <JsonValue.h>
 #include <functional>
 #include <gio/gio.h>
-#include <nlohmann/json.hpp>
 #include <string>
 #include <vector>
 
@@ -18,7 +18,7 @@ constexpr const char *kSecondImsi = "310150123456789";
 std::string tell(const std::string &command);
 
 /// The messages that the network has taken since the last call of forgetMessages().
-std::vector<nlohmann::json> messages();
+std::vector<pelliko::test::JsonValue> messages();
 void forgetMessages();
 
 /// Turns GLib's default main context until the condition holds; false when it does not in time.

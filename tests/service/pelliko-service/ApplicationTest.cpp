@@ -1,8 +1,9 @@
 #include "World.h"
 
+#include <JsonValue.h>
 #include <gmock/gmock.h>
-#include <nlohmann/json.hpp>
 
+using pelliko::test::JsonValue;
 using testing::ElementsAre;
 
 namespace
@@ -29,7 +30,7 @@ protected:
 
     std::string shareState()
     {
-        return nlohmann::json::parse(askServer("GET", "/api/v1/shares"))["shares"][0]["state"];
+        return JsonValue::parse(askServer("GET", "/api/v1/shares"))["shares"][0]["state"].text();
     }
 
     // What the service answers, as text; empty when it does not.

@@ -2,10 +2,11 @@
 
 #include "Fakes.h"
 
+#include <JsonValue.h>
 #include <gmock/gmock.h>
-#include <nlohmann/json.hpp>
 
 using namespace pelliko::service;
+using pelliko::test::JsonValue;
 using testing::ElementsAre;
 
 namespace
@@ -52,10 +53,11 @@ struct OneRequest : testing::Test {
     }
     std::vector<std::string> numbersIn(const char *member) const
     {
-        const auto body = nlohmann::json::parse(hands.http.oldest().body);
+        const auto entries = JsonValue::parse(hands.http.oldest().body)[member];
         std::vector<std::string> numbers;
-        for (const auto &entry : body.at(member)) {
-            numbers.push_back(entry.is_object() ? entry.at("number") : entry);
+        for (size_t i = 0; i < entries.size(); ++i) {
+            const auto entry = entries[i];
+            numbers.push_back(entry.contains("number") ? entry["number"].text() : entry.text());
         }
         return numbers;
     }

@@ -1,12 +1,13 @@
 #include "World.h"
 
+#include <JsonValue.h>
 #include <gmock/gmock.h>
-#include <nlohmann/json.hpp>
 
 #include <csignal>
 #include <filesystem>
 #include <fstream>
 
+using pelliko::test::JsonValue;
 using testing::Contains;
 using testing::ElementsAre;
 using testing::Not;
@@ -27,7 +28,7 @@ protected:
 
     size_t sharesOnServer()
     {
-        return nlohmann::json::parse(askServer("GET", "/api/v1/shares"))["shares"].size();
+        return JsonValue::parse(askServer("GET", "/api/v1/shares"))["shares"].size();
     }
 };
 } // namespace
@@ -131,7 +132,7 @@ TEST_F(UploadFaults, aFileThatIsCutDuringTheUploadIsADeviceError)
     EXPECT_EQ(reportsOf(id).back().error, -5);
     EXPECT_THAT(statusesOf(id), Not(Contains(7)));
     ASSERT_TRUE(runUntil([&] {
-        return nlohmann::json::parse(askServer("GET", "/api/v1/shares"))["shares"][0]["state"] ==
+        return JsonValue::parse(askServer("GET", "/api/v1/shares"))["shares"][0]["state"] ==
                "withdrawn";
     }));
 }

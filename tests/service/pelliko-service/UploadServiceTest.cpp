@@ -1,12 +1,13 @@
 #include "World.h"
 
+#include <JsonValue.h>
 #include <gmock/gmock.h>
-#include <nlohmann/json.hpp>
 
 #include <csignal>
 #include <cstring>
 #include <filesystem>
 
+using pelliko::test::JsonValue;
 using testing::ElementsAre;
 namespace fs = std::filesystem;
 
@@ -122,7 +123,7 @@ TEST_F(UploadService, cancelReportsTheEndAndTakesTheShareOffTheServer)
     EXPECT_EQ(reportsOf(id).back().error, 0);
     proxy_->signal(SIGUSR1);
     ASSERT_TRUE(runUntil([&] {
-        const auto shares = nlohmann::json::parse(askServer("GET", "/api/v1/shares"));
+        const auto shares = JsonValue::parse(askServer("GET", "/api/v1/shares"));
         return shares["shares"].size() == 1 && shares["shares"][0]["state"] == "withdrawn";
     }));
     EXPECT_NE(pelliko_cancel_upload(id), 0) << "a second cancel has nothing to cancel";
@@ -209,8 +210,8 @@ TEST_F(UploadService, statusListsTheRequestsAsJson)
     int32_t id = 0;
     ASSERT_EQ(request({makeFile("photo.jpg", 4321)}, &id), 0);
     ASSERT_TRUE(waitForEnd(id));
-    const auto list = nlohmann::json::parse(
-        outputOf({PELLIKO_BUILD_DIR "/bin/pelliko-service", "status", "--json"}));
+    const auto list =
+        JsonValue::parse(outputOf({PELLIKO_BUILD_DIR "/bin/pelliko-service", "status", "--json"}));
     ASSERT_EQ(list.size(), 1U);
     EXPECT_EQ(list[0]["id"], id);
     EXPECT_EQ(list[0]["state"], "shared");
@@ -239,14 +240,13 @@ TEST_F(UploadService, tellsAPersonWrittenInThreeWaysOnceAndKnowsWhoHasJoined)
     ASSERT_EQ(application.launches.size(), 1U);
     EXPECT_THAT(application.launches[0].lists.at("to_msisdn"), ElementsAre("+4915112345678"))
         << "who has joined has a push";
-    const auto list = nlohmann::json::parse(
-        outputOf({PELLIKO_BUILD_DIR "/bin/pelliko-service", "status", "--json"}));
+    const auto list =
+        JsonValue::parse(outputOf({PELLIKO_BUILD_DIR "/bin/pelliko-service", "status", "--json"}));
     const auto people = list[0]["recipients"];
     ASSERT_EQ(people.size(), 5U);
-    EXPECT_EQ(people[0], (nlohmann::json{{"number", "07700 900111"},
-                                         {"e164", "+447700900111"},
-                                         {"fault", ""},
-                                         {"joined", "yes"}}));
+    EXPECT_EQ(people[0],
+              JsonValue::parse(
+                  R"({"number":"07700 900111","e164":"+447700900111","fault":"","joined":"yes"})"));
     EXPECT_EQ(people[2]["joined"], "yes");
     EXPECT_EQ(people[3]["fault"], "too_short");
     EXPECT_EQ(people[4]["joined"], "no");
@@ -264,5 +264,5 @@ TEST_F(UploadService, withNobodyToReachItEndsWithADeviceError)
     ASSERT_EQ(requestTo({{"44", "12"}, {"44", "Anna"}}, {makeFile("photo.jpg", 1000)}, &id), 0);
     ASSERT_TRUE(waitForEnd(id));
     EXPECT_EQ(reportsOf(id).back().error, -5);
-    EXPECT_EQ(nlohmann::json::parse(askServer("GET", "/api/v1/shares"))["shares"].size(), 0U);
+    EXPECT_EQ(JsonValue::parse(askServer("GET", "/api/v1/shares"))["shares"].size(), 0U);
 }

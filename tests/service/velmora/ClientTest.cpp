@@ -6,15 +6,15 @@
 #include <regex>
 #include <thread>
 
+#include <JsonValue.h>
 #include <glib.h>
 #include <gmock/gmock.h>
-#include <nlohmann/json.hpp>
 
 namespace pelliko::velmora::test
 {
 namespace
 {
-using nlohmann::json;
+using pelliko::test::JsonValue;
 
 constexpr const char *uri = "content://com.velmora.log.provider/log/use_app_feature_survey";
 
@@ -74,13 +74,13 @@ protected:
         }
     }
 
-    std::vector<json> records() const
+    std::vector<JsonValue> records() const
     {
         std::vector<std::string> lines;
         EXPECT_EQ(users.read(lines), 0);
-        std::vector<json> all;
+        std::vector<JsonValue> all;
         for (const std::string &line : lines) {
-            all.push_back(json::parse(line));
+            all.push_back(JsonValue::parse(line));
         }
         return all;
     }
@@ -104,8 +104,7 @@ TEST_F(UsageClient, ARecordCarriesItsKeysAndTheTime)
     EXPECT_EQ(all[0]["extra"], "1_10");
     EXPECT_EQ(all[0]["uri"], "/log/use_app_feature_survey");
     std::tm parts{};
-    ASSERT_NE(strptime(all[0]["time"].get<std::string>().c_str(), "%Y-%m-%dT%H:%M:%SZ", &parts),
-              nullptr);
+    ASSERT_NE(strptime(all[0]["time"].text().c_str(), "%Y-%m-%dT%H:%M:%SZ", &parts), nullptr);
     EXPECT_GE(timegm(&parts), before);
     EXPECT_LE(timegm(&parts), std::time(nullptr));
 }

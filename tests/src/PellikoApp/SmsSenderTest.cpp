@@ -5,13 +5,13 @@
 #include "support/Catalogue.h"
 #include "support/UsageRecords.h"
 
+#include <JsonValue.h>
 #include <app_control.h>
 #include <app_preference.h>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
 #include <msg.h>
-#include <nlohmann/json.hpp>
 
 namespace pelliko::test
 {
@@ -37,14 +37,7 @@ protected:
 
     static std::string outbox() { return getenv("PELLIKO_SMS_OUTBOX"); }
 
-    static std::vector<nlohmann::json> sent()
-    {
-        std::vector<nlohmann::json> all;
-        std::ifstream file(outbox());
-        for (std::string line; std::getline(file, line);)
-            all.push_back(nlohmann::json::parse(line));
-        return all;
-    }
+    static std::vector<JsonValue> sent() { return JsonValue::linesOf(outbox()); }
 
     void text(const char *key, const char *value)
     {

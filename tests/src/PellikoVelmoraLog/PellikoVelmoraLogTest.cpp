@@ -124,8 +124,8 @@ TEST_F(UsageLog, ATextAndThreePicturesAreCountedOncePerKind)
     EXPECT_EQ(all[0].size(), 4U) << all[0];
     EXPECT_EQ(all[1].size(), 5U) << all[1];
     for (const auto &record : all) {
-        EXPECT_EQ(record.at("app_id"), "com.velmora.pelliko");
-        EXPECT_EQ(record.at("uri"), "/log/use_app_feature_survey");
+        EXPECT_EQ(record["app_id"], "com.velmora.pelliko");
+        EXPECT_EQ(record["uri"], "/log/use_app_feature_survey");
     }
 }
 

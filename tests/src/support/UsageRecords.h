@@ -1,9 +1,8 @@
 #pragma once
 
+#include <JsonValue.h>
 #include <filesystem>
-#include <fstream>
 #include <glib.h>
-#include <nlohmann/json.hpp>
 #include <string>
 #include <vector>
 
@@ -29,23 +28,16 @@ public:
     UsageRecords() { std::filesystem::remove(usageFile()); }
 
     /// Every record as it stands in the file.
-    std::vector<nlohmann::json> all() const
-    {
-        std::vector<nlohmann::json> records;
-        std::ifstream in(usageFile());
-        for (std::string line; std::getline(in, line);)
-            records.push_back(nlohmann::json::parse(line));
-        return records;
-    }
+    std::vector<JsonValue> all() const { return JsonValue::linesOf(usageFile()); }
 
     /// "PK05 1_10", or "PK01" for a record without extra, in order.
     std::vector<std::string> features() const
     {
         std::vector<std::string> texts;
-        for (const nlohmann::json &record : all()) {
-            std::string text = record.at("feature");
+        for (const JsonValue &record : all()) {
+            std::string text = record["feature"].text();
             if (record.contains("extra"))
-                text += " " + record.at("extra").get<std::string>();
+                text += " " + record["extra"].text();
             texts.push_back(text);
         }
         return texts;
