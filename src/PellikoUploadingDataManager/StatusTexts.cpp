@@ -42,8 +42,10 @@ bool writeSizeLine(char *line)
         return false;
     double size = data.total_size;
     size_t divisions = 0;
-    for (; size >= 1024.0; size /= 1024.0)
+    while (size >= 1024.0) {
+        size /= 1024.0;
         ++divisions;
+    }
     const char *unit = divisions < std::size(units) ? units[divisions] : "";
     char number[64];
     snprintf(number, sizeof(number), "%.2f", size);
