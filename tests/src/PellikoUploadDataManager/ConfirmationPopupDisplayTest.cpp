@@ -13,6 +13,7 @@ namespace
 
 using test::ConfirmationPopup;
 using ::testing::Contains;
+using ::testing::HasSubstr;
 
 TEST_F(ConfirmationPopup, OneRecipientGetsTheSingleLayoutWithASummary)
 {
