@@ -15,7 +15,7 @@ REPORT = [
 # (uid, family name, given name, shown name, numbers with types, picture)
 CONTACTS = [
     ("mara-lindqvist", "Lindqvist", "Mara", "Mara Lindqvist",
-     [("CELL", "+44 7700 900101")], "contact-mara.jpg"),
+     [("CELL", "07700 900101")], "contact-mara.jpg"),
     ("kofi-danso", "Danso", "Kofi", "Kofi Danso", [("CELL", "+1 202 555 0142")], "contact-kofi.jpg"),
     ("jonas-weber", "Weber", "Jonas", "Jonas Weber", [("CELL", "+49 171 3920012")], None),
     ("xiaoming", "王", "小明", "王小明", [("CELL", "+44 7700 900104")], None),

@@ -94,6 +94,17 @@ def key(name):
     run("xdotool", "key", name)
 
 
+def type_into(label, text):
+    """Replaces the text of an entry as a person does: a press into it, all marked, removed, typed."""
+    press(label, "entry")
+    wait_still(0.2)
+    key("ctrl+a")
+    key("BackSpace")
+    if text:
+        run("xdotool", "type", "--delay", "5", "--", text)
+    wait_still(0.2)
+
+
 def wait_still(quiet=0.4, limit=5.0):
     """Waits until nothing was drawn on the screen for `quiet` seconds, so that a picture shows no half-drawn state."""
     display = Xlib.display.Display()

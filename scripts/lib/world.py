@@ -133,12 +133,13 @@ class BusName:
         self.name = name
         self.owner = None
         self.known = False
+        self.was_here = False
         self.watch = Gio.bus_watch_name(Gio.BusType.SESSION, name, Gio.BusNameWatcherFlags.NONE,
                                         self._appeared, self._vanished)
         wait_for(lambda: self.known, f"the bus to tell who owns {name}")
 
     def _appeared(self, _connection, _name, owner):
-        self.known, self.owner = True, owner
+        self.known, self.owner, self.was_here = True, owner, True
 
     def _vanished(self, _connection, _name):
         self.known, self.owner = True, None

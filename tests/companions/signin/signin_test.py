@@ -75,21 +75,10 @@ class SignInCase(unittest.TestCase):
         reply = json.loads(printed)
         return reply["result"], reply["extras"]
 
-    def type_into(self, label, text):
-        extents = screen.wait_for_control(label, "entry")
-        world.run("xdotool", "mousemove", str(extents.x + extents.width // 2), str(extents.y + extents.height // 2),
-                  "click", "1")
-        screen.wait_still(0.2)
-        screen.key("ctrl+a")
-        screen.key("BackSpace")
-        if text:
-            world.run("xdotool", "type", "--delay", "5", "--", text)
-        screen.wait_still(0.2)
-
     def fill(self, server=f"http://127.0.0.1:{PORT}", number=NUMBER, code=""):
-        self.type_into("Share server", server)
-        self.type_into("Your phone number", number)
-        self.type_into("Invitation code", code)
+        screen.type_into("Share server", server)
+        screen.type_into("Your phone number", number)
+        screen.type_into("Invitation code", code)
 
     def sign_in(self, **fields):
         self.fill(**fields)
