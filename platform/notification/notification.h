@@ -79,7 +79,7 @@ enum _notification_display_app {
     NOTIFICATION_DISPLAY_APP_TICKER = 0x00000002,
     NOTIFICATION_DISPLAY_APP_LOCK = 0x00000004,
     NOTIFICATION_DISPLAY_APP_INDICATOR = 0x00000008,
-    NOTIFICATION_DISPLAY_APP_ALL = (int)0xffffffff
+    NOTIFICATION_DISPLAY_APP_ALL = ~0
 };
 
 typedef enum _notification_sound_type {

@@ -235,10 +235,10 @@ int World::requestTo(const std::vector<std::pair<std::string, std::string>> &peo
                      const std::vector<std::string> &files, int32_t *id, bool wifiOnly)
 {
     std::vector<pelliko_recipient_s> records;
-    int32_t number = 11;
+    int32_t number_id = 11;
     for (const auto &[ccc, written] : people) {
         records.push_back({ccc.empty() ? nullptr : const_cast<char *>(ccc.c_str()),
-                           const_cast<char *>(written.c_str()), number++, 0});
+                           const_cast<char *>(written.c_str()), number_id++, 0});
     }
     std::vector<pelliko_recipient_s *> recipients;
     for (pelliko_recipient_s &record : records) {
