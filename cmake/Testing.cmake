@@ -87,5 +87,5 @@ function(pelliko_test_properties name timeout)
     set(timeout 120)
   endif()
   set_tests_properties(${name} PROPERTIES TIMEOUT ${timeout} ENVIRONMENT
-    "ASAN_OPTIONS=detect_leaks=0:abort_on_error=0;UBSAN_OPTIONS=print_stacktrace=1")
+    "ASAN_OPTIONS=detect_leaks=0:abort_on_error=0;ASAN_SYMBOLIZER_PATH=/usr/lib/llvm-16/bin/llvm-symbolizer;UBSAN_OPTIONS=print_stacktrace=1")
 endfunction()

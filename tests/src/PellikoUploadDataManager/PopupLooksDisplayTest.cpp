@@ -52,6 +52,7 @@ protected:
     {
         _createPopupView(ad);
         ASSERT_TRUE(settle(button("button2")));
+        ASSERT_TRUE(settle(ad->popup_layout));
         photograph("looks-" + name + "-" + size);
     }
 

@@ -154,6 +154,8 @@ protected:
         Ecore_Animator *frames = ecore_animator_add(
             [](void *data) -> Eina_Bool {
                 auto *of = static_cast<Watch *>(data);
+                // On a busy machine frames go by before a layout that waits is made.
+                evas_smart_objects_calculate(evas_object_evas_get(of->object));
                 const Box now = boxOf(of->object);
                 of->same = now == of->last ? of->same + 1 : 0;
                 of->last = now;
