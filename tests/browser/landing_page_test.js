@@ -6,9 +6,7 @@ const { execFileSync } = require('node:child_process');
 const crypto = require('node:crypto');
 const fs = require('node:fs');
 const path = require('node:path');
-const { packages, runCases, sha256 } = require('./support.js');
-
-const { chromium } = packages('playwright-core');
+const { openBrowser, runCases, sha256 } = require('./support.js');
 
 const files = [
   { name: 'Sunset over the harbour.jpg', bytes: crypto.randomBytes(2400000) },
@@ -25,22 +23,9 @@ async function makeLink(server, chosen) {
   return { share: share.share, ...(await server.finish(share.share)) };
 }
 
-/** Opens a fresh browser; its profile is gone with the server's directory. */
-function openBrowser(server, options = {}) {
-  return chromium.launchPersistentContext(
-    fs.mkdtempSync(path.join(server.directory, 'profile-')), {
-      executablePath: '/usr/bin/chromium',
-      args: ['--no-sandbox', '--disable-gpu', '--disable-quic', '--no-first-run',
-        '--disable-background-networking', '--disable-component-update', '--disable-sync'],
-      acceptDownloads: true,
-      javaScriptEnabled: false,
-      viewport: { width: 480, height: 800 },
-      ...options,
-    });
-}
-
 async function withBrowser(server, options, work) {
-  const browser = await openBrowser(server, options);
+  // The profile is gone with the server's directory.
+  const browser = await openBrowser(fs.mkdtempSync(path.join(server.directory, 'profile-')), options);
   try {
     const page = browser.pages()[0] ?? await browser.newPage();
     const complaints = [];

@@ -15,6 +15,19 @@ const packages = createRequire(path.join(process.env.PELLIKO_NODE_MODULES, 'pack
 
 const sha256 = (bytes) => crypto.createHash('sha256').update(bytes).digest('hex');
 
+/** Opens a fresh browser that keeps what it needs in `profile`. */
+function openBrowser(profile, options = {}) {
+  return packages('playwright-core').chromium.launchPersistentContext(profile, {
+    executablePath: '/usr/bin/chromium',
+    args: ['--no-sandbox', '--disable-gpu', '--disable-quic', '--no-first-run',
+      '--disable-background-networking', '--disable-component-update', '--disable-sync'],
+    acceptDownloads: true,
+    javaScriptEnabled: false,
+    viewport: { width: 480, height: 800 },
+    ...options,
+  });
+}
+
 class Server {
   static async start(build) {
     const server = new Server();
@@ -91,4 +104,4 @@ async function runCases(cases) {
   process.exitCode = failed === 0 ? 0 : 1;
 }
 
-module.exports = { packages, runCases, sha256 };
+module.exports = { openBrowser, packages, runCases, sha256 };
