@@ -71,14 +71,42 @@ def find(label, role=None):
     return None
 
 
+class _Drawing:
+    """Wakes the loop whenever something is drawn on the screen, and tells `drawn` if that is given."""
+
+    def __init__(self, drawn=None):
+        self.display = Xlib.display.Display()
+        self.display.damage_query_version()
+        self.display.screen().root.damage_create(Xlib.ext.damage.DamageReportRawRectangles)
+        self.display.sync()
+        self.drawn = drawn
+        self.watch = GLib.io_add_watch(self.display.fileno(), GLib.PRIORITY_DEFAULT, GLib.IOCondition.IN, self._read)
+
+    def _read(self, *_):
+        while self.display.pending_events():
+            self.display.next_event()
+        if self.drawn:
+            self.drawn()
+        return True
+
+    def close(self):
+        GLib.source_remove(self.watch)
+        self.display.close()
+
+
 def wait_for_control(label, role=None, limit=LIMIT):
-    """Waits until a control with this label shows and returns its extents."""
+    """Waits until a control with this label shows and returns its extents.
+
+    A program may announce a control a moment before it answers for it; what it draws then is looked at too.
+    """
     listener = lambda event: None  # noqa: E731 - its only purpose is to wake the loop
     for event in _EVENTS:
         pyatspi.Registry.registerEventListener(listener, event)
+    drawing = _Drawing()
     try:
         return wait_for(lambda: find(label, role), f"the control “{label}”", limit)
     finally:
+        drawing.close()
         for event in _EVENTS:
             pyatspi.Registry.deregisterEventListener(listener, event)
 
@@ -107,10 +135,6 @@ def type_into(label, text):
 
 def wait_still(quiet=0.4, limit=5.0):
     """Waits until nothing was drawn on the screen for `quiet` seconds, so that a picture shows no half-drawn state."""
-    display = Xlib.display.Display()
-    display.damage_query_version()
-    display.screen().root.damage_create(Xlib.ext.damage.DamageReportRawRectangles)
-    display.sync()
     loop = GLib.MainLoop()
     timers = {"quiet": 0}
 
@@ -118,22 +142,18 @@ def wait_still(quiet=0.4, limit=5.0):
         loop.quit()
         return False
 
-    def drawn(*_):
-        while display.pending_events():
-            display.next_event()
+    def drawn():
         GLib.source_remove(timers["quiet"])
         timers["quiet"] = GLib.timeout_add(int(quiet * 1000), settle)
-        return True
 
     timers["quiet"] = GLib.timeout_add(int(quiet * 1000), settle)
     timers["limit"] = GLib.timeout_add(int(limit * 1000), settle)
-    watch = GLib.io_add_watch(display.fileno(), GLib.PRIORITY_DEFAULT, GLib.IOCondition.IN, drawn)
+    drawing = _Drawing(drawn)
     loop.run()
-    GLib.source_remove(watch)
+    drawing.close()
     for timer in timers.values():
         if GLib.MainContext.default().find_source_by_id(timer):
             GLib.source_remove(timer)
-    display.close()
 
 
 def screenshot(path):
