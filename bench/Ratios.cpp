@@ -19,8 +19,7 @@ public:
     {
         for (const Run &run : runs) {
             if (run.run_type == Run::RT_Aggregate && run.aggregate_name == "median")
-                medians_[run.run_name.function_name + "/" + run.run_name.args] =
-                    run.GetAdjustedCPUTime();
+                medians_[nameOf(run)] = run.GetAdjustedCPUTime();
         }
         ConsoleReporter::ReportRuns(runs);
     }
@@ -33,6 +32,12 @@ public:
     }
 
 private:
+    static std::string nameOf(const Run &run)
+    {
+        const auto &name = run.run_name;
+        return name.args.empty() ? name.function_name : name.function_name + "/" + name.args;
+    }
+
     std::map<std::string, double> medians_;
 };
 

@@ -39,4 +39,11 @@ struct ContactCard {
     std::string picture; ///< bytes of an image file; empty keeps the picture that the contact has
 };
 
+/// What a person reads for the contact: its name, or else its first number.
+inline const std::string &shownName(const ContactCard &card)
+{
+    return card.display_name.empty() && !card.numbers.empty() ? card.numbers.front().number
+                                                              : card.display_name;
+}
+
 } // namespace pelliko::contacts

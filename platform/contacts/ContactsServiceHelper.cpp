@@ -82,9 +82,7 @@ void publish(ExportFiles &files, const Progress &progress)
 
 std::string stemOf(const ContactCard &card)
 {
-    if (card.display_name.empty() && !card.numbers.empty())
-        return fileStem(card.numbers.front().number);
-    return fileStem(card.display_name);
+    return fileStem(shownName(card));
 }
 
 // Reads all contacts as they were at one moment, whatever another program writes meanwhile.

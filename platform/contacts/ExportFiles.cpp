@@ -11,6 +11,8 @@
 
 #include <fcntl.h>
 #include <glib.h>
+#include <sys/file.h>
+#include <sys/stat.h>
 #include <unistd.h>
 
 namespace pelliko::contacts
@@ -21,6 +23,7 @@ namespace
 constexpr size_t stem_limit = 100;
 constexpr size_t buffer_size = size_t{256} << 10;
 constexpr const char *ending = ".vcf";
+constexpr const char *staging_start = ".export-";
 
 [[noreturn]] void fail()
 {
@@ -39,6 +42,34 @@ std::string trimmed(const std::string &text)
     if (first == std::string::npos)
         return {};
     return text.substr(first, text.find_last_not_of(" .") - first + 1);
+}
+
+// A descriptor that holds the folder's lock, or -1 with errno: EWOULDBLOCK when it is in use.
+int lockedFolder(const std::string &folder)
+{
+    const int descriptor = ::open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC);
+    if (descriptor < 0 || ::flock(descriptor, LOCK_EX | LOCK_NB) == 0)
+        return descriptor;
+    const int error = errno;
+    ::close(descriptor);
+    errno = error;
+    return -1;
+}
+
+// Hidden folders of exports whose program has ended. What cannot be removed is no reason to fail.
+void removeLeftovers(const std::string &directory)
+{
+    std::error_code ignored;
+    std::filesystem::directory_iterator entries(directory, ignored);
+    for (; entries != std::filesystem::directory_iterator(); entries.increment(ignored)) {
+        const std::filesystem::path &path = entries->path();
+        if (!path.filename().string().starts_with(staging_start))
+            continue;
+        const File lock(lockedFolder(path));
+        std::error_code not_removed;
+        if (lock.descriptor() >= 0)
+            std::filesystem::remove_all(path, not_removed);
+    }
 }
 
 } // namespace
@@ -65,10 +96,29 @@ ExportFiles::ExportFiles(std::string directory) : m_directory(std::move(director
 {
     while (m_directory.size() > 1 && m_directory.back() == '/')
         m_directory.pop_back();
-    std::string staging = m_directory + "/.export-XXXXXX";
-    if (!::mkdtemp(staging.data()))
-        fail();
-    m_staging = std::move(staging);
+    removeLeftovers(m_directory);
+    makeStaging();
+}
+
+void ExportFiles::makeStaging()
+{
+    struct stat state {
+    };
+    // Until it is locked, another export may take it for a left one.
+    do {
+        std::string staging = m_directory + "/" + staging_start + "XXXXXX";
+        if (!::mkdtemp(staging.data()))
+            fail();
+        m_staging = std::move(staging);
+        m_staging_lock.reset(lockedFolder(m_staging));
+        if (m_staging_lock.descriptor() < 0 && errno != ENOENT && errno != EWOULDBLOCK) {
+            const int error = errno;
+            ::rmdir(m_staging.c_str());
+            errno = error;
+            fail();
+        }
+    } while (m_staging_lock.descriptor() < 0 || ::fstat(m_staging_lock.descriptor(), &state) != 0 ||
+             state.st_nlink == 0);
 }
 
 ExportFiles::~ExportFiles()

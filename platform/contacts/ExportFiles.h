@@ -17,7 +17,8 @@ namespace pelliko::contacts
 std::string fileStem(const std::string &name);
 
 /// Files are written into a hidden folder beside their place first. What was not published is
-/// removed with the object. Everything throws std::system_error.
+/// removed with the object, and by the next one for the directory when a program ended amid an
+/// export. Everything throws std::system_error.
 class ExportFiles
 {
 public:
@@ -42,9 +43,11 @@ public:
 private:
     [[nodiscard]] std::string stagedPath(size_t index) const;
     void flush();
+    void makeStaging();
 
     std::string m_directory;
     std::string m_staging;
+    File m_staging_lock{-1}; ///< says that the hidden folder is in use
     std::vector<std::string> m_stems;
     std::map<std::string, int> m_next_number; ///< of a stem, so that many namesakes stay quick
     std::string m_buffer;

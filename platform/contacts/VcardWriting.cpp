@@ -3,11 +3,14 @@
 #include <algorithm>
 #include <array>
 #include <memory>
+#include <optional>
+#include <utility>
 
 #include <libebook-contacts/libebook-contacts.h>
 
 #include "NumberTypes.h"
 #include "PictureStore.h"
+#include "PlainVcard.h"
 
 namespace pelliko::contacts
 {
@@ -51,10 +54,7 @@ void appendText(EVCard *vcard, const char *name, const std::string &text)
 // languages, so all of it goes where programs look first when they put a name together.
 void appendName(EVCard *vcard, const ContactCard &card)
 {
-    const std::string &name = card.display_name.empty() && !card.numbers.empty()
-                                  ? card.numbers.front().number
-                                  : card.display_name;
-    const ValidText text(name);
+    const ValidText text(shownName(card));
     e_vcard_attribute_add_value(append(vcard, "FN"), text.get());
     EVCardAttribute *parts = append(vcard, "N");
     for (const char *part : {"", text.get(), "", "", ""})
@@ -119,6 +119,13 @@ void appendPicture(EVCard *vcard, const std::string &bytes)
 } // namespace
 
 std::string vcardText(const ContactCard &card)
+{
+    // The library takes as long for a card as the store, and nearly all cards are plain.
+    std::optional<std::string> plain = plainVcardText(card);
+    return plain ? std::move(*plain) : vcardTextByLibrary(card);
+}
+
+std::string vcardTextByLibrary(const ContactCard &card)
 {
     const Owned<EVCard> vcard(e_vcard_new(), g_object_unref);
     appendName(vcard.get(), card);

@@ -12,4 +12,7 @@ namespace pelliko::contacts
 /// inside. Throws std::bad_alloc only.
 std::string vcardText(const ContactCard &card);
 
+/// The same bytes, made by the vCard library in any case.
+std::string vcardTextByLibrary(const ContactCard &card);
+
 } // namespace pelliko::contacts

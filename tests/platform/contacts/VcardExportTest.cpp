@@ -1,6 +1,7 @@
 // Contacts written to files, and read back by another implementation.
 #include <fstream>
 #include <iterator>
+#include <random>
 #include <set>
 #include <sstream>
 #include <thread>
@@ -9,11 +10,15 @@
 #include <csignal>
 #include <glib.h>
 #include <sys/resource.h>
+#include <sys/wait.h>
+#include <unistd.h>
 
 #include "ContactsFixture.h"
 #include "ExportFiles.h"
 #include "MyProfile.h"
+#include "PlainVcard.h"
 #include "VcardImport.h"
+#include "VcardWriting.h"
 #include "contacts_service_helper.h"
 
 namespace pelliko::contacts::test
@@ -300,6 +305,37 @@ TEST_F(VcardExport, AFileThatCannotGrowLeavesNothing)
     EXPECT_EQ(left(), std::set<std::string>{});
 }
 
+TEST_F(VcardExport, WhatACrashLeftIsClearedByTheNextExportAndWhatIsInUseStays)
+{
+    const std::string ann = addContact(card("Ann", "1"));
+    // A program that ends amid an export leaves its hidden folder.
+    const pid_t child = fork();
+    if (child == 0) {
+        auto *left_open = new ExportFiles(directory());
+        left_open->begin("half");
+        _exit(0);
+    }
+    waitpid(child, nullptr, 0);
+    ASSERT_EQ(left().size(), 1U);
+    std::ofstream(directory() + ".export-a-file") << "not ours";
+    std::filesystem::create_directory(m_folder / "elsewhere");
+    std::ofstream(m_folder / "elsewhere/kept") << "x";
+    std::filesystem::create_directory_symlink(m_folder / "elsewhere", directory() + ".export-link");
+    std::string going_on;
+    {
+        ExportFiles other(directory());
+        other.begin("going on");
+        other.write("text");
+        EXPECT_EQ(exported({ann}, 1), Names{"Ann.vcf"});
+        other.finish();
+        going_on = other.publish(0);
+    }
+    EXPECT_EQ(text(going_on), "text");
+    EXPECT_EQ(left(),
+              (std::set<std::string>{".export-a-file", ".export-link", "Ann.vcf", "going on.vcf"}));
+    EXPECT_TRUE(std::filesystem::exists(m_folder / "elsewhere/kept"));
+}
+
 TEST_F(VcardExport, TheCallbackMayStopTheExport)
 {
     const Names ids = {addContact(card("Ann", "1")), addContact(card("Bob", "2")),
@@ -341,6 +377,51 @@ TEST_F(VcardExport, TheProfileIsExportedWhateverTheId)
     EXPECT_EQ(read["name"], "Me, myself");
     EXPECT_EQ(read["numbers"].size(), 2U);
     EXPECT_EQ(read["picture"], sumOf(me.picture));
+}
+
+TEST(PlainVcards, AreByteForByteWhatTheLibraryWrites)
+{
+    const Names pieces = {"a",  "Z9", " ", "+49",    "-",    ":",       "=",
+                          "\"", "'",  "Ä", "王小明", "🙂", "e\u0301", "longer words"};
+    const Names awkward = {";",  ",",    "\\",   "\n",       "\r\n",
+                           "\t", "\x7f", "\xff", "\xe7\x8e", "BEGIN:VCARD"};
+    std::mt19937 dice(4711);
+    const auto below = [&](size_t end) { return dice() % end; };
+    const auto someText = [&] {
+        std::string made;
+        for (size_t left = below(12); left > 0; --left)
+            made += below(60) == 0 ? awkward[below(awkward.size())] : pieces[below(pieces.size())];
+        return made;
+    };
+    int plain_ones = 0;
+    int others = 0;
+    for (int round = 0; round < 5000; ++round) {
+        ContactCard made;
+        made.display_name = someText();
+        made.uid = someText();
+        for (size_t left = below(4); left > 0; --left)
+            made.numbers.push_back({someText(), static_cast<int>(below(256)),
+                                    below(30) == 0 ? "Boat" : "", below(2) == 0, false});
+        const auto plain = plainVcardText(made);
+        ++(plain ? plain_ones : others);
+        if (plain) {
+            ASSERT_EQ(*plain, vcardTextByLibrary(made));
+        }
+    }
+    EXPECT_GT(plain_ones, 1000);
+    EXPECT_GT(others, 1000);
+}
+
+TEST(PlainVcards, LinesAreCopiedUpToTheLengthAtWhichTheyAreFolded)
+{
+    for (size_t length = 60; length < 90; ++length) {
+        ContactCard made;
+        made.display_name = "x";
+        made.uid.assign(length, 'u');
+        const auto plain = plainVcardText(made);
+        EXPECT_EQ(plain.has_value(), length <= 71) << length;
+        EXPECT_EQ(vcardText(made), vcardTextByLibrary(made));
+    }
 }
 
 TEST_F(VcardExport, WhatIsExportedComesInAgainAsItWas)
