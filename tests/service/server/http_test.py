@@ -1,5 +1,5 @@
 #!/usr/bin/python3
-"""Runs the HTTP-level suites named, else all but that of pushes, against the server given as the first argument."""
+"""Runs the HTTP-level suites named, else all but those of pushes, against the server given as the first argument."""
 
 import pathlib
 import sys
