@@ -89,6 +89,8 @@ runCases({
     const starts = [];
     await upload(server, content, {
       uploadUrl,
+      // What the cut connection had sent may still come in behind the offset that was asked for: 409.
+      retryDelays: [0, 0, 0],
       onProgress: (sent) => starts.push(sent),
     });
     assert.ok(starts[0] > 10 * MIB && starts[0] <= 15 * MIB, `it went on at ${starts[0]}`);
