@@ -31,8 +31,9 @@ bool PartFile::begin(long status)
     }
     // The whole file comes when the server does not do parts.
     written_ = status == partialContent ? from_ : 0;
-    file_ = open(path_.c_str(), O_WRONLY | O_CREAT | O_CLOEXEC | O_NOFOLLOW, 0666);
-    if (file_ < 0 || ftruncate(file_, written_) != 0 || lseek(file_, written_, SEEK_SET) < 0) {
+    const int empty = written_ == 0 ? O_TRUNC : 0;
+    file_ = open(path_.c_str(), O_WRONLY | O_CREAT | O_CLOEXEC | O_NOFOLLOW | empty, 0666);
+    if (file_ < 0 || lseek(file_, written_, SEEK_SET) < 0) {
         return failedBySystem();
     }
     return true;

@@ -2,10 +2,12 @@
 
 #include "AccountWatch.h"
 #include "AppLauncher.h"
+#include "JoinedBook.h"
 #include "PushChannel.h"
 #include "PushDelivery.h"
 #include "ServiceObject.h"
 #include "SharesObject.h"
+#include "StoreMarks.h"
 #include "TransferThread.h"
 
 #include <gio/gio.h>
@@ -50,6 +52,7 @@ public:
                      }),
           delivery_(context_, journal_, [this] { shares_.changed(); }),
           push_(context_, journal_, [this] { delivery_.kick(); }),
+          contacts_([this] { book_.lookSoon(); }), book_(context_, *queue_, contacts_),
           account_(settings.accountFile, [this] { accountChanged(); })
     {
         uploads_.load();
@@ -74,12 +77,14 @@ private:
     {
         uploads_.networkChanged();
         push_.networkChanged();
+        book_.networkChanged();
         goOn();
     }
 
     void accountChanged()
     {
         push_.accountChanged();
+        book_.lookSoon();
         goOn();
     }
 
@@ -103,6 +108,8 @@ private:
     Downloads downloads_;
     PushDelivery delivery_;
     PushChannel push_;
+    StoreMarks contacts_;
+    JoinedBook book_;
     AccountWatch account_;
 };
 

@@ -98,8 +98,23 @@ CREATE TABLE received_files (
 ) WITHOUT ROWID;
 )sql";
 
+// Who of the contacts has joined, and how often the server was asked.
+constexpr const char *withJoined = R"sql(
+CREATE TABLE joined_numbers (
+  e164 TEXT PRIMARY KEY,
+  server TEXT NOT NULL,
+  joined INTEGER NOT NULL,
+  marked INTEGER NOT NULL DEFAULT 0,
+  asked_at INTEGER NOT NULL
+) WITHOUT ROWID;
+CREATE TABLE joined_questions (
+  asked_at INTEGER NOT NULL,
+  numbers INTEGER NOT NULL
+);
+)sql";
+
 /** The way from each version of the layout to the next; a fresh file goes all of it. */
-constexpr std::array layouts{firstLayout, withForms, withReceived};
+constexpr std::array layouts{firstLayout, withForms, withReceived, withJoined};
 
 std::unique_ptr<SQLite::Database> openDatabase(const std::string &file)
 {

@@ -165,7 +165,8 @@ TEST_F(Queue, aQueueOfTheFirstLayoutIsTakenOver)
                            "ALTER TABLE requests DROP COLUMN withdrawn;"
                            "ALTER TABLE requests DROP COLUMN forgotten;"
                            "DROP TABLE push_positions; DROP TABLE received_files;"
-                           "DROP TABLE received;"
+                           "DROP TABLE received; DROP TABLE joined_numbers;"
+                           "DROP TABLE joined_questions;"
                            "PRAGMA user_version = 1",
                            nullptr, nullptr, nullptr),
               SQLITE_OK);
