@@ -5,6 +5,7 @@
 #include "PellikoApp/Operation.h"
 #include "PellikoApp/ProcessingPopup.h"
 #include "PellikoApp/ShareRequest.h"
+#include "PellikoApp/SharedData.h"
 #include "PellikoUploadManager/ExitPolicy.h"
 
 #include <Ecore.h>
@@ -26,7 +27,6 @@ namespace pelliko
 namespace
 {
 
-constexpr const char *vcardDirectory = "/opt/usr/apps/com.velmora.pelliko/shared/data/";
 constexpr const char *oneFileKey = "db/contacts-svc/share_multiple_contacts_as_one_file";
 constexpr const char *myProfileType = "my_profile";
 constexpr int maxFiles = 10; // of one share
@@ -122,10 +122,11 @@ void _readRequest(VcardJob &job, const char *operation)
 int _writeFiles(VcardJob &job, int request_cnt)
 {
     if (!job.is_my_profile)
-        return contacts_service_helper_create_vcard_files(
-            vcardDirectory, job.id_list, request_cnt, job.share_mode, _makeVcardContactCb, &job);
+        return contacts_service_helper_create_vcard_files(sharedDataDirectory, job.id_list,
+                                                          request_cnt, job.share_mode,
+                                                          _makeVcardContactCb, &job);
     const char *id = job.id_list ? job.id_list[0] : nullptr;
-    return contacts_service_helper_create_vcard_file_by_my_profile(vcardDirectory, id,
+    return contacts_service_helper_create_vcard_file_by_my_profile(sharedDataDirectory, id,
                                                                    _makeVcardContactCb, &job);
 }
 
@@ -228,7 +229,7 @@ bool _makeVcardContactCb(const char *file_name, int progress_count, void *job)
     if (progress_count != 1 && thd->share_mode == 0)
         return true;
     char path[pathSize];
-    snprintf(path, sizeof(path), "%s%s", vcardDirectory, file_name);
+    snprintf(path, sizeof(path), "%s%s", sharedDataDirectory, file_name);
     g_free(thd->ad->vcf_path);
     thd->ad->vcf_path = g_strdup(path);
     return true;

@@ -2,6 +2,7 @@
 
 #include "AppLog/AppLog.h"
 #include "PellikoApp/Decimal.h"
+#include "PellikoApp/SharedData.h"
 #include "PellikoApp/TextArray.h"
 #include "PellikoApp/TextFormat.h"
 #include "PellikoUploadDataManager/SupportedFileTypes.h"
@@ -26,7 +27,6 @@ namespace pelliko
 namespace
 {
 
-constexpr const char *memoDirectory = "/opt/usr/apps/com.velmora.pelliko/shared/data/";
 constexpr const char *uploadResumeKey = "upload_resume";
 constexpr const char *typeNotSupportedId = "IDS_RSH_TPOP_CANT_SHARE_FILES_FILE_TYPE_NOT_SUPPORTED";
 constexpr const char *deviceErrorId =
@@ -89,7 +89,7 @@ std::string _memoPath()
     char stamp[32];
     strftime(stamp, sizeof(stamp), "%Y%m%d_%H%M%S", &local);
     char path[memoPathSize];
-    snprintf(path, sizeof(path), "%smemo_%s.txt", memoDirectory, stamp);
+    snprintf(path, sizeof(path), "%smemo_%s.txt", sharedDataDirectory, stamp);
     return path;
 }
 

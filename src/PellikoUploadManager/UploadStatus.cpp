@@ -2,6 +2,7 @@
 
 #include "AppLog/AppLog.h"
 #include "PellikoApp/AppData.h"
+#include "PellikoApp/SharedData.h"
 #include "PellikoDatabaseManager/UploadInfoDatabase.h"
 #include "PellikoNotificationManager/NotificationPrimitives.h"
 #include "PellikoNotificationManager/UploadNotifications.h"
@@ -22,8 +23,6 @@ namespace pelliko
 
 namespace
 {
-
-constexpr const char *sharedDataDirectory = "/opt/usr/apps/com.velmora.pelliko/shared/data/";
 
 enum class AfterStatus { refresh, done };
 
