@@ -19,14 +19,9 @@ class Restart(share_case.ShareCase):
         return data
 
     def test_application_and_service_killed_together_resume_after_the_restart(self):
-        service = world.BusName(world.SERVICE)
         data = self.start_slow_share("journey.mp4", 20_000_000)
         request = world.requests()[-1]["id"]
-        # Both at once, as when the power goes; the service first, so that it cannot see the other leave.
-        os.kill(service.process_id(), signal.SIGKILL)
-        os.kill(self.application.process_id(), signal.SIGKILL)
-        service.wait_gone()
-        self.application.wait_gone()
+        self.kill_application_and_service()
 
         world.activation_environment(PELLIKO_UPLOAD_RATE="0")
         self.assertEqual(request, world.requests()[-1]["id"])  # the call starts the service again

@@ -4,6 +4,7 @@ behind when a case fails."""
 import os
 import random
 import shutil
+import signal
 import sys
 import unittest
 
@@ -105,6 +106,14 @@ class ShareCase(unittest.TestCase):
         self.assertEqual(sorted(files), sorted(found))
         for name, data in files.items():
             self.assertEqual(world.sha256(data), world.sha256(found[name]), name)
+
+    def kill_application_and_service(self):
+        """Both at once, as when the power goes; the service first, so that it cannot see the other leave."""
+        service = world.BusName(world.SERVICE)
+        os.kill(service.process_id(), signal.SIGKILL)
+        os.kill(self.application.process_id(), signal.SIGKILL)
+        service.wait_gone()
+        self.application.wait_gone()
 
     def pending_rows(self):
         """The rows of the application's table of pending uploads."""

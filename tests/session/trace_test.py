@@ -169,18 +169,13 @@ class Trace(share_case.ShareCase):
 
     def crash_while_uploading(self, size):
         """Leaves one upload that nobody works on; its request id."""
-        service = world.BusName(world.SERVICE)
         world.stop_service()
         world.activation_environment(PELLIKO_UPLOAD_RATE="1000000")
         world.share([self.file("c.mp4", share_case.random_bytes(size))], [self.ann])
         self.confirm()
         world.wait_for(lambda: any(i["progress"] > 0 for i in self.posted(event="update")), "some progress")
         request = world.requests()[-1]["id"]
-        # The service first, so that it cannot see the other leave.
-        os.kill(service.process_id(), signal.SIGKILL)
-        os.kill(self.application.process_id(), signal.SIGKILL)
-        service.wait_gone()
-        self.application.wait_gone()
+        self.kill_application_and_service()
         world.activation_environment(PELLIKO_UPLOAD_RATE="0")
         return request
 

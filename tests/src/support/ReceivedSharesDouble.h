@@ -1,8 +1,9 @@
 #pragma once
 
+#include "support/ServiceOnBus.h"
+
 #include <Ecore.h>
 #include <gio/gio.h>
-#include <gtest/gtest.h>
 #include <map>
 #include <mutex>
 #include <string>
@@ -25,27 +26,8 @@ struct KnownShare {
 class ReceivedSharesDouble
 {
 public:
-    ReceivedSharesDouble()
-    {
-        connection_ = g_dbus_connection_new_for_address_sync(
-            g_getenv("DBUS_SESSION_BUS_ADDRESS"),
-            static_cast<GDBusConnectionFlags>(G_DBUS_CONNECTION_FLAGS_AUTHENTICATION_CLIENT |
-                                              G_DBUS_CONNECTION_FLAGS_MESSAGE_BUS_CONNECTION),
-            nullptr, nullptr, nullptr);
-        g_dbus_connection_add_filter(connection_, filter, this, nullptr);
-        constexpr guint32 replace = 3; // allow and do replacement
-        g_autoptr(GVariant) answer = g_dbus_connection_call_sync(
-            connection_, "org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DBus",
-            "RequestName", g_variant_new("(su)", "com.velmora.pelliko.Service", replace), nullptr,
-            G_DBUS_CALL_FLAGS_NONE, -1, nullptr, nullptr);
-        EXPECT_NE(answer, nullptr);
-    }
-    ~ReceivedSharesDouble()
-    {
-        release();
-        g_dbus_connection_close_sync(connection_, nullptr, nullptr);
-        g_object_unref(connection_);
-    }
+    ReceivedSharesDouble() = default;
+    ~ReceivedSharesDouble() { release(); }
     ReceivedSharesDouble(const ReceivedSharesDouble &) = delete;
     ReceivedSharesDouble &operator=(const ReceivedSharesDouble &) = delete;
 
@@ -116,8 +98,8 @@ private:
         const KnownShare share = found == shares_.end() ? KnownShare{{}, {}, 0, -2} : found->second;
         GDBusMessage *reply = g_dbus_message_new_method_reply(call);
         g_dbus_message_set_body(reply, g_variant_new("(i@a{sv})", share.error, recordOf(share)));
-        g_dbus_connection_send_message(connection_, reply, G_DBUS_SEND_MESSAGE_FLAGS_NONE, nullptr,
-                                       nullptr);
+        g_dbus_connection_send_message(bus_.connection(), reply, G_DBUS_SEND_MESSAGE_FLAGS_NONE,
+                                       nullptr, nullptr);
         g_object_unref(reply);
         g_object_unref(call);
     }
@@ -143,11 +125,11 @@ private:
     }
 
     mutable std::mutex lock_;
-    GDBusConnection *connection_ = nullptr;
     std::map<std::string, KnownShare> shares_;
     std::string held_token_;
     std::vector<GDBusMessage *> held_;
     std::vector<std::string> asked_;
+    ServiceOnBus bus_{filter, this};
 };
 
 } // namespace pelliko::test

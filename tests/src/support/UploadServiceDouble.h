@@ -1,7 +1,8 @@
 #pragma once
 
+#include "support/ServiceOnBus.h"
+
 #include <gio/gio.h>
-#include <gtest/gtest.h>
 #include <mutex>
 #include <string>
 #include <vector>
@@ -15,26 +16,7 @@ namespace pelliko::test
 class UploadServiceDouble
 {
 public:
-    UploadServiceDouble()
-    {
-        connection_ = g_dbus_connection_new_for_address_sync(
-            g_getenv("DBUS_SESSION_BUS_ADDRESS"),
-            static_cast<GDBusConnectionFlags>(G_DBUS_CONNECTION_FLAGS_AUTHENTICATION_CLIENT |
-                                              G_DBUS_CONNECTION_FLAGS_MESSAGE_BUS_CONNECTION),
-            nullptr, nullptr, nullptr);
-        g_dbus_connection_add_filter(connection_, filter, this, nullptr);
-        constexpr guint32 replace = 3; // allow and do replacement
-        g_autoptr(GVariant) answer = g_dbus_connection_call_sync(
-            connection_, "org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DBus",
-            "RequestName", g_variant_new("(su)", "com.velmora.pelliko.Service", replace), nullptr,
-            G_DBUS_CALL_FLAGS_NONE, -1, nullptr, nullptr);
-        EXPECT_NE(answer, nullptr);
-    }
-    ~UploadServiceDouble()
-    {
-        g_dbus_connection_close_sync(connection_, nullptr, nullptr);
-        g_object_unref(connection_);
-    }
+    UploadServiceDouble() = default;
     UploadServiceDouble(const UploadServiceDouble &) = delete;
     UploadServiceDouble &operator=(const UploadServiceDouble &) = delete;
 
@@ -119,10 +101,10 @@ private:
     }
 
     mutable std::mutex lock_;
-    GDBusConnection *connection_ = nullptr;
     int code_ = 0, id_ = 0, files_ = 0;
     gint64 bytes_ = 0;
     std::vector<std::string> calls_;
+    ServiceOnBus bus_{filter, this};
 };
 
 } // namespace pelliko::test
