@@ -1,4 +1,5 @@
-"""A share without an account: the application asks for a sign-in, and the share goes on after it."""
+"""A person without an account shares: the sign-in program opens, and the share goes on after it or ends with it. Answers
+that the program does not give are in sign_in_answers_test.py."""
 
 import json
 import os
@@ -13,12 +14,12 @@ ACCOUNT = os.path.join(os.environ["XDG_CONFIG_HOME"], "pelliko", "account.json")
 NUMBER = "+4915112345678"
 
 
-class SignIn(share_case.ShareCase):
+class SignInProgram(share_case.ShareCase):
     def setUp(self):
         super().setUp()
         os.remove(ACCOUNT)
         # The service runs before there is an account and is not told that one came.
-        world.requests()
+        self.requests_before = len(world.requests())
         self.person = world.add_contact("Ann Example", "+44 7700 900123")
         world.share([self.file("note.txt", b"note")], [self.person])
         screen.wait_for_control("Sign in", "button")
@@ -49,8 +50,11 @@ class SignIn(share_case.ShareCase):
     def test_a_cancelled_sign_in_ends_the_share(self):
         screen.key("Escape")
         self.application.wait_gone()
-        self.assertIn("Not supported result : -2", self.log_lines())
+        self.assertEqual(["Not supported result : -2", "Exit App!!!",
+                          "No upload_data request id exist so app is exiting"], self.log_lines()[-3:])
+        self.assertEqual([], self.posted())
         self.assertEqual([], self.messages(0))
+        self.assertEqual(self.requests_before, len(world.requests()))
         self.assertFalse(os.path.exists(ACCOUNT))
         self.restore()
 

@@ -1,4 +1,5 @@
-"""Somebody without an account shares: the sign-in comes first, and the share goes on after it or ends with it."""
+"""What the application asks a sign-in for, and what it makes of answers that the sign-in program cannot be led to: a
+stand-in on the bus gives them. The way of a person through the program itself is in sign_in_program_test.py."""
 
 import json
 import os
@@ -43,7 +44,7 @@ class SignInApplication:
                            GLib.Variant("(s)", ("com.velmora.korrin",)), None, Gio.DBusCallFlags.NONE, -1)
 
 
-class SignIn(share_case.ShareCase):
+class SignInAnswers(share_case.ShareCase):
     def setUp(self):
         super().setUp()
         self.requests_before = len(world.requests())
@@ -59,34 +60,25 @@ class SignIn(share_case.ShareCase):
         if os.path.exists(ACCOUNT + ".away"):
             os.rename(ACCOUNT + ".away", ACCOUNT)
 
-    def assert_nothing_came_of_it(self):
+    def test_a_failed_sign_in_says_why_and_uploads_nothing(self):
+        self.sign_in.answer(-1, errorCode="7", errorMessage="code used up")
         self.application.wait_gone()
         self.assertEqual([], self.posted())
         self.assertEqual([], self.messages(0))
         self.assertEqual(self.requests_before, len(world.requests()))
-
-    def test_a_cancelled_sign_in_uploads_nothing(self):
-        self.sign_in.answer(-2)
-        self.assert_nothing_came_of_it()
-        self.assertEqual(["Not supported result : -2", "Exit App!!!",
-                          "No upload_data request id exist so app is exiting"], self.log_lines()[-3:])
-
-    def test_a_failed_sign_in_says_why_and_uploads_nothing(self):
-        self.sign_in.answer(-1, errorCode="7", errorMessage="code used up")
-        self.assert_nothing_came_of_it()
         self.assertEqual(["error_code :[7]: code used up", "Exit App!!!",
                           "No upload_data request id exist so app is exiting"], self.log_lines()[-3:])
 
-    def test_the_share_goes_on_after_the_sign_in(self):
+    def test_the_service_is_named_and_the_sim_of_the_answer_is_kept(self):
         self.assertEqual("http://velmora.com/korrin/appcontrol/operation/auth", self.asked["operation"])
         self.assertEqual(["zorp"], self.asked["extras"]["server"])
         os.rename(ACCOUNT + ".away", ACCOUNT)
         self.sign_in.answer(0, imsi="262010000000001", accessToken="a", duid="d", pushToken="p", msisdn="+49")
         self.confirm()
         self.wait_sent_and_gone()
-        self.assert_downloads_equal(self.messages(1)[0], {"note.txt": b"to be shared"})
         with open(ACCOUNT, encoding="utf-8") as file:
             self.assertEqual("262010000000001", json.load(file)["imsi"])
+
 
 if __name__ == "__main__":
     unittest.main(verbosity=2)
