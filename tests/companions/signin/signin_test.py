@@ -198,6 +198,52 @@ class Failing(SignInCase):
         self.assertEqual((-1, "certificate"), (result, extras["errorCode"]))
 
 
+    def test_too_many_attempts_say_when_to_come_back(self):
+        url = self.strict_server()
+        body = json.dumps({"number": NUMBER, "code": "A" * 22})
+        world.run("curl", "-sS", "-H", "Idempotency-Key: first", "-d", body, url + "/api/v1/accounts")
+        self.launch()
+        self.sign_in(server=url, code="B" * 22)
+        self.expect("There were too many attempts. Try again in 60 minutes.", "too-many")
+        result, extras = self.close()
+        self.assertEqual((-1, "too_many_attempts"), (result, extras["errorCode"]))
+
+    def strict_server(self):
+        """The address of a server that takes one attempt in an hour."""
+        data = os.path.join(os.environ["PELLIKO_STATE"], "strict-server")
+        reading, writing = os.pipe()
+        server = subprocess.Popen(["pelliko-server", "serve", "--data", data, "--listen", "127.0.0.1:0",
+                                   "--registration-limit", "1", "--ready-fd", str(writing)],
+                                  pass_fds=[writing], stderr=subprocess.DEVNULL)
+        self.addCleanup(server.wait)
+        self.addCleanup(server.terminate)
+        os.close(writing)
+        with os.fdopen(reading) as ready:
+            return ready.readline().strip()
+
+    def test_an_account_that_cannot_be_stored_keeps_its_code(self):
+        code = account_command("invite")
+        folder = os.path.dirname(ACCOUNT)
+        os.makedirs(folder, exist_ok=True)
+        os.rename(folder, folder + ".away")
+        with open(folder, "w", encoding="utf-8"):
+            pass
+
+        def give_back():
+            if os.path.isfile(folder):
+                os.remove(folder)
+                os.rename(folder + ".away", folder)
+        self.addCleanup(give_back)
+        self.launch()
+        self.sign_in(code=code)
+        self.expect("The account could not be stored on this phone. Make room and try again: the code still works for you.",
+                    "cannot-store")
+        give_back()
+        screen.press("Sign in", "button")
+        self.assertEqual(0, self.reply()[0])
+        self.assertEqual(NUMBER, self.account()["number"])
+
+
 class Cancelling(SignInCase):
     def test_escape_changes_nothing(self):
         self.launch()
