@@ -4,6 +4,8 @@
 #include "Serialisation.h"
 #include "notification.h"
 
+#include <nlohmann/json.hpp>
+
 namespace pelliko::quickpanel_tool
 {
 namespace
@@ -88,8 +90,6 @@ std::string word(const Variant &dictionary, const char *key)
     return value;
 }
 
-} // namespace
-
 ordered_json notificationJson(const Variant &notification)
 {
     const Record record = notification::recordFrom(notification.get());
@@ -133,6 +133,48 @@ ordered_json eventJson(const Variant &event)
         json["replaced"] = replaced;
     json.update(notificationJson(event));
     return json;
+}
+
+std::string plain(const ordered_json &value)
+{
+    return value.is_null() ? "-" : value.is_string() ? value.get<std::string>() : value.dump();
+}
+
+std::string summary(const ordered_json &json)
+{
+    std::string line = plain(json["id"]) + "  " + plain(json["app"]) + "  tag " +
+                       plain(json["tag"]) + "  " + plain(json["title"]);
+    if (!json["content"].is_null())
+        line += " | " + plain(json["content"]);
+    return line;
+}
+
+std::string lineOf(const ordered_json &event)
+{
+    if (event["event"] == "toast")
+        return plain(event["time"]) + "  toast   " + plain(event["message"]);
+    return plain(event["time"]) + "  " + plain(event["event"]) + "  " + summary(event);
+}
+
+} // namespace
+
+std::string notificationsJson(const std::vector<Variant> &notifications)
+{
+    ordered_json all = ordered_json::array();
+    for (const Variant &notification : notifications)
+        all.push_back(notificationJson(notification));
+    return all.dump(2);
+}
+
+std::string notificationLine(const Variant &notification)
+{
+    return summary(notificationJson(notification));
+}
+
+Event eventOf(const Variant &event)
+{
+    const ordered_json json = eventJson(event);
+    return {plain(json["app"]), json.dump(), lineOf(json)};
 }
 
 } // namespace pelliko::quickpanel_tool

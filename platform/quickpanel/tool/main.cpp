@@ -22,63 +22,40 @@ struct Options {
     int count = 0;
 };
 
-std::string plain(const nlohmann::ordered_json &value)
-{
-    return value.is_null() ? "-" : value.is_string() ? value.get<std::string>() : value.dump();
-}
-
-void printLine(const nlohmann::ordered_json &json)
-{
-    // A watching script reads line by line.
-    std::cout << json.dump() << std::endl;
-}
-
-std::string summary(const nlohmann::ordered_json &json)
-{
-    std::string line = plain(json["id"]) + "  " + plain(json["app"]) + "  tag " +
-                       plain(json["tag"]) + "  " + plain(json["title"]);
-    if (!json["content"].is_null())
-        line += " | " + plain(json["content"]);
-    return line;
-}
-
 void list(const Options &options)
 {
-    auto all = nlohmann::ordered_json::array();
-    for (const auto &item : postedNotifications(options.app))
-        all.push_back(notificationJson(item));
+    const auto all = postedNotifications(options.app);
     if (options.json) {
-        std::cout << all.dump(2) << std::endl;
+        std::cout << notificationsJson(all) << std::endl;
         return;
     }
-    for (const auto &json : all)
-        std::cout << summary(json) << std::endl;
+    for (const auto &item : all)
+        std::cout << notificationLine(item) << std::endl;
+}
+
+bool isOfInterest(const Event &event, const Options &options)
+{
+    return options.app.empty() || event.app == options.app;
 }
 
 void history(const Options &options)
 {
     for (const auto &item : pastEvents()) {
-        const auto json = eventJson(item);
-        if (!options.app.empty() && json["app"] != options.app)
-            continue;
-        if (options.json)
-            printLine(json);
-        else if (json["event"] == "toast")
-            std::cout << plain(json["time"]) << "  toast   " << plain(json["message"]) << std::endl;
-        else
-            std::cout << plain(json["time"]) << "  " << plain(json["event"]) << "  "
-                      << summary(json) << std::endl;
+        const Event event = eventOf(item);
+        if (isOfInterest(event, options))
+            std::cout << (options.json ? event.json : event.line) << std::endl;
     }
 }
 
 void watchEvents(const Options &options)
 {
     int left = options.count;
-    watch(options.since, [&](const Variant &event) {
-        const auto json = eventJson(event);
-        if (!options.app.empty() && json["app"] != options.app)
+    watch(options.since, [&](const Variant &item) {
+        const Event event = eventOf(item);
+        if (!isOfInterest(event, options))
             return true;
-        printLine(json);
+        // A watching script reads line by line.
+        std::cout << event.json << std::endl;
         return options.count == 0 || --left > 0;
     });
 }
