@@ -166,13 +166,15 @@ bool _takeTokens(PellikoAppData *ad, app_control_h request)
     return true;
 }
 
-void _wait(app_control_h request)
+// The push in turn is the operation from now on: the one before must not run a second time for it.
+void _wait(PellikoAppData *ad, app_control_h request)
 {
     app_control_h clone = nullptr;
     if (app_control_clone(&clone, request) != APP_CONTROL_ERROR_NONE)
         return;
     LOG_DEBUG("a push is under way, this one waits");
     _turns().waiting.emplace_back(clone);
+    ad->operation_type = OPERATION_PUSH;
 }
 
 // True when a push that waited is under way now.
@@ -324,7 +326,7 @@ void _forwardPushAppControl(app_control_h request)
 void receivePush(PellikoAppData *ad, app_control_h request)
 {
     if (_turns().under_way) {
-        _wait(request);
+        _wait(ad, request);
     } else if (_takeTokens(ad, request)) {
         ad->operation_type = OPERATION_PUSH;
         _receiverLaunchPushNotiThread(ad);

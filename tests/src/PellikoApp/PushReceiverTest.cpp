@@ -8,6 +8,7 @@
 #include "support/ContactsStore.h"
 #include "support/LaunchRequest.h"
 #include "support/ReceivedSharesDouble.h"
+#include "support/RefusingStore.h"
 
 #include <Ecore.h>
 #include <app_preference.h>
@@ -247,6 +248,33 @@ TEST_F(PushReceiver, ASecondPushWaitsForTheFirst)
     EXPECT_EQ(kept(), "1 T1|");
     EXPECT_EQ(times(">>>>>>>>>>>>> noti create success <<<<<<<<<<<<<<<<"), 3);
     EXPECT_EQ(times(left), 1);
+}
+
+TEST_F(PushReceiver, APushThatWaitsDoesNotRepeatTheOperationBefore)
+{
+    service.hold("T1");
+    push({"T1"});
+    ad->operation_type = OPERATION_SEND_SMS; // asked for meanwhile, and done
+    push({"T2"});
+    EXPECT_EQ(ad->operation_type, OPERATION_PUSH);
+    service.release();
+    EXPECT_TRUE(waitFor(left)) << log.text();
+}
+
+TEST_F(PushReceiver, APushWhoseTokensCannotBeKeptIsRefused)
+{
+    ad->operation_type = OPERATION_SEND_SMS;
+    {
+        const RefusingStore store;
+        push({"T1"});
+    }
+    EXPECT_THAT(log.messages(), ElementsAre("token_length = 1", "reset noti backup count = 1",
+                                            "Error in setting PREFERENCE KEY SHARE_NOTI_BACKUPED",
+                                            StartsWith("preference set thumbnail path fail -"),
+                                            "error!! get shared token list info failed!!"));
+    EXPECT_EQ(ad->operation_type, OPERATION_SEND_SMS);
+    loop.settle();
+    EXPECT_THAT(service.asked(), IsEmpty());
 }
 
 TEST_F(PushReceiver, ASecondPushWithoutTokensDoesNotKeepTheApplication)
