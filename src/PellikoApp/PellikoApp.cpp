@@ -144,7 +144,7 @@ void PellikoApp::onAppControl(app_control_h request, bool)
     const Next next = dispatch(launch, ad);
     if (next == Next::run)
         _runWithAccount(ad);
-    else if (next == Next::leave && !ad->popup)
+    else if (next == Next::leave && !ad->popup && !ad->processing_popup)
         _hideWindow(ad); // the clear window lies above everything and would swallow every touch
 }
 

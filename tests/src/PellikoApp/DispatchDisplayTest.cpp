@@ -1,7 +1,9 @@
 // The dispatcher inside the test's own process, where the record and the window can be looked at.
 #include "PellikoApp/AppData.h"
+#include "PellikoApp/ContactVcard.h"
 #include "PellikoApp/Operation.h"
 #include "PellikoApp/PellikoApp.h"
+#include "PellikoDatabaseManager/UploadInfoDatabase.h"
 #include "PellikoUploadManager/ExitPolicy.h"
 #include "support/FileLog.h"
 #include "support/LaunchRequest.h"
@@ -11,6 +13,7 @@
 #include <fstream>
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
+#include <pelliko_operations.h>
 
 namespace pelliko
 {
@@ -18,8 +21,10 @@ namespace
 {
 
 using test::LaunchRequest;
+using ::testing::Contains;
 using ::testing::ElementsAre;
 using ::testing::IsEmpty;
+using ::testing::Not;
 using ::testing::StartsWith;
 
 struct OpenApp : PellikoApp {
@@ -51,6 +56,13 @@ protected:
         LaunchRequest request;
         app_control_set_operation(request, APP_CONTROL_OPERATION_SHARE);
         app_control_set_uri(request, uri);
+        app->onAppControl(request, false);
+    }
+
+    void ask(const char *operation)
+    {
+        LaunchRequest request;
+        app_control_set_operation(request, operation);
         app->onAppControl(request, false);
     }
 
@@ -94,6 +106,18 @@ TEST_F(Dispatch, ShareThatIsNotUnderstoodLeavesAnOpenPopupAlone)
     share("a.jpg");
     EXPECT_EQ(ad->popup, popup);
     EXPECT_TRUE(windowIsShown());
+}
+
+TEST_F(Dispatch, ShareThatIsNotUnderstoodLeavesTheProcessingPopupAlone)
+{
+    share("/tmp/a.jpg");
+    evas_object_del(ad->popup);
+    ad->popup = nullptr;
+    _showProcessingPopup(ad);
+    ASSERT_NE(ad->processing_popup, nullptr);
+    share("a.jpg");
+    EXPECT_TRUE(windowIsShown());
+    evas_object_del(ad->processing_popup);
 }
 
 TEST_F(Dispatch, EveryRequestIsKeptAsAClone)
@@ -173,6 +197,49 @@ TEST_F(Dispatch, AcceptedPushLeavesTheWorkToItsWorker)
     doOperation(ad);
     ad->operation_type = OPERATION_DEFAULT;
     EXPECT_THAT(log.messages(), ElementsAre("Push notification."));
+}
+
+TEST_F(Dispatch, RefusedPushIsPassedOnAndRunsTheLastOperationAgain)
+{
+    ad->operation_type = OPERATION_DEFAULT;
+    ad->is_resume_by_reboot = 0;
+    ask(APP_CONTROL_OPERATION_SEND);
+    EXPECT_EQ(ad->operation_type, OPERATION_DEFAULT);
+    EXPECT_THAT(log.messages(),
+                ElementsAre(StartsWith("operation = "), "Push message received !!",
+                            StartsWith("type: 0, feature: PK10 [Pelliko_Receive_notification]"),
+                            "error!! get shared token list info failed!!",
+                            "History app is NOT running", "Default Case...",
+                            "No need to action for operation default"));
+}
+
+// No push was ever announced in this world.
+TEST_F(Dispatch, ServiceThatComesBackWithNothingKeptEndsTheApplication)
+{
+    ad->operation_type = OPERATION_DEFAULT;
+    ask(APP_CONTROL_OPERATION_SERVICE_ON);
+    EXPECT_EQ(ad->operation_type, OPERATION_DEFAULT);
+    const std::vector<std::string> messages = log.messages();
+    ASSERT_GE(messages.size(), 2u);
+    EXPECT_EQ(messages[1], "Service ON operation");
+    EXPECT_THAT(messages, Not(Contains("noti restored")));
+    EXPECT_THAT(messages, Not(Contains("Default Case...")));
+}
+
+TEST_F(Dispatch, AccountThatIsGoneTakesTheTableWithItOnce)
+{
+    ad->operation_type = OPERATION_DEFAULT;
+    for (const char *outcome :
+         {"Database file deleted successfully...!!!", "Database deletion failed...!!!"}) {
+        log.restart();
+        ask(APP_CONTROL_OPERATION_DEREGISTERED);
+        const std::vector<std::string> messages = log.messages();
+        ASSERT_GE(messages.size(), 3u);
+        EXPECT_EQ(messages[1], "Deregistered operation");
+        EXPECT_EQ(messages[2], outcome);
+        EXPECT_THAT(messages, Not(Contains("Default Case...")));
+    }
+    createTableUploadInfoDb();
 }
 
 TEST_F(Dispatch, AnswerToARequestOfNobodyIsNoSuccess)
