@@ -5,6 +5,7 @@
 
 #include <Ecore_X.h>
 #include <efl_util.h>
+#include <filesystem>
 #include <gmock/gmock.h>
 #include <uxt_theme.h>
 
@@ -53,6 +54,18 @@ TEST_F(Window, TablesDriveTheLayouts)
     releaseChangeableGui(ad);
 }
 
+TEST_F(Window, TablesThatAreNotThereAreOnlyMissed)
+{
+    const std::string tables = "/opt/usr/apps/com.velmora.pelliko/shared/res/tables";
+    std::filesystem::rename(tables, tables + ".away");
+    log.restart();
+    _changeableGuiInit(app.get(), ad);
+    std::filesystem::rename(tables + ".away", tables);
+    EXPECT_THAT(log.messages(), ::testing::ElementsAre("uxt_theme_set_font_table() is failed."));
+    EXPECT_EQ(ad->color_table, nullptr);
+    EXPECT_EQ(ad->font_table, nullptr);
+}
+
 TEST_F(Window, DeletedWindowIsForgottenAndMadeAnewWhenNeeded)
 {
     evas_object_del(ad->win);
@@ -90,6 +103,30 @@ TEST_F(Window, WindowThatGotAPopupStays)
     ensureMainWindow(app.get(), ad); // another request while it is open
     turnLoopOnce();
     EXPECT_TRUE(evas_object_visible_get(ad->win));
+}
+
+// Stands in for a window manager that turns windows: it says so at the root window.
+TEST_F(Window, RotationIsFollowedWhereTheWindowManagerTurnsWindows)
+{
+    const Ecore_X_Window root = ecore_x_window_root_get(elm_win_xwindow_get(ad->win));
+    evas_object_del(ad->win);
+    Ecore_X_Window sign = ecore_x_window_new(root, 0, 0, 1, 1);
+    for (const Ecore_X_Window at : {root, sign})
+        ecore_x_window_prop_window_set(at, ECORE_X_ATOM_E_WINDOW_ROTATION_SUPPORTED, &sign, 1);
+    ecore_x_sync();
+    log.restart();
+    ensureMainWindow(app.get(), ad);
+    ecore_x_window_free(sign);
+    EXPECT_THAT(log.messages(), ::testing::Contains("current rotation 0"));
+    int *rotations = nullptr;
+    unsigned int count = 0;
+    ASSERT_TRUE(elm_win_wm_rotation_available_rotations_get(ad->win, &rotations, &count));
+    EXPECT_THAT(std::vector(rotations, rotations + count), ::testing::ElementsAre(0, 90, 180, 270));
+    free(rotations);
+    elm_win_rotation_set(ad->win, 90);
+    evas_object_smart_callback_call(ad->win, "wm,rotation,changed", nullptr);
+    EXPECT_EQ(ad->rotation, 90);
+    ad->rotation = 0;
 }
 
 TEST_F(Window, RotationWithoutARecordIsLogged)
