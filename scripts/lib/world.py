@@ -198,6 +198,11 @@ def notifications():
     return json.loads(run("quickpanel-tool", "list", "--json"))
 
 
+def put_banners_away():
+    """Takes the desktop's notifications off the screen, where they would lie above a window's controls."""
+    run("dunstctl", "close-all")
+
+
 # --- what a recipient does --------------------------------------------------------------------------
 
 
