@@ -67,6 +67,7 @@ def open_in_browser(link):
 def look_at_history():
     world.run("app-launch", "--app", "com.velmora.pelliko-history", "--operation", "appcontrol/operation/view")
     screen.wait_for_control("Sent, shown")
+    world.put_banners_away()
     screen.wait_still()
     os.makedirs(SEEN, exist_ok=True)
     screen.screenshot(os.path.join(SEEN, "two_users-history.png"))
