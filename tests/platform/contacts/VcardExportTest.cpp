@@ -1,112 +1,17 @@
 // Contacts written to files, and read back by another implementation.
-#include <fstream>
-#include <iterator>
 #include <random>
-#include <set>
 #include <sstream>
 #include <thread>
 
-#include <JsonValue.h>
-#include <csignal>
-#include <glib.h>
-#include <sys/resource.h>
-#include <sys/wait.h>
-#include <unistd.h>
-
-#include "ContactsFixture.h"
 #include "ExportFiles.h"
 #include "MyProfile.h"
 #include "PlainVcard.h"
 #include "VcardImport.h"
+#include "VcardScene.h"
 #include "VcardWriting.h"
-#include "contacts_service_helper.h"
 
 namespace pelliko::contacts::test
 {
-
-using Names = std::vector<std::string>;
-using pelliko::test::JsonValue;
-
-class VcardExport : public Store
-{
-protected:
-    VcardExport() { std::filesystem::create_directory(m_folder / "out"); }
-
-    struct Calls {
-        Names names;
-        std::vector<int> counts;
-        size_t stop_after = SIZE_MAX;
-    };
-
-    static bool note(const char *file_name, int progress_count, void *user_data)
-    {
-        auto &calls = *static_cast<Calls *>(user_data);
-        calls.names.emplace_back(file_name);
-        calls.counts.push_back(progress_count);
-        return calls.names.size() < calls.stop_after;
-    }
-
-    [[nodiscard]] std::string directory() const { return m_folder / "out/"; }
-
-    int exported(std::vector<std::string> ids, int share_mode, Calls &calls) const
-    {
-        std::vector<char *> list;
-        for (std::string &id : ids)
-            list.push_back(id.data());
-        return contacts_service_helper_create_vcard_files(directory().c_str(), list.data(),
-                                                          static_cast<int>(list.size()), share_mode,
-                                                          note, &calls);
-    }
-    Names exported(const std::vector<std::string> &ids, int share_mode) const
-    {
-        Calls calls;
-        EXPECT_EQ(exported(ids, share_mode, calls), CONTACTS_ERROR_NONE);
-        return calls.names;
-    }
-
-    /// All names in the directory, hidden ones too.
-    [[nodiscard]] std::set<std::string> left() const
-    {
-        std::set<std::string> names;
-        for (const auto &entry : std::filesystem::directory_iterator(directory()))
-            names.insert(entry.path().filename());
-        return names;
-    }
-
-    [[nodiscard]] std::string text(const std::string &name) const
-    {
-        std::ifstream in(directory() + name, std::ios::binary);
-        return {std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>()};
-    }
-
-    /// What python3-vobject reads.
-    [[nodiscard]] JsonValue readBack(const std::string &name) const
-    {
-        const std::string path = directory() + name;
-        const char *words[] = {"/usr/bin/python3",
-                               PELLIKO_SOURCE_DIR "/tests/platform/contacts/read_vcards.py",
-                               path.c_str(), nullptr};
-        char *out = nullptr;
-        EXPECT_TRUE(g_spawn_sync(nullptr, const_cast<char **>(words), nullptr, G_SPAWN_DEFAULT,
-                                 nullptr, nullptr, &out, nullptr, nullptr, nullptr));
-        const std::unique_ptr<char, decltype(&g_free)> owned(out, g_free);
-        return JsonValue::parse(out);
-    }
-
-    static std::string sumOf(const std::string &bytes)
-    {
-        const std::unique_ptr<char, decltype(&g_free)> sum(
-            g_compute_checksum_for_string(G_CHECKSUM_SHA256, bytes.data(),
-                                          static_cast<gssize>(bytes.size())),
-            g_free);
-        return sum.get();
-    }
-
-    std::string addContact(const ContactCard &contact)
-    {
-        return std::to_string(save(contact).contact_id);
-    }
-};
 
 TEST_F(VcardExport, AnotherProgramReadsNameNumbersTypesAndPicture)
 {
@@ -219,132 +124,6 @@ TEST_F(VcardExport, APictureOfTenMebibytesIsWrittenWhole)
     EXPECT_EQ(report.value->messages, Names{});
     const auto stored = std::filesystem::directory_iterator(pictureFolder())->path();
     EXPECT_EQ(std::filesystem::file_size(stored), big.picture.size());
-}
-
-TEST_F(VcardExport, APictureWhoseFileIsGoneIsLeftOut)
-{
-    ContactCard ann = card("Ann", "1");
-    ann.picture = picture('a');
-    const std::string id = addContact(ann);
-    std::filesystem::remove_all(pictureFolder());
-    EXPECT_EQ(readBack(exported({id}, 1).at(0))[0]["picture"], nullptr);
-}
-
-TEST_F(VcardExport, AnIdThatIsNoContactFailsTheWholeExport)
-{
-    const std::string ann = addContact(card("Ann", "1"));
-    const struct {
-        Names ids;
-        int error;
-    } rows[] = {
-        {{ann, "99"}, CONTACTS_ERROR_NO_DATA},
-        {{ann, "2147483648"}, CONTACTS_ERROR_INVALID_PARAMETER},
-        {{"x"}, CONTACTS_ERROR_INVALID_PARAMETER},
-        {{"1x"}, CONTACTS_ERROR_INVALID_PARAMETER},
-        {{""}, CONTACTS_ERROR_INVALID_PARAMETER},
-        {{"-1"}, CONTACTS_ERROR_INVALID_PARAMETER},
-        {{"0"}, CONTACTS_ERROR_INVALID_PARAMETER},
-        {{}, CONTACTS_ERROR_INVALID_PARAMETER},
-    };
-    for (const auto &row : rows) {
-        for (const int share_mode : {0, 1}) {
-            Calls calls;
-            EXPECT_EQ(exported(row.ids, share_mode, calls), row.error);
-            EXPECT_EQ(calls.names, Names{});
-        }
-    }
-    EXPECT_EQ(left(), std::set<std::string>{});
-}
-
-TEST_F(VcardExport, ARowOfTheSharingServiceIsNoContact)
-{
-    add("Ann", {"1"}, true);
-    Calls calls;
-    EXPECT_EQ(exported({"2"}, 0, calls), CONTACTS_ERROR_NO_DATA);
-}
-
-TEST_F(VcardExport, WrongArgumentsAreRefused)
-{
-    char id[] = "1";
-    char *ids[] = {id, nullptr};
-    Calls calls;
-    const std::string to = directory();
-    const auto create = contacts_service_helper_create_vcard_files;
-    const auto profile = contacts_service_helper_create_vcard_file_by_my_profile;
-    addContact(card("Ann", "1"));
-    EXPECT_EQ(create(nullptr, ids, 1, 0, note, &calls), CONTACTS_ERROR_INVALID_PARAMETER);
-    EXPECT_EQ(create(to.c_str(), nullptr, 1, 0, note, &calls), CONTACTS_ERROR_INVALID_PARAMETER);
-    EXPECT_EQ(create(to.c_str(), ids, 0, 0, note, &calls), CONTACTS_ERROR_INVALID_PARAMETER);
-    EXPECT_EQ(create(to.c_str(), ids, -1, 0, note, &calls), CONTACTS_ERROR_INVALID_PARAMETER);
-    EXPECT_EQ(create(to.c_str(), ids, 2, 0, note, &calls), CONTACTS_ERROR_INVALID_PARAMETER);
-    EXPECT_EQ(create(to.c_str(), ids, 1, 2, note, &calls), CONTACTS_ERROR_INVALID_PARAMETER);
-    EXPECT_EQ(create(to.c_str(), ids, 1, 0, nullptr, &calls), CONTACTS_ERROR_INVALID_PARAMETER);
-    EXPECT_EQ(profile(nullptr, nullptr, note, &calls), CONTACTS_ERROR_INVALID_PARAMETER);
-    EXPECT_EQ(profile(to.c_str(), nullptr, nullptr, &calls), CONTACTS_ERROR_INVALID_PARAMETER);
-    EXPECT_EQ(create("/nowhere/", ids, 1, 0, note, &calls), CONTACTS_ERROR_SYSTEM);
-    EXPECT_EQ(create("/proc/", ids, 1, 0, note, &calls), CONTACTS_ERROR_SYSTEM);
-    EXPECT_EQ(calls.names, Names{});
-    EXPECT_EQ(left(), std::set<std::string>{});
-}
-
-TEST_F(VcardExport, AFileThatCannotGrowLeavesNothing)
-{
-    ContactCard big = card("Big", "1");
-    big.picture = picture('b') + std::string(100000, 'b');
-    const Names ids = {addContact(card("Ann", "2")), addContact(big)};
-    const rlimit small = {50000, RLIM_INFINITY};
-    rlimit before{};
-    getrlimit(RLIMIT_FSIZE, &before);
-    signal(SIGXFSZ, SIG_IGN);
-    setrlimit(RLIMIT_FSIZE, &small);
-    Calls calls;
-    const int error = exported(ids, 1, calls);
-    setrlimit(RLIMIT_FSIZE, &before);
-    EXPECT_EQ(error, CONTACTS_ERROR_SYSTEM);
-    EXPECT_EQ(calls.names, Names{});
-    EXPECT_EQ(left(), std::set<std::string>{});
-}
-
-TEST_F(VcardExport, WhatACrashLeftIsClearedByTheNextExportAndWhatIsInUseStays)
-{
-    const std::string ann = addContact(card("Ann", "1"));
-    // A program that ends amid an export leaves its hidden folder.
-    const pid_t child = fork();
-    if (child == 0) {
-        auto *left_open = new ExportFiles(directory());
-        left_open->begin("half");
-        _exit(0);
-    }
-    waitpid(child, nullptr, 0);
-    ASSERT_EQ(left().size(), 1U);
-    std::ofstream(directory() + ".export-a-file") << "not ours";
-    std::filesystem::create_directory(m_folder / "elsewhere");
-    std::ofstream(m_folder / "elsewhere/kept") << "x";
-    std::filesystem::create_directory_symlink(m_folder / "elsewhere", directory() + ".export-link");
-    std::string going_on;
-    {
-        ExportFiles other(directory());
-        other.begin("going on");
-        other.write("text");
-        EXPECT_EQ(exported({ann}, 1), Names{"Ann.vcf"});
-        other.finish();
-        going_on = other.publish(0);
-    }
-    EXPECT_EQ(text(going_on), "text");
-    EXPECT_EQ(left(),
-              (std::set<std::string>{".export-a-file", ".export-link", "Ann.vcf", "going on.vcf"}));
-    EXPECT_TRUE(std::filesystem::exists(m_folder / "elsewhere/kept"));
-}
-
-TEST_F(VcardExport, TheCallbackMayStopTheExport)
-{
-    const Names ids = {addContact(card("Ann", "1")), addContact(card("Bob", "2")),
-                       addContact(card("Cem", "3"))};
-    Calls calls;
-    calls.stop_after = 2;
-    EXPECT_EQ(exported(ids, 1, calls), CONTACTS_ERROR_NONE);
-    EXPECT_EQ(calls.names, (Names{"Ann.vcf", "Bob.vcf"}));
-    EXPECT_EQ(left(), (std::set<std::string>{"Ann.vcf", "Bob.vcf"}));
 }
 
 TEST_F(VcardExport, AWorkerExportsOnAConnectionOfItsOwn)
