@@ -21,11 +21,6 @@ void addIcon(Evas_Object *row, const char *name)
 
 } // namespace
 
-bool operator==(const RowTexts &a, const RowTexts &b)
-{
-    return a.title == b.title && a.second == b.second && a.third == b.third;
-}
-
 Evas_Object *addListRow(Evas_Object *box, const RowTexts &texts, const char *icon,
                         Evas_Smart_Cb pressed, void *data)
 {

@@ -1,22 +1,12 @@
 // A line of a list that is pressed as a whole.
 #pragma once
 
-#include <Elementary.h>
+#include "RowTexts.h"
 
-#include <string>
+#include <Elementary.h>
 
 namespace pelliko::companion
 {
-
-/// What a row shows. Texts are in the user's language already.
-struct RowTexts {
-    std::string title;
-    std::string second;
-    /// A row with a third line keeps it, one without never gets one.
-    std::string third;
-};
-
-bool operator==(const RowTexts &a, const RowTexts &b);
 
 /// At the end of the box; pressed with the pointer, Return or Space.
 /// @param icon name of a picture in the desktop's icon theme, or null for a row without

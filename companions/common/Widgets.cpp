@@ -32,6 +32,17 @@ Evas_Object *addGround(Evas_Object *window)
     return ground;
 }
 
+// A handset's screen belongs to the program that is in front.
+void fitToScreen(Evas_Object *window)
+{
+    int width = 0;
+    int height = 0;
+    elm_win_screen_size_get(window, nullptr, nullptr, &width, &height);
+    evas_object_resize(window, scaled(windowWidth), scaled(windowHeight));
+    if (height > width)
+        elm_win_maximized_set(window, EINA_TRUE);
+}
+
 Evas_Object *addScroller(Evas_Object *window)
 {
     Evas_Object *scroller = elm_scroller_add(window);
@@ -165,7 +176,7 @@ Page addPage(const char *name, const char *title, double align)
     evas_object_size_hint_weight_set(middle, EVAS_HINT_EXPAND, EVAS_HINT_EXPAND);
     elm_object_content_set(page.scroller, middle);
     page.column = addColumn(page.window, middle, align);
-    evas_object_resize(page.window, scaled(windowWidth), scaled(windowHeight));
+    fitToScreen(page.window);
     return page;
 }
 

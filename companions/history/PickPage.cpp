@@ -3,12 +3,9 @@
 #include "Launches.h"
 
 #include <AccessibleName.h>
-#include <CText.h>
 #include <Language.h>
 #include <ListRow.h>
 #include <Theme.h>
-
-#include <glib.h>
 
 #include <algorithm>
 #include <utility>
@@ -24,29 +21,7 @@ namespace
 constexpr int gap = 8;
 constexpr size_t mostRows = 50;
 
-std::string folded(const std::string &text)
-{
-    const CText lower(g_utf8_casefold(text.c_str(), -1));
-    return lower ? lower.get() : "";
-}
-
-std::string digitsOf(const std::string &text)
-{
-    std::string digits;
-    std::copy_if(text.begin(), text.end(), std::back_inserter(digits),
-                 [](char c) { return g_ascii_isdigit(c) || c == '+'; });
-    return digits;
-}
-
 } // namespace
-
-bool matches(const ContactNumber &number, const std::string &typed)
-{
-    if (folded(number.name).find(folded(typed)) != std::string::npos)
-        return true;
-    const std::string digits = digitsOf(typed);
-    return !digits.empty() && digitsOf(number.number).find(digits) != std::string::npos;
-}
 
 PickPage::PickPage(const Page &page, std::vector<ContactNumber> numbers, Wishes wishes)
     : wishes_(std::move(wishes)), numbers_(std::move(numbers))

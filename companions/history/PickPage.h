@@ -56,7 +56,4 @@ private:
     Evas_Object *rest_ = nullptr;
 };
 
-/// Whether a typed text is in the name (case ignored) or, without its blanks, in the number.
-bool matches(const companion::ContactNumber &number, const std::string &typed);
-
 } // namespace pelliko::history

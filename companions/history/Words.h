@@ -2,7 +2,7 @@
 #pragma once
 
 #include <KeptShares.h>
-#include <ListRow.h>
+#include <RowTexts.h>
 
 namespace pelliko::history
 {

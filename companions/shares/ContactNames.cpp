@@ -1,9 +1,11 @@
 #include "ContactNames.h"
 
 #include <contacts.h>
+#include <glib.h>
 
 #include <algorithm>
 #include <functional>
+#include <iterator>
 #include <memory>
 
 namespace pelliko::companion
@@ -71,6 +73,20 @@ Record readRecord(const char *view, int id)
     return Record(record);
 }
 
+std::string folded(const std::string &text)
+{
+    g_autofree char *lower = g_utf8_casefold(text.c_str(), -1);
+    return lower;
+}
+
+std::string digitsOf(const std::string &text)
+{
+    std::string digits;
+    std::copy_if(text.begin(), text.end(), std::back_inserter(digits),
+                 [](char c) { return g_ascii_isdigit(c) || c == '+'; });
+    return digits;
+}
+
 } // namespace
 
 void useContacts()
@@ -118,6 +134,14 @@ std::vector<ContactNumber> contactNumbers()
         return a.name != b.name ? a.name < b.name : a.id < b.id;
     });
     return found;
+}
+
+bool matches(const ContactNumber &number, const std::string &typed)
+{
+    if (folded(number.name).find(folded(typed)) != std::string::npos)
+        return true;
+    const std::string digits = digitsOf(typed);
+    return !digits.empty() && digitsOf(number.number).find(digits) != std::string::npos;
 }
 
 } // namespace pelliko::companion

@@ -27,4 +27,7 @@ std::string nameOfNumberId(int32_t id);
 /// All numbers of people with a name, in the order of the names.
 std::vector<ContactNumber> contactNumbers();
 
+/// Whether a typed text is in the name (case ignored) or, without its blanks, in the number.
+bool matches(const ContactNumber &number, const std::string &typed);
+
 } // namespace pelliko::companion

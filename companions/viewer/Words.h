@@ -4,7 +4,7 @@
 #include "Saving.h"
 
 #include <KeptShares.h>
-#include <ListRow.h>
+#include <RowTexts.h>
 
 namespace pelliko::viewer
 {

@@ -62,6 +62,12 @@ class CompanionsCase(share_case.ShareCase):
                 program.wait_gone()
 
     @staticmethod
+    def press(label):
+        screen.wait_for_control(label, "button")
+        screen.wait_still(0.2)  # words that come or go move what stands under them
+        screen.press(label, "button")
+
+    @staticmethod
     def row(start):
         return world.wait_for(lambda: next((name for name, role, _, _ in screen.controls()
                                             if name.startswith(start) and "button" in role), None), f"a row “{start}”")
@@ -81,10 +87,10 @@ class SentShares(CompanionsCase):
         message = self.share_one("plan.pdf", data, world.add_contact("Ann Example", "+44 7700 900123"))
         self.assert_downloads_equal(message, {"plan.pdf": data})
         world.launch("default", app=HISTORY)
-        screen.press(self.row("Ann Example, 1 file, 30.0 kB, Available until "))
-        screen.press("Withdraw", "button")
+        self.press(self.row("Ann Example, 1 file, 30.0 kB, Available until "))
+        self.press("Withdraw")
         screen.wait_for_control("No, go back", "button")
-        screen.press("Withdraw", "button")
+        self.press("Withdraw")
         screen.wait_for_control("Withdrawn")
         with self.assertRaises(urllib.error.HTTPError) as refused:
             urllib.request.urlopen(world.link_in(message["text"]), timeout=world.LIMIT)
@@ -98,14 +104,14 @@ class SentShares(CompanionsCase):
         world.add_contact("Dora Example", "+44 7700 900888")
         first = self.share_one("album.jpg", data, cem)
         world.launch("default", app=HISTORY)
-        screen.press(self.row("Cem Example, 1 file, 200.0 kB, Available until "))
-        screen.press("Share again", "button")
-        screen.press("Dora Example, +44 7700 900888", "button")
-        screen.press("Share", "button")
+        self.press(self.row("Cem Example, 1 file, 200.0 kB, Available until "))
+        self.press("Share again")
+        self.press("Dora Example, +44 7700 900888")
+        self.press("Share")
         screen.wait_for_control("Cancel", "button")  # the application asks
         self.application.wait_here()
         world.wait_for(lambda: len([1 for name, role, _, on in screen.controls() if name == "Share"]) > 0, "the popup")
-        screen.press("Share", "button")
+        self.press("Share")
         self.outbox.wait(lambda lines: len(lines) - self.messages_before >= 2, "the second message")
         self.application.wait_gone()
         second = self.messages(2)[1]
@@ -127,8 +133,8 @@ class ReceivedShares(CompanionsCase):
         world.requests()  # the service runs and listens
         world.launch("view", "--extra", "view_type=received", "--extra", "remoteShare=remoteview", app=HISTORY)
         many = "1 file" if len(files) == 1 else f"{len(files)} files"
-        screen.press(self.row(f"Sam Sender, {many}, "))
-        screen.press("Open", "button")
+        self.press(self.row(f"Sam Sender, {many}, "))
+        self.press("Open")
         screen.wait_for_control("\u2068Sam Sender\u2069 shared with you")
         return share
 
@@ -143,7 +149,7 @@ class ReceivedShares(CompanionsCase):
         files = {"photo.jpg": share_case.random_bytes(700_000), "empty.txt": b"",
                  "Grüße ☂.pdf": share_case.random_bytes(50_000, 2)}
         share = self.receive(files)
-        screen.press("Save all", "button")
+        self.press("Save all")
         screen.wait_for_control("3 files were saved.")
         self.picture("saved")
         self.assertEqual({name: world.sha256(data) for name, data in files.items()}, self.saved())
@@ -162,14 +168,14 @@ class ReceivedShares(CompanionsCase):
     def test_a_server_that_dies_while_saving_loses_nothing(self):
         files = {"small.jpg": share_case.random_bytes(20_000), "film.mp4": share_case.random_bytes(150_000_000, 3)}
         self.receive(files)
-        screen.press("Save all", "button")
+        self.press("Save all")
         self.row("film.mp4, 150.0 MB, Being saved, ")
         world.kill_server()
         screen.wait_for_control(UNREACHABLE + " 1 file was saved.", limit=150)
         self.picture("server-gone")
         self.assertEqual(world.sha256(files["small.jpg"]), self.saved()["small.jpg"])
         world.start_server()
-        screen.press("Save all", "button")
+        self.press("Save all")
         self.row("film.mp4, 150.0 MB, Saved. Press to open")
         self.assertEqual({name: world.sha256(data) for name, data in files.items()}, self.saved())
 

@@ -23,6 +23,8 @@ class CompanionCase(unittest.TestCase):
 
     def setUp(self):
         screen.announce_reader()
+        if "ELM_SCALE" in os.environ:  # a finer display than the bus was started for
+            world.activation_environment(ELM_SCALE=os.environ["ELM_SCALE"])
         self.application = world.BusName(self.program)
         self.addCleanup(self._end)
 
@@ -38,6 +40,8 @@ class CompanionCase(unittest.TestCase):
 
     @staticmethod
     def press(label, role="button"):
+        screen.wait_for_control(label, role)
+        screen.wait_still(0.2)  # words that come or go move what stands under them
         screen.press(label, role)
 
     @staticmethod
