@@ -1,11 +1,13 @@
 #include "PrivateStore.h"
 
 #include <cmath>
+#include <csignal>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
 #include <limits>
 #include <sqlite3.h>
+#include <sys/resource.h>
 
 namespace
 {
@@ -168,6 +170,24 @@ TEST_F(Values, AStoreThatCannotBeOpenedIsAnInputOutputError)
 {
     EXPECT_EQ("-5 5\n", probe("XDG_DATA_HOME=/dev/null", "set size 5"));
     EXPECT_EQ("-5 -1\n", probe("XDG_DATA_HOME=/dev/null", "get size"));
+}
+
+TEST_F(Values, AStoreThatRefusesWritesKeepsWhatItHas)
+{
+    ASSERT_EQ(PREFERENCE_ERROR_NONE, preference_set_int(kSize, 5));
+    rlimit before{};
+    getrlimit(RLIMIT_FSIZE, &before);
+    const rlimit nothing = {1, before.rlim_max};
+    const auto handler = signal(SIGXFSZ, SIG_IGN);
+    setrlimit(RLIMIT_FSIZE, &nothing);
+    EXPECT_EQ(PREFERENCE_ERROR_IO_ERROR, preference_set_int(kSize, 6));
+    EXPECT_EQ(PREFERENCE_ERROR_IO_ERROR, preference_set_string(kTokens, "abc"));
+    setrlimit(RLIMIT_FSIZE, &before);
+    signal(SIGXFSZ, handler);
+    int size = -1;
+    EXPECT_EQ(PREFERENCE_ERROR_NONE, preference_get_int(kSize, &size));
+    EXPECT_EQ(5, size);
+    EXPECT_EQ(PREFERENCE_ERROR_NONE, preference_set_int(kSize, 6)) << "there is room again";
 }
 
 TEST_F(Values, ADamagedStoreIsAnInputOutputErrorAndStaysAsItIs)
