@@ -37,7 +37,7 @@ sqlite3 *_openDatabase()
 {
     sqlite3 *handle = nullptr;
     if (sqlite3_open(databasePath, &handle) != SQLITE_OK) {
-        LOG_DEBUG("DB open Failed - %s", sqlite3_errmsg(handle));
+        LOG_ERROR("DB open Failed - %s", sqlite3_errmsg(handle));
         sqlite3_close(handle);
         return nullptr;
     }
@@ -143,7 +143,7 @@ void _readColumn(UploadNotiData &node, int column, const char *value)
         node.recipient_index_list = _fixedCopy(value, recipientIndexSize);
         break;
     default:
-        LOG_DEBUG("Some db error occurred...");
+        LOG_ERROR("Some db error occurred...");
     }
 }
 

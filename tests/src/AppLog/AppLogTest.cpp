@@ -4,6 +4,7 @@
 
 #include <clocale>
 #include <cstdlib>
+#include <dlfcn.h>
 #include <filesystem>
 #include <future>
 #include <gmock/gmock.h>
@@ -12,6 +13,19 @@
 #include <sys/stat.h>
 #include <sys/syscall.h>
 #include <thread>
+
+namespace
+{
+bool calendarFails = false;
+} // namespace
+
+// No clock of a test can show a time that has no calendar date.
+extern "C" struct tm *localtime_r(const time_t *time, struct tm *result) noexcept
+{
+    using Function = struct tm *(*)(const time_t *, struct tm *);
+    static const auto real = reinterpret_cast<Function>(dlsym(RTLD_NEXT, "localtime_r"));
+    return calendarFails ? nullptr : real(time, result);
+}
 
 namespace pelliko
 {
@@ -94,6 +108,18 @@ TEST_F(AppLog, LineHasTimeThreadTagAndPlace)
         struct tm local;
         localtime_r(&now, &local);
         EXPECT_EQ(parts[1].str(), std::to_string(local.tm_year + 1900));
+    }));
+}
+
+TEST_F(AppLog, LineWithoutATimeSaysSo)
+{
+    EXPECT_TRUE(holdsInFreshProcess([] {
+        const FileLog log;
+        calendarFails = true;
+        appLogWrite("Some.cpp", "someFunction", 42, tag, "count = %d", 7);
+        EXPECT_THAT(log.lines(),
+                    ElementsAre("GET TIME ERROR (" + std::to_string(syscall(SYS_gettid)) +
+                                ") [PELLIKO:MESSAGE] Some.cpp: someFunction(42) > count = 7"));
     }));
 }
 

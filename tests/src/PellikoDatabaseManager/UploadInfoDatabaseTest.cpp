@@ -2,6 +2,7 @@
 #include "support/FileLog.h"
 #include "support/FreshProcess.h"
 
+#include <cstdlib>
 #include <filesystem>
 #include <glib.h>
 #include <gmock/gmock.h>
@@ -112,7 +113,11 @@ TEST(UploadInfoDatabaseFile, FailedOpeningIsNotTriedAgain)
     fs::create_directory(databasePath); // a folder in the file's place cannot be opened
     EXPECT_TRUE(holdsInFreshProcess([] {
         const FileLog log;
+        setenv("PELLIKO_LOG_STDERR", "1", 1);
+        ::testing::internal::CaptureStderr();
         EXPECT_FALSE(createTableUploadInfoDb());
+        EXPECT_THAT(::testing::internal::GetCapturedStderr(),
+                    HasSubstr(") > [ERROR]DB open Failed - unable to open database file\n"));
         fs::remove(databasePath);
         EXPECT_FALSE(readUploadDataFromDb());
         deleteUploadDataFromDb(7);

@@ -5,7 +5,22 @@
 #include "support/PanelHistory.h"
 #include "support/UploadServiceDouble.h"
 
+#include <cstdlib>
+#include <glib.h>
 #include <gmock/gmock.h>
+
+namespace
+{
+int recordToFail = 0; ///< counted from 1; 0: none
+} // namespace
+
+// What the records of recipients are made with.
+extern "C" gpointer g_try_malloc0(gsize size)
+{
+    if (recordToFail > 0 && --recordToFail == 0)
+        return nullptr;
+    return calloc(1, size);
+}
 
 namespace pelliko::test
 {
@@ -82,6 +97,28 @@ TEST_F(UploadOutcomes, ReshareWritesTheNumberOfFilesIntoTheListsHead)
     EXPECT_EQ(head->total_files, 4);
     ASSERT_NE(getUploadNotiDataNode(8), nullptr);
     EXPECT_EQ(getUploadNotiDataNode(8)->upload_status, 2);
+}
+
+TEST_F(UploadOutcomes, RecipientWithoutMemoryIsLeftOutAndTheOthersAreSent)
+{
+    service.answerRequests(0, 9);
+    shareInHand({"/a/b.jpg"}, 3);
+    ad->sender_ccc = g_strdup("44");
+    log.restart();
+    recordToFail = 2;
+    EXPECT_EQ(_performAction(ad), 0);
+    EXPECT_EQ(recordToFail, 0);
+    const auto lines = log.messages();
+    ASSERT_GE(lines.size(), 5u);
+    EXPECT_EQ(lines[1], "Recipient count = 3");
+    EXPECT_EQ(lines[2], "Recipient number_id 0 = 31");
+    EXPECT_EQ(lines[3], "Recipient number_id 1 = 33");
+    EXPECT_EQ(lines[4], "Files count = 1");
+    EXPECT_THAT(lines, Contains("recipient_count = 3, ct_app_id = (null)"));
+    EXPECT_THAT(service.calls(),
+                Contains(::testing::HasSubstr(
+                    "[('44', '+447946000900', 31), ('44', '+447946000902', 33)]")));
+    EXPECT_STREQ(getUploadNotiDataNode(9)->recipient_index_list, "31?32?33?");
 }
 
 } // namespace

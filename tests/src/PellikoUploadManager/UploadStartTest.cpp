@@ -211,6 +211,9 @@ TEST_F(UploadStart, WithoutAnEarlierUploadNothingIsReshared)
     EXPECT_NE(log.text().find("Return value : -1, message : req_id_to_reshare is zero\n"),
               std::string::npos)
         << log.text();
+    log.restart();
+    EXPECT_EQ(reshareUploadStart(nullptr), -1);
+    EXPECT_EQ(log.text(), "[ERROR][(ad == NULL)] Return value : -1, message : Appdata is NULL\n");
     EXPECT_EQ(g_upload_noti_data_list, nullptr);
 }
 
