@@ -339,6 +339,7 @@ bool announceKeptShares(PellikoAppData *ad)
         if (restoreNotiInfo(ad) != 0)
             return false;
         LOG_DEBUG("noti restored");
+        _turns().abandoned = false; // switched off and on again before the application was gone
     }
     ad->operation_type = OPERATION_PUSH;
     if (!_turns().under_way)

@@ -24,7 +24,7 @@ void receivePush(PellikoAppData *ad, app_control_h request);
 /// @return false when none are kept
 bool announceKeptShares(PellikoAppData *ad);
 
-/// Nothing that is under way or waits is announced any more. Main loop only.
+/// Nothing that is under way or waits is announced any more, until kept shares are. Main loop only.
 void abandonPushes();
 
 /// Serves the main loop, which has ended, until no push is under way, for ten seconds at most, so

@@ -15,6 +15,7 @@
 #include <contacts.h>
 #include <gmock/gmock.h>
 #include <thread>
+#include <utility>
 
 namespace pelliko::test
 {
@@ -343,6 +344,18 @@ TEST_F(PushReceiver, KeptSharesAreAnnouncedAgain)
     EXPECT_EQ(posted("PUSH_NOTI")->content, "Bob Example, Ann Example");
 }
 
+TEST_F(PushReceiver, KeptSharesAreAnnouncedAlsoRightAfterTheServiceWasSwitchedOff)
+{
+    abandonPushes();
+    push({"T1"});
+    EXPECT_TRUE(waitFor(left)) << log.text();
+    EXPECT_FALSE(posted("PUSH_NOTI"));
+    log.restart();
+    EXPECT_TRUE(announceKeptShares(ad));
+    EXPECT_TRUE(waitFor(left)) << log.text();
+    EXPECT_TRUE(posted("PUSH_NOTI"));
+}
+
 TEST_F(PushReceiver, WithoutKeptSharesThereIsNothingToAnnounce)
 {
     EXPECT_FALSE(announceKeptShares(ad));
@@ -391,6 +404,22 @@ TEST_F(PushReceiver, WhatComesThroughThePipeAlwaysEndsWithTheExitRule)
     EXPECT_THAT(log.messages(),
                 ElementsAre("[ERROR][(ad == NULL)] Return message : data is NULL",
                             "[ERROR][(ad == NULL)] Return message : user_data is NULL"));
+}
+
+// The library's answer comes after the pipe is gone.
+TEST_F(PushReceiver, AnAnswerWithoutAPipeStaysUnannounced)
+{
+    Ecore_Pipe *pipe = std::exchange(ad->pipe, nullptr);
+    auto **tokens = static_cast<char **>(calloc(1, sizeof(char *)));
+    tokens[0] = strdup("T1");
+    replaceContentsTokens(ad, tokens, 1);
+    ad->data_index = 0;
+    std::thread([this] { _receiverServiceGetGroupInfoCb(0, "T1", nullptr, ad); }).join();
+    ad->pipe = pipe;
+    loop.settle();
+    EXPECT_EQ(log.messages().back(), "write pipe failed!!");
+    EXPECT_EQ(textOf(ad->sender_name), "default");
+    EXPECT_FALSE(posted("PUSH_NOTI"));
 }
 
 TEST_F(PushReceiver, ARunningHistoryGetsThePushToo)
