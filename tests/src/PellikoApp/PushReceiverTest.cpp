@@ -1,18 +1,10 @@
 // Pushes from the launch request to the panel, with the real upload library.
-#include "PellikoApp/PushReceiver.h"
-#include "PellikoApp/Workers.h"
-#include "PellikoNotificationManager/NotificationBackup.h"
 #include "PellikoNotificationManager/SenderNames.h"
+#include "PushReceiverScene.h"
 #include "platform/quickpanel/support/RecordingApplication.h"
-#include "support/AppWorld.h"
-#include "support/ContactsStore.h"
-#include "support/LaunchRequest.h"
-#include "support/ReceivedSharesDouble.h"
 #include "support/RefusingStore.h"
 
 #include <Ecore.h>
-#include <app_preference.h>
-#include <contacts.h>
 #include <gmock/gmock.h>
 #include <thread>
 #include <utility>
@@ -23,92 +15,9 @@ namespace
 {
 
 using panel_testing::RecordingApplication;
-using ::testing::AllOf;
-using ::testing::Contains;
 using ::testing::ElementsAre;
 using ::testing::IsEmpty;
-using ::testing::Not;
 using ::testing::StartsWith;
-
-const std::string left = "No upload_data request id exist so app is exiting";
-
-class PushReceiver : public AppWorld
-{
-protected:
-    static void SetUpTestSuite()
-    {
-        setenv("PELLIKO_APP_ID", "com.velmora.pelliko", 1);
-        ASSERT_EQ(contacts_connect(), CONTACTS_ERROR_NONE);
-        addPerson("Ann Example", {"+447700900001"}, "GIF89a Ann");
-        addPerson("Bob Example", {"+447700900002"});
-    }
-    static void TearDownTestSuite() { contacts_disconnect(); }
-
-    PushReceiver()
-    {
-        service.add("T1", {"+447700900001", {100, 200, 4000000000}});
-        service.add("T2", {"+447700900002", {50}});
-        service.add("T3", {"+447700900003", {7, 8}});
-        service.add("Tnobody", {"", {1}});
-    }
-    // A push that a case has left under way must not reach the next one.
-    ~PushReceiver() override
-    {
-        service.release();
-        finishPushes();
-        waitForWorkers(std::chrono::seconds(20));
-        g_list_free_full(ad->push_info_list, g_free);
-        ad->push_info_list = nullptr;
-    }
-
-    void push(const std::vector<std::string> &tokens)
-    {
-        LaunchRequest request;
-        request.array("contents_token_list", tokens);
-        receivePush(ad, request);
-    }
-
-    bool waitFor(const std::string &message)
-    {
-        return loop.runUntil([&] { return log.has(message); });
-    }
-
-    // Until the application asked to end.
-    void pushAndWait(const std::vector<std::string> &tokens)
-    {
-        push(tokens);
-        EXPECT_TRUE(waitFor(left)) << log.text();
-    }
-
-    std::vector<std::string> records() const
-    {
-        std::vector<std::string> all;
-        for (const GList *at = ad->push_info_list; at; at = at->next)
-            all.emplace_back(static_cast<const char *>(at->data));
-        return all;
-    }
-
-    static std::string kept()
-    {
-        int count = -1;
-        char *tokens = nullptr;
-        preference_get_int(shareNotiBackupedKey, &count);
-        preference_get_string(shareNotiTokensKey, &tokens);
-        std::string text = std::to_string(count) + " " + (tokens ? tokens : "(none)");
-        free(tokens);
-        return text;
-    }
-
-    long times(const std::string &message) const
-    {
-        const auto all = log.messages();
-        return std::count(all.begin(), all.end(), message);
-    }
-
-    std::string textOf(const char *text) const { return text ? text : "(null)"; }
-
-    ReceivedSharesDouble service;
-};
 
 TEST_F(PushReceiver, OneTokenGoesIntoTheFields)
 {
@@ -234,34 +143,6 @@ TEST_F(PushReceiver, ARequestWithoutTokensIsRefused)
     EXPECT_TRUE(log.has("[ERROR][(ad == NULL)] Return value : -1, message : ad is NULL"));
 }
 
-TEST_F(PushReceiver, ASecondPushWaitsForTheFirst)
-{
-    service.hold("T2");
-    push({"T1", "T2"});
-    EXPECT_TRUE(loop.runUntil([this] { return log.has("T2, ad->data_index[1]"); }));
-    push({"T3"});
-    push({"T1"});
-    EXPECT_EQ(kept(), "2 T1|T2");
-    EXPECT_EQ(ad->token_length, 2);
-    service.release();
-    EXPECT_TRUE(waitFor(left)) << log.text();
-    EXPECT_THAT(service.asked(), ElementsAre("T1", "T2", "T3", "T1"));
-    EXPECT_EQ(kept(), "1 T1|");
-    EXPECT_EQ(times(">>>>>>>>>>>>> noti create success <<<<<<<<<<<<<<<<"), 3);
-    EXPECT_EQ(times(left), 1);
-}
-
-TEST_F(PushReceiver, APushThatWaitsDoesNotRepeatTheOperationBefore)
-{
-    service.hold("T1");
-    push({"T1"});
-    ad->operation_type = OPERATION_SEND_SMS; // asked for meanwhile, and done
-    push({"T2"});
-    EXPECT_EQ(ad->operation_type, OPERATION_PUSH);
-    service.release();
-    EXPECT_TRUE(waitFor(left)) << log.text();
-}
-
 TEST_F(PushReceiver, APushWhoseTokensCannotBeKeptIsRefused)
 {
     ad->operation_type = OPERATION_SEND_SMS;
@@ -276,44 +157,6 @@ TEST_F(PushReceiver, APushWhoseTokensCannotBeKeptIsRefused)
     EXPECT_EQ(ad->operation_type, OPERATION_SEND_SMS);
     loop.settle();
     EXPECT_THAT(service.asked(), IsEmpty());
-}
-
-TEST_F(PushReceiver, ASecondPushWithoutTokensDoesNotKeepTheApplication)
-{
-    service.hold("T1");
-    push({"T1"});
-    receivePush(ad, LaunchRequest());
-    service.release();
-    EXPECT_TRUE(waitFor(left)) << log.text();
-    EXPECT_TRUE(log.has("error!! get shared token list info failed!!"));
-}
-
-// The record is broken by hand: requests carry no missing tokens.
-TEST_F(PushReceiver, AChainThatBreaksOffEndsWithoutAWordAndWithoutLeaving)
-{
-    auto **tokens = static_cast<char **>(calloc(2, sizeof(char *)));
-    tokens[0] = strdup("T1");
-    replaceContentsTokens(ad, tokens, 2);
-    _receiverLaunchPushNotiThread(ad);
-    EXPECT_TRUE(waitFor("error res = -22")) << log.text();
-    push({"T2"}); // waits, or begins at once when the end was noticed already
-    EXPECT_TRUE(waitFor(left)) << log.text();
-    EXPECT_TRUE(waitForWorkers(std::chrono::seconds(20)));
-    EXPECT_EQ(times("write pipe success"), 1);
-    EXPECT_EQ(posted("PUSH_NOTI")->title, "Bob Example");
-}
-
-TEST_F(PushReceiver, WithoutATokenNothingIsAsked)
-{
-    preference_set_int(shareNotiBackupedKey, 2);
-    EXPECT_TRUE(announceKeptShares(ad));
-    EXPECT_TRUE(waitFor("error!! ret = -22")) << log.text();
-    EXPECT_TRUE(waitForWorkers(std::chrono::seconds(20)));
-    EXPECT_TRUE(log.has("operation_type=[1]"));
-    loop.settle();
-    EXPECT_THAT(service.asked(), IsEmpty());
-    EXPECT_FALSE(log.has(left));
-    EXPECT_FALSE(posted("PUSH_NOTI"));
 }
 
 TEST_F(PushReceiver, AnOpenPopupStays)
@@ -331,60 +174,6 @@ TEST_F(PushReceiver, APendingUploadKeepsTheApplication)
     push({"T1"});
     EXPECT_TRUE(waitFor("upload_data request id is not 0 app can't exit")) << log.text();
     EXPECT_TRUE(posted("PUSH_NOTI"));
-}
-
-TEST_F(PushReceiver, KeptSharesAreAnnouncedAgain)
-{
-    preference_set_int(shareNotiBackupedKey, 2);
-    preference_set_string(shareNotiTokensKey, "T1|T2");
-    EXPECT_TRUE(announceKeptShares(ad));
-    EXPECT_EQ(ad->operation_type, OPERATION_PUSH);
-    EXPECT_TRUE(waitFor(left)) << log.text();
-    EXPECT_TRUE(log.has("noti restored"));
-    EXPECT_EQ(posted("PUSH_NOTI")->content, "Bob Example, Ann Example");
-}
-
-TEST_F(PushReceiver, KeptSharesAreAnnouncedAlsoRightAfterTheServiceWasSwitchedOff)
-{
-    abandonPushes();
-    push({"T1"});
-    EXPECT_TRUE(waitFor(left)) << log.text();
-    EXPECT_FALSE(posted("PUSH_NOTI"));
-    log.restart();
-    EXPECT_TRUE(announceKeptShares(ad));
-    EXPECT_TRUE(waitFor(left)) << log.text();
-    EXPECT_TRUE(posted("PUSH_NOTI"));
-}
-
-TEST_F(PushReceiver, WithoutKeptSharesThereIsNothingToAnnounce)
-{
-    EXPECT_FALSE(announceKeptShares(ad));
-    EXPECT_EQ(ad->operation_type, OPERATION_DEFAULT);
-    EXPECT_THAT(service.asked(), IsEmpty());
-}
-
-TEST_F(PushReceiver, KeptSharesThatAreBeingAnnouncedAreNotAnnouncedTwice)
-{
-    service.hold("T1");
-    push({"T1"});
-    EXPECT_TRUE(announceKeptShares(ad));
-    service.release();
-    EXPECT_TRUE(waitFor(left)) << log.text();
-    EXPECT_THAT(service.asked(), ElementsAre("T1"));
-}
-
-// The loop was asked to end while the library was still at it.
-TEST_F(PushReceiver, APushIsFinishedBeforeTheApplicationIsGone)
-{
-    service.hold("T1");
-    push({"T1"});
-    push({"T2"});
-    EXPECT_TRUE(loop.runUntil([this] { return !service.asked().empty(); }));
-    std::thread later([this] { service.release(); });
-    finishPushes();
-    later.join();
-    EXPECT_EQ(times(">>>>>>>>>>>>> noti create success <<<<<<<<<<<<<<<<"), 2);
-    EXPECT_EQ(posted("PUSH_NOTI")->title, "Bob Example");
 }
 
 TEST_F(PushReceiver, WhatComesThroughThePipeAlwaysEndsWithTheExitRule)
