@@ -12,6 +12,8 @@
 #include "PellikoVelmoraLog/PellikoVelmoraLog.h"
 
 #include <cstring>
+#include <glib.h>
+#include <memory>
 #include <pelliko_operations.h>
 
 namespace pelliko
@@ -82,7 +84,7 @@ Next _onShareText(const Launch &launch, PellikoAppData *ad)
     LOG_DEBUG("SHARE_TEXT, create uri with text !!");
     ad->operation_type = OPERATION_SHARE;
     ensureMainWindow(launch.app, ad);
-    const CText path(_createTextUri(launch.request, ad));
+    const std::unique_ptr<char, decltype(&g_free)> path(_createTextUri(launch.request, ad), g_free);
     if (!path) {
         LOG_DEBUG("_createTextUri failed!");
         return Next::leave;
