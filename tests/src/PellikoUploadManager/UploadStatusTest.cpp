@@ -277,12 +277,25 @@ TEST_F(UploadStatus, AReportWithoutTheRecordIsIgnored)
     EXPECT_EQ(written(), "[ERROR][(user_data == NULL)] Return message : user_data is NULL\n");
 }
 
-TEST_F(UploadStatus, StatusFourWithoutAnErrorKeepsTheUpload)
+TEST_F(UploadStatus, StatusesWithoutAStepOfTheirOwnKeepTheUploadAndRefreshIt)
+{
+    for (const int status : {4, 0, 99}) {
+        start();
+        report(status, 30);
+        EXPECT_EQ(written(), head(status, 0, 30) + sending("0", "0.000000"));
+        EXPECT_EQ(posted("7")->extras.at("upload_status"), "3");
+        EXPECT_TRUE(inList(7));
+        EXPECT_EQ(rows(), (std::vector<int>{7}));
+        report(5);
+        written();
+    }
+}
+
+TEST_F(UploadStatus, AnExpiryBeyondThirtyTwoBitsIsLoggedWhole)
 {
     start();
-    report(4);
-    EXPECT_TRUE(inList(7));
-    EXPECT_EQ(rows(), (std::vector<int>{7}));
+    uploadResponseStatusCb(1, nullptr, 0, 5000000000, 0, 0, 7, ad);
+    EXPECT_TRUE(log.has("expired_time : 5000000000")) << log.text();
 }
 
 } // namespace
