@@ -14,10 +14,10 @@ using pelliko::companion::SentShare;
 using pelliko::history::Kind;
 using pelliko::history::Opening;
 using pelliko::history::openingOf;
+using pelliko::history::recipientsText;
+using pelliko::history::rowOf;
 using pelliko::history::senderText;
 using pelliko::history::stateText;
-using pelliko::history::rowOf;
-using pelliko::history::recipientsText;
 
 constexpr const char *prefix = "http://tizen.org/appcontrol/operation/";
 
