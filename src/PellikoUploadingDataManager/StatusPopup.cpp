@@ -118,11 +118,16 @@ void _addOkButton(PellikoAppData *ad, Evas_Smart_Cb leave)
     elm_object_part_content_set(ad->popup, "button1", layout);
 }
 
+// How far the tapped upload had got by its last report, 0 when it has ended.
+double _pressedProgress()
+{
+    const UploadNotiData *node = _pressedNode();
+    return node ? static_cast<double>(node->progress_percent) : 0.0;
+}
+
 // The bar and the button that belong to the state.
 void _addStateContents(PellikoAppData *ad)
 {
-    const UploadNotiData *node = _pressedNode();
-    const double progress = node ? static_cast<double>(node->progress_percent) : 0.0;
     switch (g_noti_press_data.upload_status) {
     case NOTI_STATE_PREPARING:
         _addBar(ad, 0.0);
@@ -132,7 +137,7 @@ void _addStateContents(PellikoAppData *ad)
         [[fallthrough]];
     case NOTI_STATE_PAUSED:
     case NOTI_STATE_PAUSED_BY_SERVICE:
-        _addBar(ad, progress);
+        _addBar(ad, _pressedProgress());
         _addCancelButton(ad);
         break;
     default:

@@ -91,6 +91,17 @@ TEST_F(StatusPopup, SizesArePrintedInTheirUnit)
     }
 }
 
+TEST_F(StatusPopup, OnlyAnUploadWithABarIsAskedForItsProgress)
+{
+    pending(45);
+    const std::pair<int, int> lookups[] = {{0, 0}, {1, 1}, {2, 1}, {3, 1}, {5, 0}, {6, 0}};
+    for (const auto &[state, times] : lookups) {
+        log.restart();
+        tap({.state = state});
+        EXPECT_THAT(log.messages(), Contains("Request id found = 7").Times(times)) << state;
+    }
+}
+
 TEST_F(StatusPopup, FirstProgressBringsTheButtonAndTheSendingLine)
 {
     tap({.state = NOTI_STATE_PREPARING});
