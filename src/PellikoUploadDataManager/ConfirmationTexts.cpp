@@ -104,6 +104,8 @@ void getTextForConfirmationPopup(PellikoAppData *ad, char *body, char *summary)
     if (!ad || !ad->upload_item)
         return;
     const UploadItem &item = *ad->upload_item;
+    LOG_DEBUG("ad->upload_item->files_count = %d", item.files_count);
+    LOG_DEBUG("ad->upload_item->files_size = %ld", static_cast<long>(item.files_size));
     const bool reshare = ad->action_type == ACTION_RESHARE_UPLOAD;
     const Size size = _sizeOf(item.files_size);
     char amount[64];

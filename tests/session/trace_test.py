@@ -65,6 +65,8 @@ This is a joined user. Returning TRUE
 recipient_list is valid
 ad->operation_type =4,g_total_recipients =1
 Setting confirmation_popup_share_view_single
+ad->upload_item->files_count = 1
+ad->upload_item->files_size = 2000
 dget_text = To avoid extra charges, share via Wi\u2011Fi\u00a0only. and dget_text1 = 1 file <br>(1.00KB)
 current_time + 2days=DATE
 Adding recipient- name = Ann Example

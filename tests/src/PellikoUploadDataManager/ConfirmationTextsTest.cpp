@@ -137,7 +137,7 @@ TEST_F(ConfirmationTexts, GermanHasItsOwnTextsAndDecimalComma)
                       "vermeiden.");
 }
 
-TEST_F(ConfirmationTexts, BothTextsAndTheExpiryDateAreLogged)
+TEST_F(ConfirmationTexts, FiguresBothTextsAndTheExpiryDateAreLogged)
 {
     const test::FileLog log;
     share(1, 1500, 1);
@@ -146,7 +146,9 @@ TEST_F(ConfirmationTexts, BothTextsAndTheExpiryDateAreLogged)
     char date[32];
     strftime(date, sizeof(date), "%d/%m/%Y", localtime(&expiry));
     EXPECT_THAT(log.messages(),
-                ::testing::ElementsAre(std::string("dget_text = ") + wifiAdvice +
+                ::testing::ElementsAre("ad->upload_item->files_count = 1",
+                                       "ad->upload_item->files_size = 1500",
+                                       std::string("dget_text = ") + wifiAdvice +
                                            " and dget_text1 = 1 file <br>(1.00KB)",
                                        std::string("current_time + 2days=") + date));
 }
