@@ -40,7 +40,7 @@ void _readEarlierUpload(PellikoAppData *ad)
     pelliko_upload_info_h info = nullptr;
     int error = pelliko_upload_info_get_handle(ad->req_id_to_reshare, &info);
     if (error != PELLIKO_ERROR_NONE) {
-        LOG_DEBUG("pelliko_upload_info_get_handle failed. Error = %d", error);
+        LOG_ERROR("pelliko_upload_info_get_handle failed. Error = %d", error);
         return;
     }
     char **files = nullptr;
@@ -48,7 +48,7 @@ void _readEarlierUpload(PellikoAppData *ad)
     int64_t size = 0;
     error = pelliko_upload_info_get_file_info(info, &files, &count, &size);
     if (error != PELLIKO_ERROR_NONE) {
-        LOG_DEBUG("pelliko_upload_info_get_file_info failed. Error = %d", error);
+        LOG_ERROR("pelliko_upload_info_get_file_info failed. Error = %d", error);
         return;
     }
     ad->upload_item->files_count = count;

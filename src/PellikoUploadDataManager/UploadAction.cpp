@@ -30,9 +30,9 @@ void _onServiceInitializing(PellikoAppData *ad)
 
 void _onStartError(PellikoAppData *ad, int error)
 {
-    LOG_DEBUG("Upload error, ret = %d", error);
+    LOG_ERROR("Upload error, ret = %d", error);
     if (error == PELLIKO_ERROR_SERVICE_INITIALIZING) {
-        LOG_DEBUG("Error - PELLIKO_ERROR_SERVICE_INITIALIZING");
+        LOG_ERROR("Error - PELLIKO_ERROR_SERVICE_INITIALIZING");
         _onServiceInitializing(ad);
         return;
     }
