@@ -37,6 +37,16 @@ TEST_F(UploadNotifications, NotifyingIsNotShownForACancelledTappedUpload)
     }
 }
 
+TEST_F(UploadNotifications, NotifyingThatIsShownAlreadyIsKept)
+{
+    UploadNotiData *node = preparing({"/a"});
+    notification_set_text(node->notif, NOTIFICATION_TEXT_TYPE_TITLE, "Telling the recipients…",
+                          nullptr, NOTIFICATION_VARIABLE_TYPE_NONE);
+    updateUploadNotificationWaitForNoti();
+    EXPECT_EQ(log.text(), "Notification already added. returning\n");
+    EXPECT_EQ(posted("7")->title, "Preparing to send files…");
+}
+
 TEST_F(UploadNotifications, SentReplacesNotifyingByItsTag)
 {
     UploadNotiData *node = preparing({"/a", "/b"});

@@ -140,7 +140,9 @@ TEST_F(UploadNotifications, NoFilesNoTitle)
     UploadNotiData *node = preparing({});
     EXPECT_EQ(progress(node, 1), 1);
     EXPECT_EQ(posted("7")->title, "");
+    log.restart();
     EXPECT_EQ(progress(node, 2), 0);
+    EXPECT_TRUE(log.text().starts_with("notification get text error = ")) << log.text();
 }
 
 TEST_F(UploadNotifications, WithoutAHandleNothingIsSent)
@@ -232,6 +234,18 @@ TEST_F(UploadNotifications, PausingWhatTheUserSwipedAwayDoesNotBringItBack)
     addPausedNotification(node, PELLIKO_UPLOAD_STATUS_PAUSED);
     EXPECT_TRUE(log.has("Already preparing to upload.. returning")) << log.text();
     EXPECT_FALSE(posted("7"));
+}
+
+TEST_F(UploadNotifications, PauseThatCannotBeShownLeavesNoHandle)
+{
+    UploadNotiData *node = preparing({"/a"});
+    g_upload_noti_data_list = nullptr; // the upload is no longer in the list
+    addPausedNotification(node, PELLIKO_UPLOAD_STATUS_PAUSED);
+    g_upload_noti_data_list = node;
+    EXPECT_EQ(node->notif, nullptr);
+    EXPECT_FALSE(posted("7"));
+    EXPECT_EQ(log.messages().back(), "Failure Case...:");
+    EXPECT_TRUE(log.has("_notificationInsert failed [-22]")) << log.text();
 }
 
 TEST_F(UploadNotifications, ProgressAfterAPauseShowsSendingAgain)

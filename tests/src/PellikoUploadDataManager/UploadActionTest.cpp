@@ -1,6 +1,10 @@
 #include "PellikoUploadDataManager/UploadAction.h"
+#include "PellikoUploadDataManager/Recipients.h"
 #include "support/AppWorld.h"
+#include "support/ContactsStore.h"
 
+#include <algorithm>
+#include <contacts.h>
 #include <new>
 
 namespace
@@ -76,6 +80,34 @@ TEST_F(UploadAction, AReshareWithoutMemoryDoesNotRestartAnEarlierOne)
     EXPECT_EQ(actWithoutMemory(ACTION_RESHARE_UPLOAD), 0);
     expectEarlierUploadUntouched();
     EXPECT_EQ(log.messages().back(), "reshareUploadStart ret = 0");
+}
+
+TEST_F(UploadAction, AShareWithoutMemoryForItsItemHasNone)
+{
+    outOfMemory = true;
+    EXPECT_EQ(createUploadData(), nullptr);
+    outOfMemory = false;
+    EXPECT_EQ(log.text(), "Malloc failed\n");
+}
+
+TEST_F(UploadAction, NoMemoryForARecipientEndsTheList)
+{
+    ASSERT_EQ(contacts_connect(), CONTACTS_ERROR_NONE);
+    addPerson("Ann Example", {"+447700900301", "+447700900302"});
+    clearUploadRecipients(*ad->upload_item);
+    ad->number_id_count = 2;
+    ad->number_id_list[0] = 1;
+    ad->number_id_list[1] = 2;
+    log.restart();
+    outOfMemory = true;
+    _createRecipientToUpload(ad);
+    outOfMemory = false;
+    ad->number_id_count = 0;
+    contacts_disconnect();
+    EXPECT_EQ(ad->upload_item->recipient_list, nullptr);
+    const auto lines = log.messages();
+    EXPECT_EQ(lines.back(), "Malloc error");
+    EXPECT_EQ(std::count(lines.begin(), lines.end(), "phone number case"), 1);
 }
 
 TEST_F(UploadAction, AnUnknownActionIsLogged)
