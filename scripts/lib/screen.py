@@ -71,7 +71,7 @@ def find(label, role=None):
     return None
 
 
-class _Drawing:
+class Drawing:
     """Wakes the loop whenever something is drawn on the screen, and tells `drawn` if that is given."""
 
     def __init__(self, drawn=None):
@@ -102,7 +102,7 @@ def wait_for_control(label, role=None, limit=LIMIT):
     listener = lambda event: None  # noqa: E731 - its only purpose is to wake the loop
     for event in _EVENTS:
         pyatspi.Registry.registerEventListener(listener, event)
-    drawing = _Drawing()
+    drawing = Drawing()
     try:
         return wait_for(lambda: find(label, role), f"the control “{label}”", limit)
     finally:
@@ -148,7 +148,7 @@ def wait_still(quiet=0.4, limit=5.0):
 
     timers["quiet"] = GLib.timeout_add(int(quiet * 1000), settle)
     timers["limit"] = GLib.timeout_add(int(limit * 1000), settle)
-    drawing = _Drawing(drawn)
+    drawing = Drawing(drawn)
     loop.run()
     drawing.close()
     for timer in timers.values():
