@@ -1,0 +1,107 @@
+"""./run on a display of the user's own: the person signs in, presses Share and saves; the script only watches.
+
+The person is played from outside of the world, with a keyboard and a pointer on that display.
+"""
+
+import os
+import re
+import subprocess
+import sys
+import tempfile
+import unittest
+
+HERE = os.path.dirname(os.path.abspath(__file__))
+TOP = os.path.dirname(os.path.dirname(HERE))
+BUILD = sys.argv.pop(1)
+SHARE = ("360", "756")  # the right one of the two buttons at the lower edge of a screen of 480x800
+CANCEL = ("120", "756")
+
+
+class Desktop:
+    """A display with a window manager, as somebody's own session has it."""
+
+    def __init__(self):
+        read, write = os.pipe()
+        self.server = subprocess.Popen(["Xvfb", "-displayfd", str(write), "-screen", "0", "480x800x24", "-nolisten", "tcp",
+                                        "-noreset"], pass_fds=[write], stderr=subprocess.DEVNULL)
+        os.close(write)
+        with os.fdopen(read) as numbers:
+            self.environment = {**os.environ, "DISPLAY": f":{numbers.readline().strip()}"}
+        self.environment.pop("XAUTHORITY", None)
+        with tempfile.TemporaryDirectory() as folder:
+            started = os.path.join(folder, "started")
+            os.mkfifo(started)
+            self.manager = subprocess.Popen(
+                ["openbox", "--sm-disable", "--config-file", os.path.join(TOP, "scripts", "session-data", "openbox.xml"),
+                 "--startup", f"sh -c 'echo ready >{started}'"], env=self.environment, stderr=subprocess.DEVNULL)
+            with open(started, encoding="utf-8") as ready:
+                ready.readline()
+
+    def do(self, *words):
+        subprocess.run(["xdotool", *words], env=self.environment, check=True)
+
+    def type(self, text):
+        self.do("type", "--delay", "20", "--", text)
+
+    def close(self):
+        for process in (self.manager, self.server):
+            process.terminate()
+            process.wait()
+
+
+class Person(unittest.TestCase):
+    def setUp(self):
+        self.desktop = Desktop()
+        self.addCleanup(self.desktop.close)
+        pictures = tempfile.TemporaryDirectory()
+        self.addCleanup(pictures.cleanup)
+        self.run = subprocess.Popen(
+            [os.path.join(TOP, "scripts", "session"), "--build", BUILD, "--host-display", "--no-account",
+             "--modem", "ofono:234159900000100", "--writable", pictures.name, "--",
+             "/usr/bin/python3", "-u", os.path.join(TOP, "scripts", "main-job"), "--pictures", pictures.name],
+            env=self.desktop.environment, stdout=subprocess.PIPE, stderr=subprocess.STDOUT, text=True)
+        self.said = ""
+        self.addCleanup(self.end)
+
+    def end(self):
+        self.run.stdout.close()
+        self.run.kill()
+        self.run.wait()
+
+    def until(self, pattern):
+        """Reads what is printed until it matches."""
+        while not (found := re.search(pattern, self.said)):
+            line = self.run.stdout.readline()
+            self.assertTrue(line, f"it ended without “{pattern}”:\n{self.said}")
+            self.said += line
+        return found
+
+    def sign_in(self):
+        number, code = self.until(r"Number (\+\d+), invitation code (\S+)").groups()
+        self.until(r"The sign-in is open")
+        self.desktop.do("key", "ctrl+a", "key", "BackSpace")
+        self.desktop.type(number)
+        self.desktop.do("key", "Return")
+        self.desktop.type(code)
+        self.desktop.do("key", "Return")
+
+    def test_the_person_signs_in_shares_and_saves(self):
+        self.sign_in()
+        self.until(r"press Share")
+        self.desktop.do("mousemove", *SHARE, "click", "1")
+        self.until(r"Files sent")
+        self.until(r"press Save all")
+        self.desktop.do("key", "Return")
+        self.until(r"All of it held")
+        self.assertEqual(0, self.run.wait())
+
+    def test_who_cancels_is_told_that_nothing_was_sent(self):
+        self.sign_in()
+        self.until(r"press Share")
+        self.desktop.do("mousemove", *CANCEL, "click", "1")
+        self.until(r"the share was cancelled; nothing was sent")
+        self.assertEqual(1, self.run.wait())
+
+
+if __name__ == "__main__":
+    unittest.main(verbosity=2)
