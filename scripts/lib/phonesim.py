@@ -227,6 +227,13 @@ class Service:
     def _sim_is_read(self, slot):
         return bool(self._properties(slot, "org.ofono.SimManager").get("SubscriberIdentity"))
 
+    def _asks_for_pin(self, slot):
+        return self._properties(slot, "org.ofono.SimManager").get("PinRequired", "none") != "none"
+
+    async def wait_locked(self, slot):
+        """oFono sees that there is a card before it sees that the card is locked."""
+        await asyncio.to_thread(self._until, lambda: self._asks_for_pin(slot), "oFono to ask for the PIN")
+
     @staticmethod
     def forget():
         """Messages that oFono had not got rid of would be sent when it runs again."""
@@ -309,6 +316,8 @@ class Phone:
         await self.service.set(modem.slot, "Powered", on)
         if on and modem.sim == "ready":
             await self.service.go_online(modem.slot)
+        elif on and modem.sim == "locked":
+            await self.service.wait_locked(modem.slot)
 
     async def start(self):
         await self.service.start()

@@ -13,6 +13,7 @@ SOURCE, BUILD = Path(sys.argv.pop(1)), Path(sys.argv.pop(1))
 APP = BUILD / "app"
 FILES = [
     "res/edje/pelliko.edj",
+    "res/images/sender-images/WVGA/noti_icon_pelliko.png",
     "res/images/sender-images/WVGA/pk_badge_ic_sms.png",
     "res/images/sender-images/WVGA/pk_caller_id_default.png",
     "res/images/sender-images/WVGA/pk_caller_id_default_masking.png",
