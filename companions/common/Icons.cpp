@@ -27,8 +27,9 @@ std::string find(const std::string &name)
     for (const char *theme : themes)
         for (const std::string &folder : iconFolders())
             for (const char *size : sizes) {
-                const std::string file =
-                    folder + theme + "/" + size + "/mimetypes/" + name + ".png";
+                std::string file = folder;
+                file.append(theme).append("/").append(size).append("/mimetypes/");
+                file.append(name).append(".png");
                 if (access(file.c_str(), R_OK) == 0)
                     return file;
             }

@@ -47,6 +47,7 @@ int shareAgain(int32_t requestId, const std::vector<int32_t> &numberIds)
     for (size_t i = 0; i < numberIds.size() && i < mostRecipients; ++i)
         texts.push_back(std::to_string(numberIds[i]));
     std::vector<const char *> pointers;
+    pointers.reserve(texts.size());
     for (const std::string &text : texts)
         pointers.push_back(text.c_str());
 
