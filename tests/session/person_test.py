@@ -13,6 +13,9 @@ import unittest
 HERE = os.path.dirname(os.path.abspath(__file__))
 TOP = os.path.dirname(os.path.dirname(HERE))
 BUILD = sys.argv.pop(1)
+NUMBER_FIELD = ("240", "402")
+CODE_FIELD = ("240", "489")
+SIGN_IN = ("356", "609")
 SHARE = ("360", "756")  # the right one of the two buttons at the lower edge of a screen of 480x800
 CANCEL = ("120", "756")
 
@@ -39,6 +42,9 @@ class Desktop:
 
     def do(self, *words):
         subprocess.run(["xdotool", *words], env=self.environment, check=True)
+
+    def press(self, place):
+        self.do("mousemove", *place, "click", "1")
 
     def type(self, text):
         self.do("type", "--delay", "20", "--", text)
@@ -79,16 +85,17 @@ class Person(unittest.TestCase):
     def sign_in(self):
         number, code = self.until(r"Number (\+\d+), invitation code (\S+)").groups()
         self.until(r"The sign-in is open")
+        self.desktop.press(NUMBER_FIELD)
         self.desktop.do("key", "ctrl+a", "key", "BackSpace")
         self.desktop.type(number)
-        self.desktop.do("key", "Return")
+        self.desktop.press(CODE_FIELD)
         self.desktop.type(code)
-        self.desktop.do("key", "Return")
+        self.desktop.press(SIGN_IN)
 
     def test_the_person_signs_in_shares_and_saves(self):
         self.sign_in()
         self.until(r"press Share")
-        self.desktop.do("mousemove", *SHARE, "click", "1")
+        self.desktop.press(SHARE)
         self.until(r"Files sent")
         self.until(r"press Save all")
         self.desktop.do("key", "Return")
@@ -98,7 +105,7 @@ class Person(unittest.TestCase):
     def test_who_cancels_is_told_that_nothing_was_sent(self):
         self.sign_in()
         self.until(r"press Share")
-        self.desktop.do("mousemove", *CANCEL, "click", "1")
+        self.desktop.press(CANCEL)
         self.until(r"the share was cancelled; nothing was sent")
         self.assertEqual(1, self.run.wait())
 
