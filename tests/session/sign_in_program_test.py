@@ -27,12 +27,10 @@ class SignInProgram(share_case.ShareCase):
 
     def test_the_share_goes_on_after_the_sign_in(self):
         code = world.run("pelliko-server", "account", "invite", "--data", SERVER_DATA).strip()
-        # The server is proposed, so the number has the focus.
-        world.run("xdotool", "type", "--delay", "5", "--", NUMBER)
-        screen.key("Return")
-        world.run("xdotool", "type", "--delay", "5", "--", code)
+        screen.type_into("Your phone number", NUMBER)
+        screen.type_into("Invitation code", code)
         self.picture("form")
-        screen.key("Return")
+        screen.press("Sign in", "button")
         self.confirm()
         message = self.messages(1)[0]
         self.assert_downloads_equal(message, {"note.txt": b"note"})
