@@ -171,7 +171,7 @@ std::string ExportFiles::publish(size_t index)
     const std::string &stem = m_stems.at(index);
     for (int &number = m_next_number[stem];;) {
         ++number;
-        const std::string name =
+        std::string name =
             number == 1 ? stem + ending : stem + " (" + std::to_string(number) + ")" + ending;
         const std::string path = m_directory + "/" + name;
         if (::renameat2(AT_FDCWD, staged.c_str(), AT_FDCWD, path.c_str(), RENAME_NOREPLACE) == 0)

@@ -82,7 +82,7 @@ std::string percentDecoded(const std::string &text)
 // "tel:+1-202-555-0100;ext=5" is the number up to the parameters.
 std::string numberText(EVCardAttribute *attribute)
 {
-    const std::string value = onOneLine(wholeValueOf(attribute));
+    std::string value = onOneLine(wholeValueOf(attribute));
     if (g_ascii_strncasecmp(value.c_str(), "tel:", 4) != 0)
         return value;
     return percentDecoded(value.substr(4, value.find(';') - 4));

@@ -35,7 +35,7 @@ bool isQuotedPrintable(std::string_view line)
     std::string head(line.substr(0, line.find(':')));
     for (char &letter : head)
         letter = g_ascii_toupper(letter);
-    return head.find(";") != std::string::npos &&
+    return head.find(';') != std::string::npos &&
            head.find("QUOTED-PRINTABLE") != std::string::npos;
 }
 

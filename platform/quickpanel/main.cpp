@@ -67,9 +67,7 @@ void serve(GDBusConnection *bus, GMainLoop *loop)
     g_main_loop_run(loop);
 }
 
-} // namespace
-
-int main(int argc, char **argv)
+int runProgram(int argc, char **argv)
 {
     CLI::App options("Keeps the notifications that applications post and shows them through the\n"
                      "desktop's notification daemon. Started by the session bus.");
@@ -78,9 +76,16 @@ int main(int argc, char **argv)
     GMainLoop *loop = g_main_loop_new(nullptr, FALSE);
     g_unix_signal_add(SIGTERM, onSignal, loop);
     g_unix_signal_add(SIGINT, onSignal, loop);
+    serve(connect(), loop);
+    return EXIT_SUCCESS;
+}
+
+} // namespace
+
+int main(int argc, char **argv)
+{
     try {
-        serve(connect(), loop);
-        return EXIT_SUCCESS;
+        return runProgram(argc, argv);
     } catch (const std::exception &error) {
         std::fprintf(stderr, "quickpanel: %s\n", error.what());
         return EXIT_FAILURE;

@@ -111,6 +111,7 @@ void PushDelivery::launch()
     }
     journal_.countLaunch(tokens, 1);
     std::vector<std::string> texts;
+    texts.reserve(tokens.size());
     for (const auto &one : tokens) {
         texts.push_back(one.token);
     }

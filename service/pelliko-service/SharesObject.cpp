@@ -20,6 +20,7 @@ constexpr guint changedDelayMs = 100;
 std::vector<const char *> pointersTo(const std::vector<std::string> &texts)
 {
     std::vector<const char *> result;
+    result.reserve(texts.size() + 1);
     for (const std::string &text : texts) {
         result.push_back(text.c_str());
     }

@@ -203,6 +203,18 @@ int runCommand(const CLI::App &app, const ServeOptions &serveOptions,
     return server::listAccountsCommand(accountOptions.data);
 }
 
+int runProgram(int argc, char **argv)
+{
+    CLI::App app("Share server of Pelliko: resumable uploads, links with an end, downloads.");
+    app.require_subcommand(1);
+    ServeOptions serveOptions;
+    AccountOptions accountOptions;
+    addServe(app, serveOptions);
+    addAccount(app, accountOptions);
+    CLI11_PARSE(app, argc, argv);
+    return runCommand(app, serveOptions, accountOptions);
+}
+
 } // namespace
 
 int main(int argc, char **argv)
@@ -213,15 +225,8 @@ int main(int argc, char **argv)
     // A limit on the size of files is one more way of having no space, not a reason to die.
     std::signal(SIGXFSZ, SIG_IGN);
     umask(077);
-    CLI::App app("Share server of Pelliko: resumable uploads, links with an end, downloads.");
-    app.require_subcommand(1);
-    ServeOptions serveOptions;
-    AccountOptions accountOptions;
-    addServe(app, serveOptions);
-    addAccount(app, accountOptions);
-    CLI11_PARSE(app, argc, argv);
     try {
-        return runCommand(app, serveOptions, accountOptions);
+        return runProgram(argc, argv);
     } catch (const std::exception &error) {
         std::fprintf(stderr, "pelliko-server: %s\n", error.what());
         return EXIT_FAILURE;

@@ -97,9 +97,7 @@ void addEvents(CLI::App &tool, Options &options)
     live->callback([&] { watchEvents(options); });
 }
 
-} // namespace
-
-int main(int argc, char **argv)
+int runProgram(int argc, char **argv)
 {
     CLI::App tool("Looks into the notification panel, taps and swipes.");
     tool.require_subcommand(1);
@@ -107,11 +105,18 @@ int main(int argc, char **argv)
     addList(tool, options);
     addFingers(tool, options);
     addEvents(tool, options);
+    CLI11_PARSE(tool, argc, argv);
+    return EXIT_SUCCESS;
+}
+
+} // namespace
+
+int main(int argc, char **argv)
+{
     try {
-        CLI11_PARSE(tool, argc, argv);
-        return EXIT_SUCCESS;
+        return runProgram(argc, argv);
     } catch (const std::exception &error) {
-        std::cerr << "quickpanel-tool: " << error.what() << std::endl;
+        std::fprintf(stderr, "quickpanel-tool: %s\n", error.what());
         return EXIT_FAILURE;
     }
 }
