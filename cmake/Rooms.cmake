@@ -44,6 +44,20 @@ function(pelliko_program name)
   install(TARGETS ${name} RUNTIME DESTINATION ${CMAKE_INSTALL_BINDIR})
 endfunction()
 
+# Where programs look for their modules, seen from their own folder: the same in the build tree and installed.
+file(RELATIVE_PATH pelliko_module_dir "${CMAKE_INSTALL_FULL_BINDIR}" "${CMAKE_INSTALL_FULL_LIBDIR}/pelliko")
+
+# pelliko_module(NAME SOURCES... [LIBS libs...]): a part of programs that they load when they need it
+# (platform/common/Module.h), NAME.so. Whoever loads it depends on the target NAME.
+function(pelliko_module name)
+  cmake_parse_arguments(arg "" "" "SOURCES;LIBS" ${ARGN})
+  add_library(${name} MODULE ${arg_SOURCES})
+  set_target_properties(${name} PROPERTIES PREFIX "" LIBRARY_OUTPUT_DIRECTORY "${CMAKE_RUNTIME_OUTPUT_DIRECTORY}/${pelliko_module_dir}"
+                        CXX_VISIBILITY_PRESET hidden VISIBILITY_INLINES_HIDDEN ON)
+  target_link_libraries(${name} PRIVATE pelliko_options ${arg_LIBS})
+  install(TARGETS ${name} LIBRARY DESTINATION "${CMAKE_INSTALL_LIBDIR}/pelliko")
+endfunction()
+
 # pelliko_activatable(BUS_NAME PROGRAM [UNIT unit]): the bus starts PROGRAM when somebody calls BUS_NAME.
 # A bus that systemd runs leaves that to the user unit, where systemd would find the installed one.
 # The build tree's file (for sessions) names the program where it was built, the installed one where it goes.

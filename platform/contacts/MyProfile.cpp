@@ -27,6 +27,8 @@ Outcome<bool> saveMyProfile(const ContactCard &card)
         return {true, {}};
     } catch (const std::system_error &error) {
         return {std::nullopt, "the profile cannot be stored: " + error.code().message()};
+    } catch (const std::runtime_error &error) {
+        return {std::nullopt, std::string("the profile cannot be stored: ") + error.what()};
     }
 }
 

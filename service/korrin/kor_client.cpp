@@ -55,6 +55,8 @@ int check(const std::string &file, char **imsi, int *state)
         const std::string known = found.account.imsi.empty()
                                       ? pelliko::korrin::composedImsi(found.account.number)
                                       : found.account.imsi;
+        if (known.empty())
+            return KOR_ERROR_IO_ERROR;
         if (const int error = tell(known, imsi); error != KOR_ERROR_NONE)
             return error;
     } else {

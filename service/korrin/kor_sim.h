@@ -12,7 +12,8 @@ std::string machineImsi();
 
 /// A stand-in for the SIM of an account on a machine without one: the country of the number, the
 /// network 00 and the number's last ten digits. "001", the code of test networks, for a country
-/// that is not known. Any thread.
+/// that is not known. Empty when the installation lacks the tables of countries; the log then says
+/// so. Any thread.
 /// @param number in international form
 std::string composedImsi(const std::string &number);
 

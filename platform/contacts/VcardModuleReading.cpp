@@ -1,4 +1,4 @@
-#include "VcardCard.h"
+#include "VcardModule.h"
 
 #include <algorithm>
 #include <array>
@@ -277,7 +277,7 @@ void noteLetters(const ContactCard &card, std::vector<std::string> &notes)
 
 } // namespace
 
-ReadCard readCard(const std::string &text)
+ReadCard readCardByLibrary(const std::string &text)
 {
     ReadCard read;
     Reading reading;
