@@ -3,16 +3,22 @@
 #include "PellikoApp/CText.h"
 #include "PellikoApp/TextFormat.h"
 
+#include <algorithm>
+#include <atomic>
+#include <cerrno>
 #include <cstdarg>
 #include <cstdio>
 #include <cstring>
 #include <ctime>
 #include <dlog.h>
+#include <fcntl.h>
 #include <ftw.h>
+#include <iterator>
 #include <langinfo.h>
-#include <mutex>
 #include <optional>
+#include <pthread.h>
 #include <sys/stat.h>
+#include <sys/uio.h>
 #include <unistd.h>
 
 namespace pelliko
@@ -26,16 +32,33 @@ constexpr const char *logPath = "/opt/usr/apps/com.velmora.pelliko/data/.app-log
 constexpr const char *logName = "app.log";
 constexpr const char *platformTag = "PELLIKO";
 constexpr const char *fileTag = "PELLIKO:MESSAGE";
-constexpr long rotationSize = 0x500000;
+constexpr off_t rotationSize = 0x500000;
 constexpr int maxCountedArchives = 4;
 constexpr size_t archiveNameSize = 4096;
 constexpr size_t commandSize = 4351;
+constexpr size_t prefixSize = 512;
 
-// Everything below is guarded by this mutex. None of it needs a destructor: a detached thread may
+// Lines are appended under the shared lock, each with one call of the system, which keeps them
+// whole and in order; a rotation has the file for itself. Waiting rotations go before new lines, or
+// a chatty program would never come to one. None of this needs a destructor: a detached thread may
 // log until the very end of the process.
-std::mutex g_mutex;
+pthread_rwlock_t g_lock = PTHREAD_RWLOCK_WRITER_NONRECURSIVE_INITIALIZER_NP;
 int archive_count = 0;
-bool initialised = false;
+std::atomic<bool> initialised = false;
+
+struct SharedLock {
+    SharedLock() { pthread_rwlock_rdlock(&g_lock); }
+    ~SharedLock() { pthread_rwlock_unlock(&g_lock); }
+    SharedLock(const SharedLock &) = delete;
+    SharedLock &operator=(const SharedLock &) = delete;
+};
+
+struct ExclusiveLock {
+    ExclusiveLock() { pthread_rwlock_wrlock(&g_lock); }
+    ~ExclusiveLock() { pthread_rwlock_unlock(&g_lock); }
+    ExclusiveLock(const ExclusiveLock &) = delete;
+    ExclusiveLock &operator=(const ExclusiveLock &) = delete;
+};
 
 // A trace reads the same in every language: "45.500000" also where people write a comma.
 CText _format(const char *format, va_list arguments)
@@ -58,14 +81,24 @@ int _countArchiveCb(const char *path, const struct stat *, int type)
     return archive_count >= maxCountedArchives ? 1 : 0;
 }
 
-void _initialise()
+void _countArchives()
 {
-    initialised = true;
     struct stat info;
     if (stat(logDirectory, &info) != 0 || !S_ISDIR(info.st_mode))
         return;
     archive_count = 0;
     ftw(logDirectory, _countArchiveCb, 256);
+}
+
+void _initialiseOnce()
+{
+    if (initialised)
+        return;
+    const ExclusiveLock lock;
+    if (initialised)
+        return;
+    _countArchives();
+    initialised = true;
 }
 
 void _archiveName(char (&name)[archiveNameSize], int number)
@@ -89,48 +122,84 @@ void _rotate()
         ++archive_count;
 }
 
-void _writePrefix(FILE *out, const char *file, const char *function, int line, const char *tag)
+// The local time of the second, which threads share a lock for asking: each asks once a second.
+// False when it cannot be told.
+bool _localTime(time_t now, struct tm &local)
+{
+    thread_local time_t known_second = -1;
+    thread_local struct tm known;
+    if (now != known_second) {
+        if (!localtime_r(&now, &known))
+            return false;
+        known_second = now;
+    }
+    local = known;
+    return true;
+}
+
+// What stands before the message; a place would have to be very long to be cut.
+size_t _printPrefix(char (&prefix)[prefixSize], const char *file, const char *function, int line,
+                    const char *tag)
 {
     const time_t now = time(nullptr);
     struct tm local;
-    if (localtime_r(&now, &local))
-        fprintf(out, "%.2d-%.2d-%.2d %.2d:%.2d:%.2d (%ld) [%s] %s: %s(%d) > ", local.tm_year + 1900,
-                local.tm_mon + 1, local.tm_mday, local.tm_hour, local.tm_min, local.tm_sec,
-                static_cast<long>(gettid()), tag, file, function, line);
+    int length = 0;
+    if (_localTime(now, local))
+        length = snprintf(
+            prefix, sizeof(prefix), "%.2d-%.2d-%.2d %.2d:%.2d:%.2d (%ld) [%s] %s: %s(%d) > ",
+            local.tm_year + 1900, local.tm_mon + 1, local.tm_mday, local.tm_hour, local.tm_min,
+            local.tm_sec, static_cast<long>(gettid()), tag, file, function, line);
     else
-        fprintf(out, "GET TIME ERROR (%ld) [%s] %s: %s(%d) > ", static_cast<long>(gettid()), tag,
-                file, function, line);
+        length = snprintf(prefix, sizeof(prefix), "GET TIME ERROR (%ld) [%s] %s: %s(%d) > ",
+                          static_cast<long>(gettid()), tag, file, function, line);
+    return std::min(static_cast<size_t>(std::max(length, 0)), sizeof(prefix) - 1);
 }
 
-// The size of an open file; -1 when it cannot be read.
-long _sizeOf(FILE *file)
+// One call of the system for the whole line: what other threads append comes before or after it.
+// On a full disk the rest of the line is lost.
+void _writeLine(int out, char *prefix, size_t prefixLength, const char *message)
 {
-    const long position = ftell(file);
-    if (position < 0 || fseek(file, 0, SEEK_END) != 0)
+    char end[] = "\n";
+    const iovec parts[] = {
+        {prefix, prefixLength}, {const_cast<char *>(message), strlen(message)}, {end, 1}};
+    while (writev(out, parts, std::size(parts)) < 0 && errno == EINTR)
+        continue;
+}
+
+// The size of the file with the line in it; -1 when it cannot be told.
+off_t _append(const char *file, const char *function, int line, const char *tag,
+              const char *message)
+{
+    const SharedLock lock;
+    const int out = open(logPath, O_RDWR | O_CREAT | O_APPEND | O_CLOEXEC, 0666);
+    if (out < 0)
         return -1;
-    const long size = ftell(file);
-    return fseek(file, position, SEEK_SET) == 0 ? size : -1;
+    char prefix[prefixSize];
+    const size_t length = _printPrefix(prefix, file, function, line, tag);
+    _writeLine(out, prefix, length, message);
+    const off_t size = lseek(out, 0, SEEK_END);
+    close(out);
+    return size;
+}
+
+// Two threads may have found the file full: it is packed once.
+void _rotateIfStillFull()
+{
+    const ExclusiveLock lock;
+    struct stat info;
+    if (stat(logPath, &info) != 0 || info.st_size < rotationSize)
+        return;
+    _rotate();
+    if (truncate(logPath, 0) != 0)
+        return; // the next line tries again
 }
 
 void _appendLine(const char *file, const char *function, int line, const char *tag,
                  const char *message)
 {
-    const std::lock_guard lock(g_mutex);
-    if (!initialised)
-        _initialise();
-    FILE *out = fopen(logPath, "a+");
-    if (!out)
-        return;
-    _writePrefix(out, file, function, line, tag);
-    fprintf(out, "%s\n", message);
-    fflush(out);
-    const long size = _sizeOf(out);
-    fclose(out);
-    if (size < rotationSize)
-        return;
-    _rotate();
-    if (truncate(logPath, 0) != 0)
-        return; // the next line tries again
+    _initialiseOnce();
+    if (_append(file, function, line, tag, message) >= rotationSize)
+        _rotateIfStillFull();
 }
 
 } // namespace

@@ -2,6 +2,7 @@
 #include "support/FileLog.h"
 #include "support/FreshProcess.h"
 
+#include <barrier>
 #include <clocale>
 #include <cstdlib>
 #include <dlfcn.h>
@@ -359,6 +360,33 @@ TEST_F(AppLog, LinesOfManyThreadsNeverMix)
         for (const std::string &message : messages)
             ASSERT_EQ(message, std::string(lineLength, message.at(0)));
     }));
+}
+
+TEST_F(AppLog, ThreadsThatFillTheFileTogetherRotateItOnce)
+{
+    EXPECT_TRUE(holdsInFreshProcess([] {
+        constexpr int threads = 4;
+        constexpr uintmax_t rounds = 25;
+        const std::string folder = "/tmp/counting-tar";
+        fs::create_directory(folder);
+        std::ofstream(folder + "/tar") << "#!/bin/sh\nprintf x >>" << folder << "/runs\n";
+        fs::permissions(folder + "/tar", fs::perms::owner_all);
+        setenv("PATH", (folder + ":" + getenv("PATH")).c_str(), 1);
+        write("x");
+        for (uintmax_t round = 1; round <= rounds; ++round) {
+            fs::resize_file(test::logPath, rotationSize - 1);
+            std::barrier together(threads);
+            std::vector<std::jthread> writers;
+            for (int i = 0; i < threads; ++i)
+                writers.emplace_back([&together] {
+                    together.arrive_and_wait();
+                    write("full");
+                });
+            writers.clear();
+            ASSERT_EQ(fs::file_size(folder + "/runs"), round);
+        }
+    }));
+    fs::remove_all("/tmp/counting-tar");
 }
 
 } // namespace
