@@ -1,10 +1,9 @@
 #include "accounts/Invitations.h"
 
+#include "accounts/AccountJson.h"
 #include "accounts/E164.h"
 #include "http/Errors.h"
 #include "text/Secrets.h"
-
-#include <nlohmann/json.hpp>
 
 #include <vector>
 
@@ -23,15 +22,6 @@ void checkAttempts(const Request &request, Context &context)
         throw Refusal(Error::tooManyAttempts, {}, {{"Retry-After", std::to_string(*wait)}});
 }
 
-std::string textOf(const nlohmann::json &body, const char *member)
-{
-    const auto found = body.find(member);
-    if (found == body.end() || !found->is_string())
-        throw Refusal(Error::badRequest,
-                      std::string("The member \"") + member + "\" is missing or malformed.");
-    return found->get<std::string>();
-}
-
 std::string keyHashOf(const Request &request)
 {
     const std::string *key = request.header("Idempotency-Key");
@@ -42,18 +32,15 @@ std::string keyHashOf(const Request &request)
 
 Registration registrationOf(const Request &request, const std::string &text)
 {
-    const nlohmann::json body = nlohmann::json::parse(text, nullptr, false);
-    if (!body.is_object())
-        throw Refusal(Error::badRequest, "The body is not a JSON object.");
+    const RegistrationBody body = parseRegistration(text);
     Registration registration;
-    registration.number = textOf(body, "number");
-    const std::string code = textOf(body, "code");
+    registration.number = body.number;
     registration.keyHash = keyHashOf(request);
     if (!isE164(registration.number))
         throw Refusal(Error::numberInvalid);
-    if (!looksLikeToken(code))
+    if (!looksLikeToken(body.code))
         throw Refusal(Error::codeUnknown);
-    registration.codeHash = sha256(code);
+    registration.codeHash = sha256(body.code);
     return registration;
 }
 
@@ -101,8 +88,8 @@ Task<void> registerAccount(Exchange &exchange, Context &context)
         co_await context.pool.run([&] { return context.metadata.registerAccount(registration); });
     checkOutcome(result);
     co_await endFormerStreams(context, registration.tokenHash);
-    const nlohmann::json answer{{"number", registration.number}, {"token", token}};
-    co_await exchange.respond(jsonResponse(Status::created, answer.dump()));
+    co_await exchange.respond(
+        jsonResponse(Status::created, registeredJson(registration.number, token)));
 }
 
 std::string makeInvitation(Metadata &metadata, const std::string &number, int uses, Seconds now,

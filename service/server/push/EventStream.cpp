@@ -3,12 +3,9 @@
 #include "accounts/Accounts.h"
 #include "http/Errors.h"
 #include "push/PushHub.h"
-#include "tus/TusHeaders.h"
-
-#include <nlohmann/json.hpp>
+#include "push/PushJson.h"
 
 #include <cstdint>
-#include <limits>
 #include <optional>
 #include <string>
 #include <utility>
@@ -22,34 +19,15 @@ constexpr std::size_t ackLimit = 4096;
 constexpr const char *secondsWhenBusy = "60";
 constexpr const char *signOfLife = ":\n\n";
 
-std::optional<std::int64_t> pushIdOf(std::string_view text)
-{
-    const auto number = parseNumber(text);
-    if (!number || *number > std::numeric_limits<std::int64_t>::max())
-        return std::nullopt;
-    return static_cast<std::int64_t>(*number);
-}
-
 std::int64_t lastEventIdOf(const Request &request)
 {
     const std::string *value = request.header("Last-Event-ID");
     if (value == nullptr || value->empty())
         return 0;
-    const auto id = pushIdOf(*value);
+    const auto id = parsePushId(*value);
     if (!id)
         throw Refusal(Error::badRequest, "Last-Event-ID has to be the id of a push.");
     return *id;
-}
-
-std::string eventsOf(const std::vector<Push> &pushes)
-{
-    std::string events;
-    for (const Push &push : pushes) {
-        const nlohmann::json data{{"content_token", push.contentToken}};
-        events +=
-            "id: " + std::to_string(push.id) + "\nevent: share\ndata: " + data.dump() + "\n\n";
-    }
-    return events;
 }
 
 /// Wakes the stream when its reader leaves, and no more once the stream is over.
@@ -111,19 +89,6 @@ Response streamHead()
                                      {"X-Accel-Buffering", "no"}});
 }
 
-std::int64_t upToOf(const std::string &text)
-{
-    const nlohmann::json body = nlohmann::json::parse(text, nullptr, false);
-    const nlohmann::json upTo =
-        body.is_object() ? body.value("up_to", nlohmann::json()) : nlohmann::json();
-    const bool valid =
-        upTo.is_number_unsigned() &&
-        upTo.get<std::uint64_t>() <= std::uint64_t{std::numeric_limits<std::int64_t>::max()};
-    if (!valid)
-        throw Refusal(Error::badRequest, "The member \"up_to\" is missing or malformed.");
-    return upTo.get<std::int64_t>();
-}
-
 } // namespace
 
 Task<void> streamPushes(Exchange &exchange, Context &context)
@@ -148,7 +113,7 @@ Task<void> acknowledgePushes(Exchange &exchange, Context &context)
 {
     const Account account = co_await authenticate(exchange, context);
     const std::string body = co_await readWholeBody(exchange, ackLimit);
-    const std::int64_t upTo = upToOf(body);
+    const std::int64_t upTo = parseAcknowledged(body);
     const bool known = co_await context.pool.run(
         [&] { return context.metadata.acknowledgePushes(account.id, upTo); });
     if (!known)

@@ -71,6 +71,14 @@ std::string cutKeepingExtension(const std::string &name, std::size_t limit)
     return name.substr(0, length) + std::string(extension);
 }
 
+std::string trimmed(const std::string &text)
+{
+    const auto first = text.find_first_not_of(' ');
+    if (first == std::string::npos)
+        return {};
+    return text.substr(first, text.find_last_not_of(' ') - first + 1);
+}
+
 std::string lowerCase(std::string text)
 {
     std::transform(text.begin(), text.end(), text.begin(), [](char c) {
@@ -101,11 +109,10 @@ std::string cleanFileName(std::string_view name)
     // Names come from phones and from PCs, so either slash ends a folder.
     if (const auto slash = clean.find_last_of("/\\"); slash != std::string::npos)
         clean.erase(0, slash + 1);
-    const auto first = clean.find_first_not_of(' ');
-    if (first == std::string::npos || clean == "." || clean == "..")
-        return "file";
-    clean = clean.substr(first, clean.find_last_not_of(' ') - first + 1);
-    return cutKeepingExtension(clean, nameLimit);
+    // The cut may end at a blank.
+    clean = trimmed(cutKeepingExtension(trimmed(clean), nameLimit));
+    // Looked at last: what is left may be a way up only now.
+    return clean.empty() || clean == "." || clean == ".." ? "file" : clean;
 }
 
 std::string cleanType(std::string_view type)

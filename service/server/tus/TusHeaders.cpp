@@ -58,7 +58,7 @@ std::map<std::string, std::string> parseUploadMetadata(std::string_view value)
         const auto comma = value.find(',');
         const std::string_view pair = trimmed(value.substr(0, comma));
         value = comma == std::string_view::npos ? std::string_view() : value.substr(comma + 1);
-        const auto space = pair.find(' ');
+        const auto space = pair.find_first_of(" \t");
         const auto decoded =
             base64Decode(space == std::string_view::npos ? "" : trimmed(pair.substr(space + 1)));
         const std::string key(pair.substr(0, space));

@@ -21,7 +21,8 @@ TEST(FileNames, OnlyTheLastComponentStays)
 
 TEST(FileNames, NothingLeftIsCalledFile)
 {
-    for (const char *name : {"", ".", "..", "/", "a/", "a/..", "   ", "\n\t", "a\\"})
+    for (const char *name :
+         {"", ".", "..", "/", "a/", "a/..", "   ", "\n\t", "a\\", " ..", ".. ", "a/ . "})
         EXPECT_EQ(cleanFileName(name), "file") << name;
 }
 
@@ -52,6 +53,13 @@ TEST(FileNames, LongNamesKeepTheirExtensionAndWholeCharacters)
     EXPECT_GT(clean.size(), 250U);
     EXPECT_EQ(clean.substr(clean.size() - 5), ".jpeg");
     EXPECT_TRUE(isUtf8(clean));
+}
+
+TEST(FileNames, ABlankWhereANameIsCutGoesToo)
+{
+    const std::string clean = cleanFileName(std::string(254, 'x') + " yy");
+    EXPECT_EQ(clean, std::string(254, 'x'));
+    EXPECT_EQ(cleanFileName(clean), clean);
 }
 
 TEST(FileNames, MalformedTypesBecomeUnknownBytes)

@@ -16,6 +16,7 @@ TEST(TusHeaders, MetadataIsDecoded)
     EXPECT_EQ(metadata.at("is_private"), "");
     EXPECT_EQ(metadata.at("share"), "abc");
     EXPECT_TRUE(parseUploadMetadata("").empty());
+    EXPECT_EQ(parseUploadMetadata("share\t YWJj,a\t").at("share"), "abc");
 }
 
 TEST(TusHeaders, MalformedMetadataIsRefused)
