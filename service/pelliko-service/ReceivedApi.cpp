@@ -1,6 +1,6 @@
 #include "ReceivedApi.h"
 
-#include <nlohmann/json.hpp>
+#include "JsonNumber.h"
 
 #include <algorithm>
 
@@ -38,11 +38,8 @@ ReceivedFile readFile(const Json &json)
 {
     ReceivedFile file;
     file.name = json.at("name").get<std::string>();
-    file.size = json.at("size").get<int64_t>();
+    file.size = wholeNumber(json, "size");
     file.type = json.value("type", "");
-    if (file.size < 0) {
-        throw std::invalid_argument("size");
-    }
     return file;
 }
 } // namespace
@@ -118,8 +115,8 @@ std::optional<ReceivedDetails> readShare(const HttpAnswer &answer)
         const Json json = Json::parse(answer.body);
         ReceivedDetails details;
         details.sender = json.at("sender").get<std::string>();
-        details.created = json.at("created").get<int64_t>();
-        details.expires = json.at("expires").get<int64_t>();
+        details.created = wholeNumber(json, "created");
+        details.expires = wholeNumber(json, "expires");
         details.state = stateNamed(json.at("state").get<std::string>());
         for (const Json &file : json.at("files")) {
             details.files.push_back(readFile(file));

@@ -1,7 +1,10 @@
 #include "ShareApi.h"
 
+#include "JsonNumber.h"
+
 #include <glib.h>
-#include <nlohmann/json.hpp>
+
+#include <algorithm>
 
 namespace pelliko::service::ShareApi
 {
@@ -49,13 +52,21 @@ std::string sharePath(const std::string &share)
     return std::string("/api/v1/shares/") + escaped;
 }
 
+/** Whether a text can be a part of an address, or of a message, as it is. */
+bool isOneWord(const std::string &text)
+{
+    return !text.empty() && std::all_of(text.begin(), text.end(), [](char letter) {
+        return letter > ' ' && letter < '\x7f';
+    });
+}
+
 ShareRecord::File readFile(const Json &json)
 {
     ShareRecord::File file;
     file.upload = json.at("upload").get<std::string>();
-    file.offset = json.at("offset").get<int64_t>();
+    file.offset = wholeNumber(json, "offset");
     // Only an address of the same server may ever see the token.
-    if (file.upload.empty() || file.upload.front() != '/' || file.offset < 0) {
+    if (!isOneWord(file.upload) || file.upload.front() != '/') {
         throw std::invalid_argument("upload");
     }
     return file;
@@ -136,8 +147,10 @@ std::optional<FinishedShare> readFinished(const HttpAnswer &answer)
 {
     try {
         const Json json = Json::parse(answer.body);
-        return FinishedShare{json.at("url").get<std::string>(), json.at("expires").get<int64_t>(),
-                             json.at("sms").get<std::vector<std::string>>()};
+        FinishedShare share{json.at("url").get<std::string>(), wholeNumber(json, "expires"),
+                            json.at("sms").get<std::vector<std::string>>()};
+        // It goes into the messages as it is.
+        return isOneWord(share.url) ? std::optional(share) : std::nullopt;
     } catch (const std::exception &) {
         return std::nullopt;
     }
