@@ -9,6 +9,7 @@
 #include "NumberText.h"
 #include "NumberTypes.h"
 #include "PictureStore.h"
+#include "VcardText.h"
 
 namespace pelliko::contacts
 {
@@ -22,7 +23,8 @@ bool isName(const char *name, const char *wanted)
     return name && g_ascii_strcasecmp(name, wanted) == 0;
 }
 
-// A display name stands on one line of a screen and a list.
+// A display name stands on one line of a screen and a list. Only now, when an encoding within the
+// card is taken off, it is seen whether a value is UTF-8.
 std::string onOneLine(std::string text)
 {
     std::replace_if(
@@ -31,7 +33,7 @@ std::string onOneLine(std::string text)
     const size_t first = text.find_first_not_of(' ');
     if (first == std::string::npos)
         return {};
-    return text.substr(first, text.find_last_not_of(' ') - first + 1);
+    return asUtf8(text.substr(first, text.find_last_not_of(' ') - first + 1));
 }
 
 // The values of an attribute in their order, decoded; some may be empty.
@@ -85,7 +87,7 @@ std::string numberText(EVCardAttribute *attribute)
     std::string value = onOneLine(wholeValueOf(attribute));
     if (g_ascii_strncasecmp(value.c_str(), "tel:", 4) != 0)
         return value;
-    return percentDecoded(value.substr(4, value.find(';') - 4));
+    return onOneLine(percentDecoded(value.substr(4, value.find(';') - 4)));
 }
 
 void takeTypeWord(const char *word, CardNumber &number, int &preference)

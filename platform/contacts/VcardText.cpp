@@ -11,17 +11,6 @@ namespace
 
 constexpr std::string_view byte_order_mark = "\xef\xbb\xbf";
 
-std::string asUtf8(std::string text)
-{
-    if (g_utf8_validate_len(text.data(), text.size(), nullptr))
-        return text;
-    const std::unique_ptr<char, decltype(&g_free)> converted(
-        g_convert_with_fallback(text.data(), static_cast<gssize>(text.size()), "UTF-8",
-                                "WINDOWS-1252", "?", nullptr, nullptr, nullptr),
-        g_free);
-    return converted ? converted.get() : std::string();
-}
-
 bool isWord(std::string_view line, std::string_view word)
 {
     while (!line.empty() && (line.back() == ' ' || line.back() == '\t'))
@@ -133,6 +122,21 @@ std::string_view nextLine(std::string_view &text)
 }
 
 } // namespace
+
+std::string asUtf8(std::string text)
+{
+    if (g_utf8_validate_len(text.data(), text.size(), nullptr))
+        return text;
+    using Converted = std::unique_ptr<char, decltype(&g_free)>;
+    const auto size = static_cast<gssize>(text.size());
+    gsize written = 0;
+    const Converted converted(g_convert_with_fallback(text.data(), size, "UTF-8", "WINDOWS-1252",
+                                                      "?", nullptr, &written, nullptr),
+                              g_free);
+    if (converted)
+        return {converted.get(), written};
+    return Converted(g_utf8_make_valid(text.data(), size), g_free).get();
+}
 
 std::vector<RawCard> splitCards(std::string_view text)
 {

@@ -97,8 +97,9 @@ TEST_F(VcardImport, OldCardsWithQuotedPrintableAndOtherLineEndsAreRead)
 
 TEST_F(VcardImport, TextThatIsNotUtf8IsTakenAsOldWindowsText)
 {
-    imported(card("FN:J\xf6rg \x80\r\nTEL:1"));
-    EXPECT_EQ(names(), Rows{"Jörg €"});
+    imported(card("FN:J\xf6rg \x80\r\nTEL:1") +
+             card("FN;ENCODING=QUOTED-PRINTABLE:J=FCrgen\r\nTEL:2") + card("FN:\x81\x82\r\nTEL:3"));
+    EXPECT_EQ(names(), (Rows{"Jörg €", "Jürgen", "\uFFFD\uFFFD"}));
 }
 
 TEST_F(VcardImport, ByteOrderMarkAndTextBetweenCardsAreLeftOut)
@@ -114,6 +115,12 @@ TEST_F(VcardImport, NewCardsWithTelephoneUrisAreRead)
     imported("BEGIN:VCARD\r\nVERSION:4.0\r\nFN:Ann\r\n"
              "TEL;VALUE=uri;TYPE=\"voice,cell\":tel:+1-202-555-0123;ext=5\r\nEND:VCARD\r\n");
     EXPECT_EQ(numbers(), Rows{"+1-202-555-0123"});
+}
+
+TEST_F(VcardImport, ALineEndWithinTheAddressOfANumberIsABlank)
+{
+    imported(card("FN:Ann\r\nTEL;VALUE=uri:tel:+1%0A202"));
+    EXPECT_EQ(numbers(), Rows{"+1 202"});
 }
 
 TEST_F(VcardImport, PicturesInsideTheCardAreStored)
