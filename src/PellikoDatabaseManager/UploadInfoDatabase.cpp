@@ -2,6 +2,7 @@
 
 #include "AppLog/AppLog.h"
 #include "PellikoApp/Decimal.h"
+#include "PellikoDatabaseManager/FileListText.h"
 
 #include <cstdio>
 #include <cstring>
@@ -18,8 +19,6 @@ namespace
 
 constexpr const char *databasePath = "/opt/usr/apps/com.velmora.pelliko/data/.pelliko.db";
 constexpr const char *tableName = "UPLOAD_INFO";
-constexpr size_t fileListSize = 40800; // characters, with the terminator
-constexpr int entriesPerFile = 64;     // paths read back for each file of a row
 
 struct SqliteFree {
     void operator()(char *text) const { sqlite3_free(text); }
@@ -67,16 +66,6 @@ void _logExecutionError(const char *text, int code)
     LOG_ERROR("SQL query execution error: %s and return value = %d", text, code);
 }
 
-std::string _fileListText(const UploadNotiData &node)
-{
-    std::string text;
-    for (int i = 0; node.file_list && i < node.total_files && node.file_list[i]; ++i)
-        text.append(node.file_list[i]).append("?");
-    if (text.size() > fileListSize - 1)
-        text.resize(fileListSize - 1);
-    return text;
-}
-
 bool _hasQuote(const char *text)
 {
     return text && strchr(text, '"');
@@ -93,21 +82,6 @@ void _refuseStatement(sqlite3 *handle, const char *statement)
     else
         _logExecutionError(sqlite3_errmsg(handle), code);
     sqlite3_finalize(compiled);
-}
-
-// The paths of a stored list as a null-terminated array for g_strfreev.
-char **_splitFileList(const char *text, int32_t total_files)
-{
-    const int64_t room = static_cast<int64_t>(total_files) * entriesPerFile;
-    GPtrArray *paths = g_ptr_array_new();
-    char *copy = g_strdup(text);
-    char *rest = nullptr;
-    for (char *path = strtok_r(copy, "?", &rest); path && paths->len < room;
-         path = strtok_r(nullptr, "?", &rest))
-        g_ptr_array_add(paths, g_strdup(path));
-    g_free(copy);
-    g_ptr_array_add(paths, nullptr);
-    return reinterpret_cast<char **>(g_ptr_array_free(paths, FALSE));
 }
 
 char *_fixedCopy(const char *text, size_t size)
@@ -132,7 +106,7 @@ void _readColumn(UploadNotiData &node, int column, const char *value)
         break;
     case 3:
         if (value)
-            node.file_list = _splitFileList(value, node.total_files);
+            node.file_list = splitFileList(value, node.total_files);
         else
             LOG_DEBUG("empty file list received from database..!!!");
         break;
@@ -180,7 +154,7 @@ void writeUploadDataToDb(const UploadNotiData *node)
 {
     RETURN_IF_NULL(node, "node is NULL");
     sqlite3 *handle = _getDatabaseHandle();
-    const std::string files = _fileListText(*node);
+    const std::string files = fileListText(node->file_list, node->total_files);
     const SqliteText statement(
         sqlite3_mprintf("INSERT into %s VALUES (%d, %d, %ld, \"%s\", \"%s\", \"%s\");", tableName,
                         node->request_id, node->total_files, static_cast<long>(node->total_size),

@@ -4,15 +4,14 @@
 #include "PellikoApp/AppData.h"
 #include "PellikoApp/CText.h"
 #include "PellikoApp/Decimal.h"
-#include "PellikoApp/TextFormat.h"
 #include "PellikoUploadDataManager/UploadNotiData.h"
 #include "PellikoUploadManager/ExitPolicy.h"
 #include "PellikoUploadManager/PeriodClock.h"
+#include "PellikoUploadManager/PopupData.h"
 #include "PellikoUploadingDataManager/PressedNotification.h"
 #include "PellikoUploadingDataManager/StatusPopup.h"
 
 #include <app_preference.h>
-#include <cstdio>
 #include <cstdlib>
 #include <cstring>
 #include <optional>
@@ -23,16 +22,8 @@ namespace pelliko
 namespace
 {
 
-constexpr size_t popupDataSize = 20; ///< bytes of the hand-over text with its terminator
-
 std::optional<int> reportedRequest;   ///< whose report is being handled
 std::optional<int> handedOverRequest; ///< whose report the text in the store is
-
-struct PopupData {
-    int status = 0;
-    double progress_percent = 0.0;
-    int error_code = 0;
-};
 
 void _logPopupData(const PopupData &data)
 {
@@ -76,23 +67,6 @@ bool _isAboutPressed()
 {
     return !handedOverRequest ||
            *handedOverRequest == static_cast<int32_t>(g_noti_press_data.upload_request_id);
-}
-
-// Missing pieces read as zero.
-PopupData _parsePopupData(char *text)
-{
-    const PlainNumbers plain;
-    PopupData data;
-    if (!text)
-        return data;
-    char *rest = nullptr;
-    if (const char *token = strtok_r(text, "+", &rest))
-        data.status = decimalValue(token);
-    if (const char *token = strtok_r(nullptr, "+", &rest))
-        data.progress_percent = strtod(token, nullptr);
-    if (const char *token = strtok_r(nullptr, "+", &rest))
-        data.error_code = decimalValue(token);
-    return data;
 }
 
 // The SMS event of the share that the record names; true when that share is now complete.
@@ -159,14 +133,10 @@ void _updatePopupPreference(int status, double progress_percent, int error_code)
     LOG_DEBUG("previous update_popup_data = %s", textOrNull(previous.get()));
     preference_set_changed_cb(updatePopupDataKey, _popupDataPreferenceUpdatedCb, nullptr);
 
-    char text[popupDataSize];
-    {
-        const PlainNumbers plain;
-        snprintf(text, sizeof(text), "%d+%f+%d", status, progress_percent, error_code);
-    }
-    LOG_DEBUG("new update_popup_data = %s", text);
+    const auto text = popupDataText({status, progress_percent, error_code});
+    LOG_DEBUG("new update_popup_data = %s", text.data());
     handedOverRequest = reportedRequest;
-    if (preference_set_string(updatePopupDataKey, text) == PREFERENCE_ERROR_NONE)
+    if (preference_set_string(updatePopupDataKey, text.data()) == PREFERENCE_ERROR_NONE)
         LOG_DEBUG("PREFERENCE KEY SHARE_UPDATE_POPUP_DATA updated.");
     else
         LOG_ERROR("Error in getting PREFERENCE KEY SHARE_UPDATE_POPUP_DATA");
@@ -180,7 +150,7 @@ void _popupDataPreferenceUpdatedCb(const char * /*key*/, void * /*user_data*/)
                   "updated.");
     const CText text(value);
     LOG_DEBUG("update_popup_data = %s", textOrNull(text.get()));
-    const PopupData data = _parsePopupData(text.get());
+    const PopupData data = parsePopupData(text.get());
     _logPopupData(data);
     if (_isAboutPressed())
         updatePopupStatus(data.status, data.progress_percent, data.error_code);
