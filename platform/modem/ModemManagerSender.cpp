@@ -60,7 +60,7 @@ std::string sendThrough(MMObject *modem, const std::string &to, const std::strin
     // The bus's own limit is shorter than a slow network takes; the cancellable holds the real one.
     g_dbus_proxy_set_default_timeout(G_DBUS_PROXY(sms), G_MAXINT);
     const bool sent = mm_sms_send_sync(sms, cancellable, &error);
-    const std::string result = sent ? std::string() : sentence("send the message", error);
+    std::string result = sent ? std::string() : sentence("send the message", error);
     if (!g_cancellable_is_cancelled(cancellable))
         forget(messaging, sms, cancellable);
     return result;

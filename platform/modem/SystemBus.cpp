@@ -16,7 +16,7 @@ constexpr int kStartTimeoutMs = 25000;
 std::string takeMessage(GError *error)
 {
     g_dbus_error_strip_remote_error(error);
-    const std::string message = error->message;
+    std::string message = error->message;
     g_error_free(error);
     return message;
 }

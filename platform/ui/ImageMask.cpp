@@ -1,6 +1,7 @@
 #include "efl_assist.h"
 
 #include <algorithm>
+#include <cmath>
 #include <cstdint>
 #include <memory>
 #include <vector>
@@ -56,8 +57,8 @@ Pixels cropToProportions(const Pixels &picture, const Pixels &mask)
 {
     Pixels part;
     const double wanted = static_cast<double>(mask.width) / mask.height;
-    part.width = std::min(picture.width, static_cast<int>(picture.height * wanted + 0.5));
-    part.height = std::min(picture.height, static_cast<int>(picture.width / wanted + 0.5));
+    part.width = std::min(picture.width, static_cast<int>(std::lround(picture.height * wanted)));
+    part.height = std::min(picture.height, static_cast<int>(std::lround(picture.width / wanted)));
     part.width = std::max(part.width, 1);
     part.height = std::max(part.height, 1);
     const int left = (picture.width - part.width) / 2, top = (picture.height - part.height) / 2;
@@ -101,7 +102,7 @@ void applyMask(Pixels &picture, const Pixels &mask)
     for (int y = 0; y < picture.height; ++y) {
         for (int x = 0; x < picture.width; ++x, ++pixel) {
             const double alpha = alphaAt(mask, (x + 0.5) * across - 0.5, (y + 0.5) * down - 0.5);
-            *pixel = faded(*pixel, static_cast<uint32_t>(alpha + 0.5));
+            *pixel = faded(*pixel, static_cast<uint32_t>(std::lround(alpha)));
         }
     }
 }

@@ -151,6 +151,7 @@ void AppLauncher::launchPush(const std::vector<std::string> &tokens,
 void AppLauncher::launchResume(const std::vector<int32_t> &ids, std::function<void(bool)> done)
 {
     std::vector<std::string> texts;
+    texts.reserve(ids.size());
     for (const int32_t id : ids) {
         texts.push_back(std::to_string(id));
     }

@@ -77,7 +77,10 @@ Step _appendRecipient(UploadItem &item, int32_t number_id, RecipientRecords &rec
     }
     _fillRecipient(*recipient, number_id, records);
     _markSmsReceiver(*recipient);
-    item.recipient_list = eina_list_append(item.recipient_list, recipient.release());
+    item.recipient_list = eina_list_append(item.recipient_list, recipient.get());
+    // Without memory for its entry the list stays as it was.
+    if (eina_list_last_data_get(item.recipient_list) == recipient.get())
+        recipient.release();
     if (item.recipient_list)
         LOG_DEBUG("recipient_list is valid");
     else

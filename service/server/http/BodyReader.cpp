@@ -34,7 +34,7 @@ using ChunkParser = http::request_parser<http::buffer_body>;
 /// Removes "http://host" of the form that proxies send, and the query.
 std::string pathOf(std::string_view target)
 {
-    if (const auto scheme = target.find("://"); scheme != std::string_view::npos && scheme < 6) {
+    if (const auto scheme = target.find("://"); scheme < 6) {
         const auto path = target.find('/', scheme + 3);
         target = path == std::string_view::npos ? "/" : target.substr(path);
     }

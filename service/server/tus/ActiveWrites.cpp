@@ -3,6 +3,7 @@
 #include <boost/asio/as_tuple.hpp>
 #include <boost/asio/this_coro.hpp>
 #include <boost/asio/use_awaitable.hpp>
+#include <boost/system/system_error.hpp>
 
 #include <utility>
 #include <vector>
@@ -31,7 +32,12 @@ ActiveWrites::Lease::~Lease()
     if (!m_entry)
         return;
     m_entry->owner.m_entries.erase(m_entry->write->key);
-    m_entry->released.cancel();
+    try {
+        m_entry->released.cancel();
+    } catch (const boost::system::system_error &) {
+        // Whoever waits finds the entry gone the next time that it looks; a destructor has nobody
+        // to tell.
+    }
 }
 
 const std::shared_ptr<ActiveWrite> &ActiveWrites::Lease::write() const
