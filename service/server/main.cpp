@@ -62,6 +62,7 @@ int serve(const ServeOptions &options)
     server::makeDataDirectory(config.data);
     const server::DataLock lock(config.data);
     server::SqliteMetadata metadata(server::metadataFile(config.data));
+    metadata.verify();
     server::DirectoryBlobs blobs(server::blobsDirectory(config.data));
     server::Server running(config, metadata, blobs, [] { return std::time(nullptr); });
     announce(running, config.readyFd);

@@ -169,6 +169,16 @@ SqliteMetadata::SqliteMetadata(const std::filesystem::path &file)
 
 SqliteMetadata::~SqliteMetadata() = default;
 
+void SqliteMetadata::verify()
+{
+    const std::string found = m_connection->read([&] {
+        Query query = m_connection->query("PRAGMA quick_check(1)");
+        return query.next() ? query.text(0) : std::string("nothing can be read");
+    });
+    if (found != "ok")
+        throw StorageFailure(StorageFailure::Kind::broken, "metadata: the file is damaged");
+}
+
 void SqliteMetadata::ping()
 {
     m_connection->read([&] {

@@ -62,6 +62,10 @@ public:
     void forgetBlob(const std::string &blob) override;
     void ping() override;
 
+    /// Reads the whole file and throws StorageFailure when it is damaged: who went on with it would
+    /// damage more, and answer some accounts and not others.
+    void verify();
+
 private:
     struct Connection;
     std::unique_ptr<Connection> m_connection;

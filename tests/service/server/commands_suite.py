@@ -35,6 +35,26 @@ class Commands(ServerCase):
             self.assertNotEqual(done.returncode, 0)
             self.assertTrue(done.stderr)
 
+    def test_a_damaged_database_stops_the_start_and_stays_as_it_is(self):
+        self.make_finished(bytes(100))
+        self.stop()
+        path = self.data + "/metadata.db"
+        with open(path, "rb") as file:
+            sound = file.read()
+        for place in [0, 4096]:
+            damaged = sound[:place] + b"x" * 2000 + sound[place + 2000:]
+            with open(path, "wb") as file:
+                file.write(damaged)
+            done = run("serve", "--data", self.data, "--listen", "127.0.0.1:0")
+            self.assertEqual(done.returncode, 1)
+            self.assertRegex(done.stderr, "^pelliko-server: [^\n]*metadata[^\n]*\n$")
+            with open(path, "rb") as file:
+                self.assertEqual(file.read(), damaged)
+        with open(path, "wb") as file:
+            file.write(sound)
+        self.start()
+        self.assertEqual(self.request("GET", "/api/v1/shares").json()["shares"][0]["state"], "finished")
+
     def test_a_number_is_kept_in_one_form_however_it_is_written(self):
         self.run_account("add", "--number", " +44 (0)7700 900-123 ", "--name", "Berta")
         numbers = [line.split("\t")[0] for line in self.run_account("list").splitlines()]

@@ -2,8 +2,9 @@
 
 import io
 import os
+import re
 import zipfile
-from urllib.parse import quote
+from urllib.parse import quote, unquote
 
 from harness import ServerCase
 
@@ -31,6 +32,22 @@ class Downloads(ServerCase):
                          quote("ü \"1\".jpg"))
         self.assertEqual(answer.headers["Accept-Ranges"], "bytes")
         self.assertEqual(self.get(link + "/1").body, b"")
+
+    def test_no_name_leaves_its_place_in_the_header_or_its_folder(self):
+        names = {"../../etc/passwd": "passwd", "..\\..\\boot.ini": "boot.ini", "..": "file", "a/": "file",
+                 "x.jpg\r\nSet-Cookie: a=b": "x.jpgSet-Cookie: a=b", "a\nb\0c.txt": "abc.txt",
+                 "\"; filename=\"evil.exe": "\"; filename=\"evil.exe", "it's 100% *sure*;.txt": None,
+                 "ไฟล์ – 写真 🎉.png": None, "\u202egpj.exe": "gpj.exe", "ü" * 200 + ".jpg": "ü" * 125 + ".jpg"}
+        _, link = self.make_finished(*[b"1"] * len(names), names=list(names))
+        for index, (name, shown) in enumerate(names.items()):
+            headers = self.get(f"{link}/{index}").headers
+            found = re.fullmatch(r"attachment; filename=\"([ -!#-\[\]-~]*)\"; filename\*=UTF-8''([!-~]+)",
+                                 headers["Content-Disposition"])
+            self.assertTrue(found, headers["Content-Disposition"])
+            self.assertEqual(unquote(found[2], errors="strict"), shown or name)
+            # Outside of the letters that the form allows plainly everything is written in percents.
+            self.assertRegex(found[2], r"^([A-Za-z0-9!#$&+.^_`|~-]|%[0-9A-F]{2})+$")
+            self.assertNotIn("Set-Cookie", headers)
 
     def test_head_has_the_length_and_no_body(self):
         _, link = self.make_finished(b"12345")

@@ -38,6 +38,20 @@ class FullStore(ServerCase):
         (folder,) = os.listdir(self.seen + "/blobs")
         return Watch(f"{self.seen}/blobs/{folder}", DELETED)
 
+    def without_room(self, share):
+        """Not a page is left: what is known is told, what would be new is refused."""
+        filler = self.seen + "/filler"
+        with open(filler, "wb", buffering=0) as file, self.assertRaises(OSError):
+            while True:
+                file.write(bytes(4096))
+        body = {"files": [{"name": "a", "size": 1}], "recipients": [{"number": "+491511111"}] * 100}
+        for _ in range(3):
+            self.assert_refused(self.post_share(body), 507, "no_space")
+        record = self.request("GET", "/api/v1/shares/" + share["share"])
+        self.assertEqual((record.status, record.json()["state"]), (200, "uploading"))
+        os.remove(filler)
+        self.assertEqual(self.post_share(body).status, 201)
+
     def test_an_upload_is_refused_keeps_its_offset_and_goes_on_when_there_is_room(self):
         other, _ = self.make_finished(bytes(4 * MIB))
         deletion = self.watch_only_blob()
@@ -54,5 +68,6 @@ class FullStore(ServerCase):
         self.assertEqual(self.request("DELETE", "/api/v1/shares/" + other["share"]).status, 204)
         deletion.wait()
         self.assertEqual(self.patch(upload, MIB, content[MIB:]).status, 204)
+        self.without_room(share)
         link = self.finish(share)["url"][len(self.url):]
         self.assertEqual(self.get(link + "/0").body, content)
