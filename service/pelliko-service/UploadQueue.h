@@ -122,7 +122,6 @@ public:
     SQLite::Database &database() { return *db_; }
 
 private:
-    void migrate();
     void readFiles(QueuedRequest &request);
     void readRecipients(QueuedRequest &request);
     std::vector<int32_t> ids(const char *sql);

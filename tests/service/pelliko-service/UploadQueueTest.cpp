@@ -113,6 +113,29 @@ TEST_F(Queue, aQueueOfANewerProgramIsLeftAlone)
     EXPECT_THROW(reopen(), std::exception);
 }
 
+TEST_F(Queue, aDamagedFileIsKeptAsideAndNoIdIsUsedAgain)
+{
+    const int32_t before = add();
+    queue.reset();
+    const std::string file = folder.file("queue.db");
+    const auto damage = [&](std::streamoff place) {
+        std::fstream bytes(file, std::ios::in | std::ios::out | std::ios::binary);
+        bytes.seekp(place);
+        bytes << std::string(2000, 'x');
+    };
+    for (const std::streamoff place : {4096, 0}) { // a page in the middle, then the head
+        damage(place);
+        const auto size = std::filesystem::file_size(file);
+        reopen();
+        EXPECT_THAT(queue->openIds(), IsEmpty());
+        EXPECT_GT(add(), before);
+        EXPECT_EQ(std::filesystem::file_size(file + ".broken"), size);
+        queue.reset();
+    }
+    reopen();
+    EXPECT_EQ(queue->openIds().size(), 1U) << "a sound one stays";
+}
+
 TEST_F(Queue, keysAreRandom)
 {
     EXPECT_NE(randomKey(), randomKey());
