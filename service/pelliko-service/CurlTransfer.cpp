@@ -11,7 +11,6 @@ namespace pelliko::service
 namespace
 {
 constexpr long connectSeconds = 20;
-constexpr long stallSeconds = 60; // without a byte in either direction
 constexpr long bufferBytes = 512L * 1024;
 constexpr long smallestBufferBytes = 16L * 1024; // libcurl's own lower bound
 constexpr int64_t limitedBuffersPerSecond = 20;  // a limited transfer moves in small steps
@@ -54,9 +53,9 @@ std::string trimmed(const std::string &text)
 } // namespace
 
 CurlTransfer::CurlTransfer(uint64_t number, HttpRequest request, Progress progress,
-                           int64_t sendRate)
+                           TransferLimits limits)
     : number_(number), request_(std::move(request)), progress_(std::move(progress)),
-      sendRate_(sendRate), easy_(curl_easy_init())
+      limits_(limits), easy_(curl_easy_init())
 {
     setOptions();
     setBody();
@@ -83,7 +82,7 @@ void CurlTransfer::setOptions()
     curl_easy_setopt(easy_, CURLOPT_CONNECTTIMEOUT, connectSeconds);
     if (!request_.endless) {
         curl_easy_setopt(easy_, CURLOPT_LOW_SPEED_LIMIT, 1L);
-        curl_easy_setopt(easy_, CURLOPT_LOW_SPEED_TIME, stallSeconds);
+        curl_easy_setopt(easy_, CURLOPT_LOW_SPEED_TIME, static_cast<long>(limits_.stallSeconds));
     }
     curl_easy_setopt(easy_, CURLOPT_WRITEFUNCTION, onWrite);
     curl_easy_setopt(easy_, CURLOPT_WRITEDATA, this);
@@ -107,8 +106,9 @@ void CurlTransfer::setBody()
         curl_easy_setopt(easy_, CURLOPT_UPLOAD, 1L);
         curl_easy_setopt(easy_, CURLOPT_INFILESIZE_LARGE,
                          static_cast<curl_off_t>(request_.range.length));
-        curl_easy_setopt(easy_, CURLOPT_UPLOAD_BUFFERSIZE, bufferSize(sendRate_));
-        curl_easy_setopt(easy_, CURLOPT_MAX_SEND_SPEED_LARGE, static_cast<curl_off_t>(sendRate_));
+        curl_easy_setopt(easy_, CURLOPT_UPLOAD_BUFFERSIZE, bufferSize(limits_.sendRate));
+        curl_easy_setopt(easy_, CURLOPT_MAX_SEND_SPEED_LARGE,
+                         static_cast<curl_off_t>(limits_.sendRate));
         curl_easy_setopt(easy_, CURLOPT_READFUNCTION, onRead);
         curl_easy_setopt(easy_, CURLOPT_READDATA, this);
         curl_easy_setopt(easy_, CURLOPT_SEEKFUNCTION, onSeek);
@@ -139,14 +139,29 @@ bool CurlTransfer::goodAnswer() const
     return status >= 200 && status < 300;
 }
 
-bool CurlTransfer::takesPiece(std::string_view piece)
+bool CurlTransfer::hasMark() const
 {
-    BodySink &sink = *request_.sink;
+    const AnswerMark &mark = request_.mark;
+    return mark.lowerName.empty() || answer_.header(mark.lowerName).starts_with(mark.start);
+}
+
+bool CurlTransfer::beginSink()
+{
+    if (!hasMark()) {
+        localFailure_ = "unexpected_answer";
+        return false;
+    }
     long status = 0;
     curl_easy_getinfo(easy_, CURLINFO_RESPONSE_CODE, &status);
-    const bool taken = (std::exchange(sinkBegun_, true) || sink.begin(status)) && sink.take(piece);
-    if (!taken) {
-        localFailure_ = sink.fault();
+    sinkBegun_ = true;
+    return request_.sink->begin(status);
+}
+
+bool CurlTransfer::takesPiece(std::string_view piece)
+{
+    const bool taken = (sinkBegun_ || beginSink()) && request_.sink->take(piece);
+    if (!taken && localFailure_.empty()) {
+        localFailure_ = request_.sink->fault();
     }
     return taken;
 }
@@ -159,9 +174,21 @@ void CurlTransfer::endSink()
     }
 }
 
+// It may come as a date.
+void CurlTransfer::noteRetryAfter()
+{
+    curl_off_t seconds = 0;
+    const auto found = answer_.headers.find("retry-after");
+    if (found != answer_.headers.end() &&
+        curl_easy_getinfo(easy_, CURLINFO_RETRY_AFTER, &seconds) == CURLE_OK) {
+        found->second = std::to_string(seconds);
+    }
+}
+
 HttpAnswer CurlTransfer::answer(CURLcode result)
 {
     curl_easy_getinfo(easy_, CURLINFO_RESPONSE_CODE, &answer_.status);
+    noteRetryAfter();
     if (request_.sink && result == CURLE_OK && goodAnswer()) {
         endSink();
     }

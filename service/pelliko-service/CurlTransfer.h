@@ -15,8 +15,7 @@ class CurlTransfer
 public:
     using Progress = std::function<void(int64_t bytes)>;
 
-    /** @param sendRate most bytes a second of the body, 0 for no limit */
-    CurlTransfer(uint64_t number, HttpRequest request, Progress progress, int64_t sendRate);
+    CurlTransfer(uint64_t number, HttpRequest request, Progress progress, TransferLimits limits);
     ~CurlTransfer();
     CurlTransfer(const CurlTransfer &) = delete;
     CurlTransfer &operator=(const CurlTransfer &) = delete;
@@ -32,8 +31,11 @@ private:
     void setBody();
     void setProgress();
     bool goodAnswer() const;
+    bool hasMark() const;
+    bool beginSink();
     bool takesPiece(std::string_view piece);
     void endSink();
+    void noteRetryAfter();
     static size_t onRead(char *buffer, size_t size, size_t count, void *self);
     static int onSeek(void *self, curl_off_t offset, int origin);
     static size_t onWrite(char *data, size_t size, size_t count, void *self);
@@ -43,7 +45,7 @@ private:
     uint64_t number_;
     HttpRequest request_;
     Progress progress_;
-    int64_t sendRate_;
+    TransferLimits limits_;
     CURL *easy_;
     curl_slist *headers_ = nullptr;
     int64_t position_ = 0; // within the range

@@ -2,6 +2,7 @@
 
 #include "ReceivedApi.h"
 #include "SaveName.h"
+#include "ServerRest.h"
 #include "ShareApi.h"
 #include "pelliko_shares.h"
 
@@ -159,9 +160,9 @@ void Download::onFetched(const HttpAnswer &answer)
         onWhole();
     } else if (answer.failure.empty() && answer.status == rangeNotSatisfiable) {
         unlink(part_.c_str());
-        onBroken(failureNamed("unexpected_answer"));
+        onBroken(failureNamed("unexpected_answer"), 0);
     } else if (const Failure &failure = ShareApi::failureOf(answer); failure.retry) {
-        onBroken(failure);
+        onBroken(failure, askedRest(answer));
     } else {
         onRefused();
     }
@@ -181,17 +182,18 @@ void Download::onWhole()
     nextFile();
 }
 
-void Download::onBroken(const Failure &failure)
+void Download::onBroken(const Failure &failure, int64_t restMs)
 {
     if (sizeOfPart(part_) > from_) {
         backoff_.reset();
     }
-    if (backoff_.attempts() >= mostAttempts) {
+    // Nobody waits long before a screen; the wish is told again later.
+    if (backoff_.attempts() >= mostAttempts || restMs > longestWaitMs) {
         g_message("download: given up for now: %s", failure.name.data());
         end(PELLIKO_SHARES_ERROR_UNREACHABLE);
         return;
     }
-    timer_ = context_.timers.after(backoff_.next(), [this] {
+    timer_ = context_.timers.after(std::max(backoff_.next(), restMs), [this] {
         timer_ = 0;
         fetch();
     });

@@ -53,7 +53,7 @@ private:
     void fetch();
     void onFetched(const HttpAnswer &answer);
     void onWhole();
-    void onBroken(const Failure &failure);
+    void onBroken(const Failure &failure, int64_t restMs);
     void onRefused();
     void report(int64_t ofFile);
     void leaveFile(bool remove);

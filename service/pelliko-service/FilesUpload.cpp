@@ -55,7 +55,7 @@ void FilesUpload::startMore()
         }
     }
     if (running_.empty() && waiting_.empty()) {
-        finish(nullptr);
+        finish(nullptr, 0);
     }
 }
 
@@ -66,7 +66,9 @@ void FilesUpload::startFile(size_t index)
     running_[index] = std::move(upload);
     started.start(
         [this, index](int64_t present, bool stored) { onProgress(index, present, stored); },
-        [this, index](const Failure *failure) { onFileDone(index, failure); });
+        [this, index](const Failure *failure, int64_t restMs) {
+            onFileDone(index, failure, restMs);
+        });
 }
 
 void FilesUpload::onProgress(size_t index, int64_t present, bool stored)
@@ -75,24 +77,24 @@ void FilesUpload::onProgress(size_t index, int64_t present, bool stored)
     progress_(std::accumulate(present_.begin(), present_.end(), int64_t{0}), stored);
 }
 
-void FilesUpload::onFileDone(size_t index, const Failure *failure)
+void FilesUpload::onFileDone(size_t index, const Failure *failure, int64_t restMs)
 {
     running_.erase(index);
     if (failure) {
-        finish(failure);
+        finish(failure, restMs);
     } else {
         startMore();
     }
 }
 
-void FilesUpload::finish(const Failure *failure)
+void FilesUpload::finish(const Failure *failure, int64_t restMs)
 {
     running_.clear();
     waiting_.clear();
     // A second end cannot follow; the callback may destroy this.
     const Done done = std::exchange(done_, nullptr);
     if (done) {
-        done(failure);
+        done(failure, restMs);
     }
 }
 

@@ -16,9 +16,11 @@ public:
     /** @param present bytes of all files @param stored whether the server has just confirmed some
      */
     using Progress = std::function<void(int64_t present, bool stored)>;
-    /** @param failure null when all files are there, else the first failure; the others were
-     * stopped */
-    using Done = std::function<void(const Failure *failure)>;
+    /**
+     * @param failure null when all files are there, else the first failure; the others were stopped
+     * @param restMs  how long the server asked to be left alone
+     */
+    using Done = TusUpload::Done;
 
     FilesUpload(HttpSender &http, Account account, std::vector<TusFile> files, int64_t chunkBytes);
 
@@ -31,8 +33,8 @@ private:
     void startMore();
     void startFile(size_t index);
     void onProgress(size_t index, int64_t present, bool stored);
-    void onFileDone(size_t index, const Failure *failure);
-    void finish(const Failure *failure);
+    void onFileDone(size_t index, const Failure *failure, int64_t restMs);
+    void finish(const Failure *failure, int64_t restMs);
 
     HttpSender &http_;
     Account account_;

@@ -36,6 +36,12 @@ public:
     virtual std::string fault() const = 0;
 };
 
+/** A header that every good answer of the server has, and nobody else's page. */
+struct AnswerMark {
+    std::string lowerName; ///< empty: none is asked for
+    std::string start;     ///< how its value begins
+};
+
 struct HttpRequest {
     std::string method;
     std::string url;
@@ -43,6 +49,7 @@ struct HttpRequest {
     std::string body;                 ///< used when there is no range
     FileRange range;
     std::shared_ptr<BodySink> sink{}; ///< takes the body of an answer below 300, when there is one
+    AnswerMark mark{};    ///< without it an answer for the sink is an "unexpected_answer"
     bool endless = false; ///< an answer that may be silent for long: the sender watches it itself
 };
 
@@ -50,7 +57,7 @@ struct HttpAnswer {
     std::string failure; ///< a name of the error table when there was no answer, else empty
     long status = 0;
     std::string body;                           ///< its first MiB
-    std::map<std::string, std::string> headers; ///< names in lower case
+    std::map<std::string, std::string> headers; ///< names in lower case; Retry-After in seconds
 
     /** The value of a header, empty when absent. */
     std::string header(const std::string &lowerName) const
@@ -58,6 +65,12 @@ struct HttpAnswer {
         const auto found = headers.find(lowerName);
         return found != headers.end() ? found->second : std::string();
     }
+};
+
+/** What every transfer keeps to. */
+struct TransferLimits {
+    int64_t sendRate = 0;      ///< most bytes a second of a body, 0 for no limit
+    int64_t stallSeconds = 60; ///< so long without a byte in either direction ends it
 };
 
 /** Sends requests. Belongs to the main loop; its callbacks come from there. */

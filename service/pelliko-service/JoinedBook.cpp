@@ -81,8 +81,9 @@ void JoinedBook::onNumbers(bool read, const std::vector<ContactNumber> &numbers)
     numbers_ = numbers;
     try {
         const auto wanted = due();
-        if (!wanted.empty() && !context_.gate.open(account_.server, false)) {
-            wait_ = hourMs;
+        const int64_t rest = rest_.left(account_.server, context_.timers.steadyMs());
+        if (!wanted.empty() && (rest > 0 || !context_.gate.open(account_.server, false))) {
+            wait_ = rest > 0 ? rest : hourMs;
             mark();
             return;
         }
@@ -126,6 +127,7 @@ void JoinedBook::onFindings(size_t asked, const JoinedFindings &findings)
     question_.reset();
     if (found.asked.size() < asked) {
         wait_ = std::max(backoff_.next(), found.waitSeconds * 1000);
+        rest_.begin(found.waitSeconds * 1000, context_.timers.steadyMs());
     } else {
         backoff_.reset();
     }

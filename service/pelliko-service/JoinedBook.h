@@ -6,6 +6,7 @@
 #include "JoinedNumbers.h"
 #include "JoinedQuestion.h"
 #include "RequestContext.h"
+#include "ServerRest.h"
 
 namespace pelliko::service
 {
@@ -42,6 +43,7 @@ private:
     JoinedNumbers store_;
     ContactMarks &contacts_;
     Backoff backoff_;
+    ServerRest rest_;
     Account account_;
     std::vector<ContactNumber> numbers_;
     std::set<std::string> toMark_;

@@ -43,12 +43,6 @@ bool sameAccount(const std::optional<Account> &one, const std::optional<Account>
            one->token == other->token;
 }
 
-int64_t waitAskedFor(const HttpAnswer &answer)
-{
-    constexpr int64_t longestSeconds = 3600;
-    const int64_t seconds = g_ascii_strtoll(answer.header("retry-after").c_str(), nullptr, 10);
-    return std::clamp<int64_t>(seconds, 0, longestSeconds) * 1000;
-}
 } // namespace
 
 PushChannel::PushChannel(RequestContext &context, ReceivedJournal &journal,
@@ -110,6 +104,10 @@ void PushChannel::connect()
     if (!account_ || !context_.gate.open(account_->server, false)) {
         return; // networkChanged() or accountChanged() comes
     }
+    if (const int64_t rest = rest_.left(account_->server, context_.timers.steadyMs())) {
+        reconnectAfter(rest);
+        return;
+    }
     int64_t from = 0;
     try {
         from = journal_.position(*account_).stored;
@@ -145,7 +143,12 @@ void PushChannel::watchSilence()
 void PushChannel::reconnectLater(int64_t atLeastMs)
 {
     close();
-    reconnectTimer_ = context_.timers.after(std::max(backoff_.next(), atLeastMs), [this] {
+    reconnectAfter(std::max(backoff_.next(), atLeastMs));
+}
+
+void PushChannel::reconnectAfter(int64_t milliseconds)
+{
+    reconnectTimer_ = context_.timers.after(milliseconds, [this] {
         reconnectTimer_ = 0;
         connect();
     });
@@ -204,7 +207,9 @@ void PushChannel::onEnd(const HttpAnswer &answer)
         g_message("push: the server refuses: %s", name.c_str());
     }
     const bool refused = answer.failure.empty() && answer.status >= 400 && answer.status < 500;
-    reconnectLater(refused ? context_.settings.longestRetryMs : waitAskedFor(answer));
+    const int64_t rest = askedRest(answer);
+    rest_.begin(rest, context_.timers.steadyMs());
+    reconnectLater(std::max(refused ? context_.settings.longestRetryMs : 0, rest));
 }
 
 // One at a time; what arrives meanwhile goes with the next.
@@ -249,7 +254,7 @@ void PushChannel::onAcknowledged(int64_t upTo, const HttpAnswer &answer)
     } catch (const std::exception &fault) {
         g_warning("push: the journal cannot be written: %s", fault.what());
     }
-    ackTimer_ = context_.timers.after(ackBackoff_.next(), [this] {
+    ackTimer_ = context_.timers.after(std::max(ackBackoff_.next(), askedRest(answer)), [this] {
         ackTimer_ = 0;
         acknowledge();
     });

@@ -5,6 +5,7 @@
 #include "ReceivedJournal.h"
 #include "RequestContext.h"
 #include "ServerEvents.h"
+#include "ServerRest.h"
 
 namespace pelliko::service
 {
@@ -30,6 +31,7 @@ private:
     void connect();
     void close();
     void reconnectLater(int64_t atLeastMs = 0);
+    void reconnectAfter(int64_t milliseconds);
     void onBytes(const std::string &bytes);
     void onEvent(const ServerEvent &event);
     void onEnd(const HttpAnswer &answer);
@@ -41,6 +43,7 @@ private:
     ReceivedJournal &journal_;
     std::function<void()> arrived_;
     Backoff backoff_;
+    ServerRest rest_;
     Backoff ackBackoff_;
     std::optional<Account> account_;
     std::unique_ptr<ServerEvents> events_;

@@ -60,6 +60,10 @@ bool PushDelivery::askForUnread()
     if (!account || !context_.gate.open(account->server, false)) {
         return false; // a change of either comes here again
     }
+    if (const int64_t rest = rest_.left(account->server, context_.timers.steadyMs())) {
+        nextAfter(rest);
+        return true;
+    }
     transfer_ = context_.http.send(ReceivedApi::getShare(*account, unread.front()), nullptr,
                                    [this, token = unread.front()](const HttpAnswer &answer) {
                                        transfer_ = 0;
@@ -71,17 +75,16 @@ bool PushDelivery::askForUnread()
 void PushDelivery::onShare(const std::string &token, const HttpAnswer &answer)
 {
     const auto details = ReceivedApi::readShare(answer);
-    const bool answered = answer.failure.empty();
+    const Failure &failure = ShareApi::failureOf(answer);
     try {
         if (details) {
             journal_.setDetails(token, *details);
-        } else if (answered && (answer.status == 404 || answer.status == 410)) {
+        } else if (failure.name == "not_found" || failure.name == "gone") {
             g_message("push: a share is gone before it was looked at");
             journal_.forget(token, false);
         } else {
-            g_message("push: a share cannot be looked at: %s",
-                      ShareApi::failureOf(answer).name.data());
-            again(backoff_);
+            g_message("push: a share cannot be looked at: %s", failure.name.data());
+            again(backoff_, askedRest(answer));
             return;
         }
     } catch (const std::exception &fault) {
@@ -145,9 +148,15 @@ void PushDelivery::onLaunched(const std::vector<ReceivedJournal::Untold> &tokens
     again(launchBackoff_);
 }
 
-void PushDelivery::again(Backoff &backoff)
+void PushDelivery::again(Backoff &backoff, int64_t restMs)
 {
-    timer_ = context_.timers.after(backoff.next(), [this] {
+    rest_.begin(restMs, context_.timers.steadyMs());
+    nextAfter(std::max(backoff.next(), restMs));
+}
+
+void PushDelivery::nextAfter(int64_t milliseconds)
+{
+    timer_ = context_.timers.after(milliseconds, [this] {
         timer_ = 0;
         next();
     });

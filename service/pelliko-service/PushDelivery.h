@@ -4,6 +4,7 @@
 #include "Backoff.h"
 #include "ReceivedJournal.h"
 #include "RequestContext.h"
+#include "ServerRest.h"
 
 namespace pelliko::service
 {
@@ -31,12 +32,14 @@ private:
     void onShare(const std::string &token, const HttpAnswer &answer);
     void launch();
     void onLaunched(const std::vector<ReceivedJournal::Untold> &tokens, LaunchResult result);
-    void again(Backoff &backoff);
+    void again(Backoff &backoff, int64_t restMs = 0);
+    void nextAfter(int64_t milliseconds);
 
     RequestContext &context_;
     ReceivedJournal &journal_;
     std::function<void()> changed_;
     Backoff backoff_;
+    ServerRest rest_;
     Backoff launchBackoff_;
     uint64_t transfer_ = 0;
     uint64_t timer_ = 0;

@@ -63,6 +63,7 @@ HttpRequest pushStream(const Account &account, int64_t lastId)
     if (lastId > 0) {
         result.headers.push_back("Last-Event-ID: " + std::to_string(lastId));
     }
+    result.mark = {"content-type", "text/event-stream"};
     result.endless = true;
     return result;
 }
@@ -89,6 +90,8 @@ HttpRequest getFile(const Account &account, const std::string &token, int index,
 {
     HttpRequest result =
         request(account, "GET", sharePath(token) + "/files/" + std::to_string(index));
+    // A login page may have any length, the file's too.
+    result.mark = {"content-disposition", "attachment"};
     if (from > 0) {
         result.headers.push_back("Range: bytes=" + std::to_string(from) + "-");
     }

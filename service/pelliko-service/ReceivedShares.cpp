@@ -6,6 +6,7 @@
 
 #include <glib.h>
 
+#include <algorithm>
 #include <utility>
 
 namespace pelliko::service
@@ -130,6 +131,10 @@ void ReceivedShares::forgetOnServer()
     if (!account || !context_.gate.open(account->server, false)) {
         return;
     }
+    if (const int64_t rest = rest_.left(account->server, context_.timers.steadyMs())) {
+        kickAfter(rest);
+        return;
+    }
     transfer_ = context_.http.send(ReceivedApi::forgetShare(*account, tokens.front()), nullptr,
                                    [this, token = tokens.front()](const HttpAnswer &answer) {
                                        transfer_ = 0;
@@ -150,7 +155,14 @@ void ReceivedShares::onForgotten(const std::string &token, const HttpAnswer &ans
     } catch (const std::exception &fault) {
         g_warning("received shares: the journal fails: %s", fault.what());
     }
-    timer_ = context_.timers.after(backoff_.next(), [this] {
+    const int64_t rest = askedRest(answer);
+    rest_.begin(rest, context_.timers.steadyMs());
+    kickAfter(std::max(backoff_.next(), rest));
+}
+
+void ReceivedShares::kickAfter(int64_t milliseconds)
+{
+    timer_ = context_.timers.after(milliseconds, [this] {
         timer_ = 0;
         kick();
     });

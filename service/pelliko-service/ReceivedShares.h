@@ -4,6 +4,7 @@
 #include "Backoff.h"
 #include "ReceivedJournal.h"
 #include "RequestContext.h"
+#include "ServerRest.h"
 
 #include <set>
 
@@ -43,11 +44,13 @@ private:
     int take(const std::string &token, const HttpAnswer &answer);
     void forgetOnServer();
     void onForgotten(const std::string &token, const HttpAnswer &answer);
+    void kickAfter(int64_t milliseconds);
 
     RequestContext &context_;
     ReceivedJournal &journal_;
     std::function<void()> changed_;
     Backoff backoff_;
+    ServerRest rest_;
     std::set<uint64_t> questions_;
     uint64_t transfer_ = 0;
     uint64_t timer_ = 0;

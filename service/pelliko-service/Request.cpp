@@ -85,6 +85,8 @@ void Request::proceed()
         g_message("request %d: waits for a network", record_.id);
         stuckSince_ = -1; // a missing network says nothing about the server
         pause();
+    } else if (const int64_t rest = rest_.left(account_.server, context_.timers.steadyMs())) {
+        retryAfter(rest);
     } else if (record_.share.empty()) {
         create();
     } else if (!record_.reshareOf.empty()) {
@@ -146,9 +148,8 @@ void Request::create()
 void Request::onCreated(const HttpAnswer &answer)
 {
     if (!answer.failure.empty() || (answer.status != 201 && answer.status != 200)) {
-        const Failure &failure = ShareApi::failureOf(answer);
-        maybeCreated_ = failure.retry; // a refusal has made nothing
-        fail(failure);
+        maybeCreated_ = ShareApi::failureOf(answer).retry; // a refusal has made nothing
+        fail(answer);
         return;
     }
     takeRecord(answer);
@@ -162,7 +163,7 @@ void Request::askOffsets()
 void Request::onOffsets(const HttpAnswer &answer)
 {
     if (!answer.failure.empty() || answer.status != 200) {
-        fail(ShareApi::failureOf(answer));
+        fail(answer);
     } else {
         takeRecord(answer);
     }
@@ -209,9 +210,9 @@ void Request::uploadFiles(const ShareRecord &share)
     files_ = std::make_unique<FilesUpload>(context_.http, account_, std::move(files),
                                            context_.settings.chunkBytes);
     files_->start([this](int64_t bytes, bool stored) { onProgress(bytes, stored); },
-                  [this](const Failure *failure) {
+                  [this](const Failure *failure, int64_t restMs) {
                       if (failure) {
-                          fail(*failure);
+                          fail(*failure, restMs);
                       } else {
                           askJoined();
                       }
@@ -251,7 +252,7 @@ void Request::onJoined(const JoinedFindings &findings)
         !store([&] { context_.queue.setFindings(record_.id, record_.recipients); })) {
         return;
     }
-    asked_ = findings.refused || askable(record_.recipients).empty();
+    asked_ = findings.refused || findings.waitSeconds > 0 || askable(record_.recipients).empty();
     finish();
 }
 
@@ -263,7 +264,7 @@ void Request::finish()
 void Request::onFinished(const HttpAnswer &answer)
 {
     if (!answer.failure.empty() || answer.status != 200) {
-        fail(ShareApi::failureOf(answer));
+        fail(answer);
         return;
     }
     const auto finished = ShareApi::readFinished(answer);

@@ -5,6 +5,7 @@
 #include "JoinedQuestion.h"
 #include "ProgressReporter.h"
 #include "RequestContext.h"
+#include "ServerRest.h"
 #include "SmsDelivery.h"
 
 namespace pelliko::service
@@ -59,8 +60,11 @@ private:
     void send(HttpRequest request, void (Request::*done)(const HttpAnswer &));
     void begins();
     void pause();
-    void fail(const Failure &failure);
+    /** @param restMs how long the server asked to be left alone */
+    void fail(const Failure &failure, int64_t restMs = 0);
+    void fail(const HttpAnswer &answer);
     void retryLater(const Failure &failure);
+    void retryAfter(int64_t milliseconds);
     void end(Status status, int error);
     bool storeEnd(Status status, int error);
     bool store(const std::function<void()> &change);
@@ -73,6 +77,7 @@ private:
     Report report_;
     Account account_;
     Backoff backoff_;
+    ServerRest rest_;
     ProgressReporter progress_;
     std::unique_ptr<FilesUpload> files_;
     std::unique_ptr<JoinedQuestion> question_;

@@ -3,6 +3,7 @@
 
 #include <glib.h>
 
+#include <algorithm>
 #include <utility>
 
 namespace pelliko::service
@@ -27,9 +28,15 @@ void Request::pause()
     }
 }
 
-void Request::fail(const Failure &failure)
+void Request::fail(const HttpAnswer &answer)
+{
+    fail(ShareApi::failureOf(answer), askedRest(answer));
+}
+
+void Request::fail(const Failure &failure, int64_t restMs)
 {
     stopTransfers();
+    rest_.begin(restMs, context_.timers.steadyMs());
     g_message("request %d: %s", record_.id, failure.name.data());
     if (failure.retry) {
         retryLater(failure);
@@ -48,11 +55,17 @@ void Request::retryLater(const Failure &failure)
         end(Status::failed, failure.code);
         return;
     }
-    const int64_t wait = backoff_.next();
-    if (backoff_.attempts() > 1) {
+    const int64_t own = backoff_.next();
+    const int64_t rest = rest_.left(account_.server, now);
+    if (backoff_.attempts() > 1 || rest > context_.settings.firstRetryMs) {
         pause();
     }
-    retryTimer_ = context_.timers.after(wait, [this] {
+    retryAfter(std::max(own, rest));
+}
+
+void Request::retryAfter(int64_t milliseconds)
+{
+    retryTimer_ = context_.timers.after(milliseconds, [this] {
         retryTimer_ = 0;
         proceed();
     });

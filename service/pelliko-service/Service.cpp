@@ -28,8 +28,8 @@ class Engine : public Orphans
 public:
     Engine(const Settings &settings, GDBusConnection *bus, ServiceObject &object,
            SharesObject &shares, std::unique_ptr<UploadQueue> queue)
-        : shares_(shares), queue_(std::move(queue)), journal_(*queue_), http_(settings.sendRate),
-          gate_([this] { networkChanged(); }),
+        : shares_(shares), queue_(std::move(queue)), journal_(*queue_),
+          http_({settings.sendRate, settings.stallSeconds}), gate_([this] { networkChanged(); }),
           launcher_(bus, [this] { resume_.applicationGone(); }),
           context_{*queue_,
                    http_,

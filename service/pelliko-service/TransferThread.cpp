@@ -20,8 +20,8 @@ constexpr long connectionsPerHost = 9;
 class TransferThread::Loop
 {
 public:
-    Loop(std::weak_ptr<TransferThread *> owner, int64_t sendRate)
-        : owner_(std::move(owner)), sendRate_(sendRate), multi_(curl_multi_init()),
+    Loop(std::weak_ptr<TransferThread *> owner, TransferLimits limits)
+        : owner_(std::move(owner)), limits_(limits), multi_(curl_multi_init()),
           thread_([this] { run(); })
     {
     }
@@ -96,7 +96,7 @@ private:
             [this, number](int64_t bytes) {
                 post([number, bytes](TransferThread &owner) { owner.onProgress(number, bytes); });
             },
-            sendRate_);
+            limits_);
         curl_multi_add_handle(multi_, transfer->handle());
         transfers_[number] = std::move(transfer);
     }
@@ -138,7 +138,7 @@ private:
     }
 
     std::weak_ptr<TransferThread *> owner_;
-    int64_t sendRate_;
+    TransferLimits limits_;
     std::mutex mutex_;
     std::vector<LoopTask> orders_;
     bool stop_ = false;
@@ -147,11 +147,12 @@ private:
     std::thread thread_;
 };
 
-TransferThread::TransferThread(int64_t sendRate) : self_(std::make_shared<TransferThread *>(this))
+TransferThread::TransferThread(TransferLimits limits)
+    : self_(std::make_shared<TransferThread *>(this))
 {
     static std::once_flag once;
     std::call_once(once, [] { curl_global_init(CURL_GLOBAL_DEFAULT); });
-    loop_ = std::make_unique<Loop>(self_, sendRate);
+    loop_ = std::make_unique<Loop>(self_, limits);
 }
 
 TransferThread::~TransferThread() = default;

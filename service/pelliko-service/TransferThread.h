@@ -12,8 +12,7 @@ namespace pelliko::service
 class TransferThread : public HttpSender
 {
 public:
-    /** @param sendRate most bytes a second of one transfer, 0 for no limit */
-    explicit TransferThread(int64_t sendRate);
+    explicit TransferThread(TransferLimits limits);
     ~TransferThread() override;
 
     uint64_t send(HttpRequest request, Progress progress, Done done) override;

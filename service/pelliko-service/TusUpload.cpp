@@ -1,5 +1,6 @@
 #include "TusUpload.h"
 
+#include "ServerRest.h"
 #include "ShareApi.h"
 
 #include <glib.h>
@@ -46,7 +47,7 @@ void TusUpload::askOffset()
 void TusUpload::onOffset(const HttpAnswer &answer)
 {
     if (!answer.failure.empty() || answer.status != 200) {
-        fail(ShareApi::failureOf(answer));
+        fail(ShareApi::failureOf(answer), askedRest(answer));
     } else if (!takeOffset(answer, 0)) {
         fail(failureNamed("unexpected_answer"));
     } else {
@@ -71,7 +72,7 @@ void TusUpload::sendChunk(int64_t length)
 {
     if (length == 0) {
         const Done done = done_;
-        done(nullptr);
+        done(nullptr, 0);
         return;
     }
     HttpRequest patch = request("PATCH");
@@ -90,7 +91,7 @@ void TusUpload::onAppended(const HttpAnswer &answer)
     } else if (answer.failure.empty() && answer.status == 409 && !asked_) {
         askOffset();
     } else if (!answer.failure.empty() || answer.status != 204) {
-        fail(ShareApi::failureOf(answer));
+        fail(ShareApi::failureOf(answer), askedRest(answer));
     } else if (!takeOffset(answer, file_.offset + 1)) {
         fail(failureNamed("unexpected_answer"));
     } else {
@@ -112,11 +113,11 @@ bool TusUpload::takeOffset(const HttpAnswer &answer, int64_t lowest)
     return true;
 }
 
-void TusUpload::fail(const Failure &failure)
+void TusUpload::fail(const Failure &failure, int64_t restMs)
 {
     // The callback may end this object.
     const Done done = done_;
-    done(&failure);
+    done(&failure, restMs);
 }
 
 } // namespace pelliko::service

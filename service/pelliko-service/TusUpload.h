@@ -24,8 +24,11 @@ public:
      * @param stored  whether the server has just confirmed them
      */
     using Progress = std::function<void(int64_t present, bool stored)>;
-    /** @param failure null when the whole file is on the server's disk */
-    using Done = std::function<void(const Failure *failure)>;
+    /**
+     * @param failure null when the whole file is on the server's disk
+     * @param restMs  how long the server asked to be left alone
+     */
+    using Done = std::function<void(const Failure *failure, int64_t restMs)>;
 
     TusUpload(HttpSender &http, Account account, TusFile file, int64_t chunkBytes);
     ~TusUpload();
@@ -43,7 +46,7 @@ private:
     void sendChunk(int64_t length);
     void onAppended(const HttpAnswer &answer);
     bool takeOffset(const HttpAnswer &answer, int64_t lowest);
-    void fail(const Failure &failure);
+    void fail(const Failure &failure, int64_t restMs = 0);
 
     HttpSender &http_;
     Account account_;

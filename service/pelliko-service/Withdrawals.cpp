@@ -2,6 +2,7 @@
 
 #include <glib.h>
 
+#include <algorithm>
 #include <utility>
 
 namespace pelliko::service
@@ -38,6 +39,10 @@ void Withdrawals::next()
         const auto account = context_.account();
         if (!account || !context_.gate.open(account->server, false)) {
             again();
+            return;
+        }
+        if (const int64_t rest = rest_.left(account->server, context_.timers.steadyMs())) {
+            nextAfter(rest);
             return;
         }
         const auto request = context_.queue.find(current_);
@@ -84,7 +89,7 @@ void Withdrawals::onFound(const HttpAnswer &answer)
             again();
         }
     } else if (good || ShareApi::failureOf(answer).retry) {
-        again();
+        again(askedRest(answer));
     } else {
         done();
     }
@@ -104,7 +109,7 @@ void Withdrawals::onWithdrawn(const HttpAnswer &answer)
     if ((answer.failure.empty() && answer.status == 204) || !ShareApi::failureOf(answer).retry) {
         done();
     } else {
-        again();
+        again(askedRest(answer));
     }
 }
 
@@ -123,9 +128,15 @@ void Withdrawals::done()
     next();
 }
 
-void Withdrawals::again()
+void Withdrawals::again(int64_t restMs)
 {
-    timer_ = context_.timers.after(backoff_.next(), [this] {
+    rest_.begin(restMs, context_.timers.steadyMs());
+    nextAfter(std::max(backoff_.next(), restMs));
+}
+
+void Withdrawals::nextAfter(int64_t milliseconds)
+{
+    timer_ = context_.timers.after(milliseconds, [this] {
         timer_ = 0;
         next();
     });

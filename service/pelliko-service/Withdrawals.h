@@ -2,6 +2,7 @@
 
 #include "Backoff.h"
 #include "RequestContext.h"
+#include "ServerRest.h"
 
 namespace pelliko::service
 {
@@ -27,11 +28,13 @@ private:
     void withdraw(const Account &account, const std::string &share);
     void onWithdrawn(const HttpAnswer &answer);
     void done();
-    void again();
+    void again(int64_t restMs = 0);
+    void nextAfter(int64_t milliseconds);
 
     RequestContext &context_;
     std::function<void()> changed_;
     Backoff backoff_;
+    ServerRest rest_;
     int32_t current_ = 0;
     uint64_t transfer_ = 0;
     uint64_t timer_ = 0;

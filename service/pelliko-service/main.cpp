@@ -31,6 +31,7 @@ void addSettings(CLI::App &app, Settings &settings)
         ->check(CLI::NonNegativeNumber)
         ->envname("PELLIKO_UPLOAD_RATE")
         ->capture_default_str();
+    time("--stall", settings.stallSeconds, "Time without a byte that ends a transfer (s)");
     time("--first-launch-retry", settings.firstLaunchRetryMs,
          "First wait after a failed launch of the application (ms)");
     time("--longest-launch-retry", settings.longestLaunchRetryMs,

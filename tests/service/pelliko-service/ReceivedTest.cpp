@@ -1,4 +1,5 @@
 // What others share arrives, over every restart on its way. The user shares with the own number.
+#include "FaultPlan.h"
 #include "World.h"
 #include "pelliko_shares.h"
 
@@ -11,6 +12,7 @@
 #include <mutex>
 #include <set>
 
+using pelliko::test::JsonValue;
 using testing::Each;
 using testing::ElementsAre;
 using testing::IsEmpty;
@@ -333,6 +335,51 @@ TEST_F(Received, aShareThatIsTakenBackSaysSoEverywhere)
               0);
     EXPECT_THAT(sentList(), IsEmpty());
     EXPECT_EQ(infoOf("unknownToken").result, PELLIKO_SHARES_ERROR_NOT_FOUND);
+}
+
+TEST_F(Received, nothingOfAHotelsNetworkIsTakenForTheServersAnswer)
+{
+    startServer();
+    std::vector<std::string> rules(3, hotelPage("GET", "/push$"));
+    rules.push_back(hotelPage("POST", "/push/ack$"));
+    for (const std::string method : {"GET", "DELETE"}) {
+        rules.push_back(answers(method, "/received/[^/]+$", 404));
+        rules.push_back(hotelPage(method, "/received/[^/]+$"));
+    }
+    // As long as the file, and all of it and the rest of it.
+    const std::string bytes = R"("length": 70000)";
+    rules.push_back(rule("GET", "/files/0$", "cut", R"("after": 30000)"));
+    rules.push_back(answers("GET", "/files/0$", 200, bytes));
+    rules.push_back(answers("GET", "/files/0$", 206, bytes));
+    startFaults(plan(rules));
+    startService();
+    const RecordingApplication application;
+    const std::string file = makeFile("one.jpg", 70'000);
+    share({file});
+    ASSERT_TRUE(waitForTokens(application, 1));
+    const std::string token = tokens(application)[0];
+    const Saved saved = save(token);
+    EXPECT_EQ(saved.result, 0);
+    ASSERT_EQ(saved.paths.size(), 1U);
+    EXPECT_TRUE(contentOf(saved.paths[0]) == contentOf(file));
+    EXPECT_EQ(resultOf([&](auto done, void *data) {
+                  return pelliko_shares_forget_received(token.c_str(), done, data, nullptr);
+              }),
+              0);
+    ASSERT_TRUE(runUntil([&] {
+        return JsonValue::parse(askServer("GET", "/api/v1/received"))["received"].size() == 0;
+    }));
+    std::vector<int64_t> streams;
+    size_t met = 0;
+    for (const SeenExchange &seen : exchanges()) {
+        met += seen.fault.empty() ? 0 : 1;
+        if (seen.request == "GET /api/v1/push" && !seen.fault.empty()) {
+            streams.push_back(seen.at);
+        }
+    }
+    EXPECT_EQ(met, rules.size());
+    ASSERT_EQ(streams.size(), 3U);
+    EXPECT_GE(streams[2] - streams[1], 100) << "a page is no success: the waits grow";
 }
 
 TEST_F(Received, aServerThatGoesWhileAFileIsSavedIsWaitedForThenTheRestIsFetched)

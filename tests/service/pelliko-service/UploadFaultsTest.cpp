@@ -1,3 +1,4 @@
+#include "FaultPlan.h"
 #include "World.h"
 
 #include <JsonValue.h>
@@ -174,6 +175,36 @@ TEST_F(UploadFaults, aQueueThatIsLockedMakesTheServiceSayThatItInitializes)
     ASSERT_TRUE(runUntil([&] { return request({makeFile("photo.jpg", 100)}, &id) == 0; }));
     ASSERT_TRUE(waitForEnd(id));
     EXPECT_EQ(reportsOf(id).back().status, 7);
+}
+
+TEST_F(UploadFaults, aFullDiskRefusesWhatIsNewAndHoldsWhatIsKnown)
+{
+    startServer();
+    RecordingApplication application;
+    startFaults(plan({rule("POST", "/shares$", "stall")}));
+    const std::string disk = smallDisk(1024 * 1024);
+    const std::string file = makeFile("photo.jpg", 100'000);
+    int32_t known = 0;
+    ASSERT_EQ(request({file}, &known), 0);
+    ASSERT_TRUE(runUntil([&] { return proxy_->lines().back().starts_with("stalled"); }));
+    std::ofstream filler(disk + "/filler");
+    while (filler << std::string(4096, 'x') << std::flush) {
+    }
+    int32_t id = 7;
+    EXPECT_EQ(request({file}, &id), -5);
+    EXPECT_EQ(id, 7);
+    proxy_->signal(SIGUSR1);
+    ASSERT_TRUE(waitForStatus(known, 6));
+    EXPECT_THAT(statusesOf(known), Not(Contains(1))) << "what is not on disk is not told";
+    filler.close();
+    fs::remove(disk + "/filler");
+    ASSERT_TRUE(waitForEnd(known));
+    EXPECT_EQ(reportsOf(known).back().status, 7);
+    ASSERT_EQ(request({file}, &id), 0);
+    ASSERT_TRUE(waitForEnd(id));
+    EXPECT_EQ(reportsOf(id).back().status, 7);
+    EXPECT_EQ(sharesOnServer(), 2U);
+    EXPECT_EQ(application.launches.size(), 2U);
 }
 
 TEST_F(UploadFaults, idsAreNotUsedAgainAfterARestart)

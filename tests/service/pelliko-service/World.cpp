@@ -1,5 +1,7 @@
 #include "World.h"
 
+#include <JsonValue.h>
+
 #include <algorithm>
 #include <csignal>
 #include <cstdlib>
@@ -141,6 +143,7 @@ World::World()
 {
     std::string pattern = std::string(std::getenv("PELLIKO_STATE")) + "/uploads.XXXXXX";
     folder_ = mkdtemp(pattern.data());
+    queueFolder_ = folder_;
     currentWorld = this;
     stopActivation();
 }
@@ -176,21 +179,11 @@ void World::makeAccount(const std::string &url)
 
 void World::startService(std::vector<std::string> options)
 {
-    std::vector<std::string> words{program("pelliko-service"),
-                                   "--queue",
-                                   folder_ + "/queue.db",
-                                   "--account-file",
-                                   folder_ + "/account.json",
-                                   "--first-retry",
-                                   "100",
-                                   "--longest-retry",
-                                   "400",
-                                   "--first-launch-retry",
-                                   "100",
-                                   "--longest-launch-retry",
-                                   "400",
-                                   "--claim",
-                                   "700"};
+    std::vector<std::string> words = wrapper_;
+    words.insert(words.end(), {program("pelliko-service"), "--queue", queueFolder_ + "/queue.db",
+                               "--account-file", folder_ + "/account.json", "--first-retry", "100",
+                               "--longest-retry", "400", "--first-launch-retry", "100",
+                               "--longest-launch-retry", "400", "--claim", "700"});
     words.insert(words.end(), options.begin(), options.end());
     // The bus notices a killed owner a moment later; a call in between would go to the dead one.
     service_.reset();
@@ -206,6 +199,45 @@ void World::startProxy(int64_t stallAfter)
         "8092", "8091", std::to_string(stallAfter)});
     ASSERT_TRUE(runUntil([this] { return !proxy_->lines().empty(); }));
     makeAccount("http://127.0.0.1:8092");
+}
+
+void World::startFaults(const std::string &plan)
+{
+    proxy_ = std::make_unique<Process>(std::vector<std::string>{
+        "/usr/bin/python3", PELLIKO_SOURCE_DIR "/tests/support/fault-proxy", "8092", "8091", plan});
+    ASSERT_TRUE(runUntil([this] { return !proxy_->lines().empty(); }));
+    makeAccount("http://127.0.0.1:8092");
+}
+
+std::vector<SeenExchange> World::exchanges() const
+{
+    std::vector<SeenExchange> result;
+    for (const std::string &line : proxy_->lines()) {
+        if (line.front() == '{') {
+            const auto seen = pelliko::test::JsonValue::parse(line);
+            result.push_back({seen["method"].text() + " " + seen["path"].text(),
+                              seen["fault"].text(), seen["at"].number(), seen["bytes"].number()});
+        }
+    }
+    return result;
+}
+
+std::string World::smallDisk(int64_t bytes)
+{
+    queueFolder_ = folder_ + "/small";
+    std::filesystem::create_directory(queueFolder_);
+    wrapper_ = {"bwrap",   "--dev-bind", "/",
+                "/",       "--size",     std::to_string(bytes),
+                "--tmpfs", queueFolder_, "--die-with-parent"};
+    startService();
+    g_autoptr(GDBusConnection) bus = g_bus_get_sync(G_BUS_TYPE_SESSION, nullptr, nullptr);
+    g_autoptr(GVariant) reply = g_dbus_connection_call_sync(
+        bus, "org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DBus",
+        "GetConnectionUnixProcessID", g_variant_new("(s)", serviceName), nullptr,
+        G_DBUS_CALL_FLAGS_NONE, -1, nullptr, nullptr);
+    guint pid = 0;
+    g_variant_get(reply, "(u)", &pid);
+    return "/proc/" + std::to_string(pid) + "/root" + queueFolder_;
 }
 
 std::string World::makeFile(const std::string &name, int64_t size)

@@ -27,6 +27,14 @@ struct SeenLaunch {
     bool replyWanted = false;
 };
 
+/** One request that went through the proxy of a plan. */
+struct SeenExchange {
+    std::string request; ///< method and path
+    std::string fault;   ///< empty: it passed
+    int64_t at = 0;      ///< milliseconds, when its head was there
+    int64_t bytes = 0;   ///< of its body that passed
+};
+
 /** The application's name on the bus, held by the test on a connection of its own; it records its
  * launches. */
 class RecordingApplication
@@ -65,6 +73,15 @@ protected:
     /** A proxy before the server that stalls after so many bytes; the account then names the proxy.
      */
     void startProxy(int64_t stallAfter);
+    /** A proxy before the server that does what the plan says (see tests/support/fault-proxy); the
+     * account then names it. */
+    void startFaults(const std::string &plan);
+    /** What went through that proxy and is over, in order. */
+    std::vector<SeenExchange> exchanges() const;
+
+    /** Starts the service with a queue on a file system of its own. @return where that is seen from
+     * outside */
+    std::string smallDisk(int64_t bytes);
 
     std::string makeFile(const std::string &name, int64_t size);
     /** Asks for an upload to the two usual recipients. */
@@ -87,6 +104,8 @@ protected:
                          int error, int id, void *world);
 
     std::string folder_;
+    std::string queueFolder_;          ///< where the service has its queue
+    std::vector<std::string> wrapper_; ///< a command that the service is started by
     std::string token_;
     std::string serverUrl_ = "http://127.0.0.1:8091";
     std::unique_ptr<Process> server_;
