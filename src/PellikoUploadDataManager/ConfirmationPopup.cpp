@@ -60,7 +60,9 @@ void _uploadConfirmShareBtnClickedCb(void *data, Evas_Object *, void *)
 {
     auto *ad = static_cast<PellikoAppData *>(data);
     RETURN_IF_NULL(ad, "upload item is NULL");
-    _leaveAfterAction(ad, _performAction(ad));
+    // A second press that was made before the popup closed arrives after it: the share was made.
+    if (ad->popup)
+        _leaveAfterAction(ad, _performAction(ad));
 }
 
 void _uploadConfirmCancelBtnClickedCb(void *data, Evas_Object *, void *)

@@ -39,6 +39,20 @@ TEST_F(ConfirmationPopup, ShareHandsTheFilesOverAndHides)
     EXPECT_EQ(lines.back(), "uploadStart ret = 0");
 }
 
+// All presses are on their way before the first one closes the popup.
+TEST_F(ConfirmationPopup, SeveralPressesInARowShareOnce)
+{
+    service.answerRequests(0, 7);
+    share(1, 1500, {{"Ann"}});
+    ad->upload_item->files = eina_list_append(nullptr, g_strdup("/a/b.jpg"));
+    openPopup();
+    for (int i = 0; i < 3; ++i)
+        press(button("button2"));
+    ASSERT_TRUE(closes());
+    turnLoopOnce();
+    EXPECT_EQ(service.calls().size(), 1U);
+}
+
 TEST_F(ConfirmationPopup, ReshareTakesTheNodeOfTheNewRequest)
 {
     service.answerInfo(3, 5000);
