@@ -12,6 +12,19 @@ namespace pelliko
 namespace
 {
 
+// A query without its filter would find everybody.
+int _query(const char *number, contacts_query_h query, contacts_filter_h filter,
+           contacts_list_h *list)
+{
+    int err = contacts_filter_add_str(filter, _contacts_person_number.number,
+                                      CONTACTS_MATCH_CONTAINS, number);
+    if (err == CONTACTS_ERROR_NONE)
+        err = contacts_query_set_filter(query, filter);
+    if (err == CONTACTS_ERROR_NONE)
+        err = contacts_db_get_records_with_query(query, 0, 0, list);
+    return err;
+}
+
 // Everybody whose number contains this one; null when the store cannot be asked.
 contacts_list_h _findPersons(const char *number)
 {
@@ -20,10 +33,7 @@ contacts_list_h _findPersons(const char *number)
     contacts_list_h list = nullptr;
     contacts_query_create(_contacts_person_number._uri, &query);
     contacts_filter_create(_contacts_person_number._uri, &filter);
-    contacts_filter_add_str(filter, _contacts_person_number.number, CONTACTS_MATCH_CONTAINS,
-                            number);
-    contacts_query_set_filter(query, filter);
-    const int err = contacts_db_get_records_with_query(query, 0, 0, &list);
+    const int err = _query(number, query, filter, &list);
     contacts_filter_destroy(filter);
     contacts_query_destroy(query);
     if (err == CONTACTS_ERROR_NONE)

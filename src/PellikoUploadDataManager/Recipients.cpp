@@ -109,25 +109,32 @@ Step _addRecipient(UploadItem &item, int32_t number_id)
     return _appendRecipient(item, number_id, records);
 }
 
-contacts_filter_h _statusFilter(const char *number_id_text)
+// What to look for. A filter that lacks a part would find the mark of somebody else.
+int _fillStatusFilter(contacts_filter_h filter, const char *number_id_text)
 {
-    contacts_filter_h filter = nullptr;
-    contacts_filter_create(_contacts_person_contact._uri, &filter);
-    contacts_filter_add_str(filter, _contacts_person_contact.address_book_name,
-                            CONTACTS_MATCH_FULLSTRING, serviceAddressBook);
-    contacts_filter_add_operator(filter, CONTACTS_FILTER_OPERATOR_AND);
-    contacts_filter_add_str(filter, _contacts_person_contact_ex.number_id,
-                            CONTACTS_MATCH_FULLSTRING, number_id_text);
-    return filter;
+    int ct_ret = contacts_filter_add_str(filter, _contacts_person_contact.address_book_name,
+                                         CONTACTS_MATCH_FULLSTRING, serviceAddressBook);
+    if (ct_ret == CONTACTS_ERROR_NONE)
+        ct_ret = contacts_filter_add_operator(filter, CONTACTS_FILTER_OPERATOR_AND);
+    if (ct_ret == CONTACTS_ERROR_NONE)
+        ct_ret = contacts_filter_add_str(filter, _contacts_person_contact_ex.number_id,
+                                         CONTACTS_MATCH_FULLSTRING, number_id_text);
+    return ct_ret;
 }
 
 int _queryStatus(const char *number_id_text, contacts_list_h *list)
 {
-    contacts_filter_h filter = _statusFilter(number_id_text);
+    contacts_filter_h filter = nullptr;
     contacts_query_h query = nullptr;
-    contacts_query_create(_contacts_person_contact._uri, &query);
-    contacts_query_set_filter(query, filter);
-    const int ct_ret = contacts_db_get_records_with_query(query, 0, 0, list);
+    int ct_ret = contacts_filter_create(_contacts_person_contact._uri, &filter);
+    if (ct_ret == CONTACTS_ERROR_NONE)
+        ct_ret = _fillStatusFilter(filter, number_id_text);
+    if (ct_ret == CONTACTS_ERROR_NONE)
+        ct_ret = contacts_query_create(_contacts_person_contact._uri, &query);
+    if (ct_ret == CONTACTS_ERROR_NONE)
+        ct_ret = contacts_query_set_filter(query, filter);
+    if (ct_ret == CONTACTS_ERROR_NONE)
+        ct_ret = contacts_db_get_records_with_query(query, 0, 0, list);
     contacts_query_destroy(query);
     contacts_filter_destroy(filter);
     return ct_ret;

@@ -1,4 +1,5 @@
 // What others have shared with the user: how the senders are found, and what the panel is given.
+#include "Faults.h"
 #include "PellikoNotificationManager/ContactNames.h"
 #include "PellikoNotificationManager/ReceivedShareNotifications.h"
 #include "PellikoNotificationManager/SenderNames.h"
@@ -219,6 +220,23 @@ TEST_F(ContactNames, AStoreThatIsNotConnectedIsLogged)
                 ElementsAre(StartsWith("contacts_db_get_records_with_query is failed error_code = "
                                        "-")));
     EXPECT_EQ(contacts_connect(), CONTACTS_ERROR_NONE);
+}
+
+// Without its filter the query would find everybody, and the share would come from the first of
+// them.
+TEST_F(ContactNames, AQueryThatCannotBeBuiltFindsNobody)
+{
+    addPerson("Ida Example", {"+447700900108"});
+    for (const char *step : {"contacts_query_create:1", "contacts_filter_create:1",
+                             "contacts_filter_add_str:1", "contacts_query_set_filter:1"}) {
+        ASSERT_EQ(platform::planFaults(step), "");
+        log.restart();
+        EXPECT_EQ(nameOf("+447700900999"), "(null)") << step;
+        EXPECT_THAT(log.messages(), ElementsAre(StartsWith("contacts_db_get_records_with_query is "
+                                                           "failed error_code = -")))
+            << step;
+    }
+    ASSERT_EQ(platform::planFaults(""), "");
 }
 
 TEST_F(ReceivedShares, ASingleOneNamesItsSenderAndOpensTheViewer)

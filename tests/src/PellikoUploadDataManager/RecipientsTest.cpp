@@ -1,4 +1,5 @@
 #include "PellikoUploadDataManager/Recipients.h"
+#include "Faults.h"
 #include "support/FileLog.h"
 
 #include <ContactsWriter.h>
@@ -310,6 +311,24 @@ TEST_F(Recipients, FailedStatusQueryCountsAsNotJoined)
     EXPECT_THAT(log.messages(), Contains(::testing::StartsWith(
                                     "contacts_db_get_records_with_query is failed error_code = ")));
     EXPECT_EQ(joinedFlag(id), 1);
+}
+
+// A query that lacks a part of its filter would find the mark of somebody else.
+TEST_F(Recipients, AQueryThatCannotBeBuiltCountsAsNotJoined)
+{
+    add("18", true);
+    const int id = add("19");
+    for (const char *step :
+         {"contacts_filter_create:1", "contacts_filter_add_str:1", "contacts_filter_add_operator:1",
+          "contacts_filter_add_str:2", "contacts_query_create:1", "contacts_query_set_filter:1"}) {
+        ASSERT_EQ(platform::planFaults(step + std::string("=-12")), "");
+        log.restart();
+        EXPECT_EQ(joinedFlag(id), 0) << step;
+        EXPECT_EQ(log.messages().back(),
+                  "contacts_db_get_records_with_query is failed error_code = -12")
+            << step;
+    }
+    ASSERT_EQ(platform::planFaults(""), "");
 }
 
 TEST_F(Recipients, MissingRecordIsRefused)
