@@ -10,6 +10,7 @@
 #include "PellikoUploadDataManager/UploadNotiData.h"
 #include "PellikoUploadManager/ExitPolicy.h"
 #include "PellikoUploadManager/UploadStatus.h"
+#include "PellikoUploadManager/UsagePreferences.h"
 
 #include <algorithm>
 #include <pelliko_client.h>
@@ -110,6 +111,9 @@ void _doSendSms(PellikoAppData *ad)
     LOG_DEBUG("Send SMS to receiver");
     if (startDetachedWorker([job = makeSmsJob(ad)] { runSmsJob(job); }))
         LOG_DEBUG("operation_type=[%d]", ad->operation_type);
+    else
+        updatePreference(); // as after messages that could not be sent: the process must not wait
+                            // for them
 }
 
 void _leaveRefusedShare(PellikoAppData *ad)

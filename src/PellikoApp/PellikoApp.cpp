@@ -58,6 +58,8 @@ void _resetPreferences()
 void _addTheme(PellikoAppData *ad)
 {
     ad->theme = elm_theme_new();
+    // Without one the toolkit would take its own default theme and make that refer to itself.
+    RETURN_IF_NULL(ad->theme, "the theme could not be created");
     elm_theme_ref_set(ad->theme, nullptr);
     const CText resources(app_get_resource_path());
     char path[themePathSize];

@@ -11,7 +11,9 @@
 #include "PellikoUploadingDataManager/PressedNotification.h"
 #include "PellikoUploadingDataManager/StatusPopup.h"
 
+#include <Ecore.h>
 #include <app_preference.h>
+#include <atomic>
 #include <cstdlib>
 #include <cstring>
 #include <optional>
@@ -83,17 +85,29 @@ bool _noteSmsDone(const PellikoAppData *ad)
     return false;
 }
 
+// What the store would have told in a later turn of the loop.
+void _tellSmsDone(void *)
+{
+    ecore_job_add([](void *) { _preferenceUpdatedCb(shareSmsDoneKey, nullptr); }, nullptr);
+}
+
 } // namespace
 
 void updatePreference()
 {
-    preference_set_changed_cb(shareSmsDoneKey, _preferenceUpdatedCb, nullptr);
+    static std::atomic<bool> listening = false;
+    if (preference_set_changed_cb(shareSmsDoneKey, _preferenceUpdatedCb, nullptr) ==
+        PREFERENCE_ERROR_NONE)
+        listening = true;
     const int p_err = preference_set_int(shareSmsDoneKey, 1);
     if (p_err != PREFERENCE_ERROR_NONE)
         LOG_ERROR("Error in setting PREFERENCE SHARE_SMS_DONE with sms_done = 1, p_err = %d",
                   p_err);
     else
         LOG_DEBUG("Updating preference for sms_done with value = 1");
+    // The process would wait for a change that nobody tells.
+    if (!listening || p_err != PREFERENCE_ERROR_NONE)
+        ecore_main_loop_thread_safe_call_async(_tellSmsDone, nullptr);
 }
 
 void _updateTimestamp()

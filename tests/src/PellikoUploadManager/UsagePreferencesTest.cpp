@@ -1,4 +1,5 @@
 #include "PellikoUploadManager/UsagePreferences.h"
+#include "Faults.h"
 #include "PellikoUploadManager/PeriodClock.h"
 #include "support/AppWorld.h"
 #include "support/RefusingStore.h"
@@ -12,6 +13,9 @@ namespace pelliko::test
 {
 namespace
 {
+
+// What the exit rule says once the messages are known to be sent.
+constexpr const char *noneIsLeft = "No upload_data request id exist so app is exiting";
 
 class UsagePreferences : public AppWorld
 {
@@ -202,6 +206,21 @@ TEST_F(UsagePreferences, WhatTheStoreRefusesIsLoggedByItsName)
               "previous update_popup_data = (null)\n"
               "new update_popup_data = 2+45.000000+0\n"
               "Error in getting PREFERENCE KEY SHARE_UPDATE_POPUP_DATA\n");
+    loop.settle(); // that the messages are sent is told all the same
+    EXPECT_NE(log.text().find("\nreq_id = 0\n"), std::string::npos);
+}
+
+TEST_F(UsagePreferences, ThatTheMessagesAreSentIsToldWithoutTheStoreToo)
+{
+    ASSERT_EQ(platform::planFaults("preference_set_int:1=-28"), "");
+    updatePreference();
+    ASSERT_EQ(platform::planFaults(""), "");
+    ASSERT_TRUE(loop.runUntil([this] { return log.messages().back() == noneIsLeft; }));
+    loop.settle();
+    EXPECT_EQ(log.text(),
+              "Error in setting PREFERENCE SHARE_SMS_DONE with sms_done = 1, p_err = -28\n"
+              "req_id = 0\n"
+              "No upload_data request id exist so app is exiting\n");
 }
 
 TEST_F(UsagePreferences, TheMessagesFirstRemembersThemInTheNode)
