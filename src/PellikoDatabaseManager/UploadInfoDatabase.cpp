@@ -53,9 +53,12 @@ sqlite3 *_getDatabaseHandle()
     return handle;
 }
 
+// SQLite takes a statement that could not be written for an empty one and calls it done.
 ExecResult _execute(sqlite3 *handle, const char *statement,
                     int (*row)(void *, int, char **, char **) = nullptr)
 {
+    if (!statement)
+        return {SQLITE_NOMEM, nullptr};
     char *error = nullptr;
     const int code = sqlite3_exec(handle, statement, row, nullptr, &error);
     return {code, SqliteText(error)};
@@ -159,10 +162,8 @@ void writeUploadDataToDb(const UploadNotiData *node)
         sqlite3_mprintf("INSERT into %s VALUES (%d, %d, %ld, \"%s\", \"%s\", \"%s\");", tableName,
                         node->request_id, node->total_files, static_cast<long>(node->total_size),
                         files.c_str(), node->recipient_list, node->recipient_index_list));
-    if (!statement)
-        return;
-    if (_hasQuote(files.c_str()) || _hasQuote(node->recipient_list) ||
-        _hasQuote(node->recipient_index_list)) {
+    if (statement && (_hasQuote(files.c_str()) || _hasQuote(node->recipient_list) ||
+                      _hasQuote(node->recipient_index_list))) {
         _refuseStatement(handle, statement.get());
         return;
     }

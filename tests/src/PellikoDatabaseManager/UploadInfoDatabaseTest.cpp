@@ -1,4 +1,5 @@
 #include "PellikoDatabaseManager/UploadInfoDatabase.h"
+#include "Faults.h"
 #include "support/FileLog.h"
 #include "support/FreshProcess.h"
 
@@ -190,6 +191,18 @@ TEST_F(UploadInfoDatabase, QuotesThatCompleteAStatementNeverRunIt)
                             "SQL query execution error: SQL logic error and return value = 1",
                             HasSubstr("SQL query execution error: ")));
     EXPECT_THAT(Onlooker().rows(), ElementsAre("1|1|2000|/kept?|Ann?|31?"));
+}
+
+TEST_F(UploadInfoDatabase, AStatementThatCannotBeWrittenIsNoSuccess)
+{
+    ASSERT_EQ(platform::planFaults("sqlite3_mprintf:1,sqlite3_mprintf:2,sqlite3_mprintf:3"), "");
+    writeUploadDataToDb(node(7, "/a", "Ann?", "31?"));
+    EXPECT_FALSE(readUploadDataFromDb());
+    deleteUploadDataFromDb(7);
+    ASSERT_EQ(platform::planFaults(""), "");
+    const std::string line = "SQL query execution error: (null) and return value = 7";
+    EXPECT_THAT(log.messages(), ElementsAre(line, line, line));
+    EXPECT_THAT(Onlooker().rows(), IsEmpty());
 }
 
 TEST_F(UploadInfoDatabase, SingleQuotesAndPercentSignsAreKept)
