@@ -5,7 +5,9 @@
 
 #include <SQLiteCpp/SQLiteCpp.h>
 #include <dlog.h>
+#include <sqlite3.h>
 
+#include <filesystem>
 #include <limits>
 #include <memory>
 #include <mutex>
@@ -24,19 +26,36 @@ enum Type { kInt = 0, kDouble = 1, kText = 2, kBoolean = 3 };
 std::mutex storeMutex;
 std::unique_ptr<SQLite::Database> opened;
 
-std::unique_ptr<SQLite::Database> open()
+std::unique_ptr<SQLite::Database> openSound(const std::string &file)
 {
-    const std::string folder = platform::stateDirectory() + "/preferences";
-    platform::createPrivateDirectories(folder);
-    auto made = std::make_unique<SQLite::Database>(folder + "/" + platform::applicationId() + ".db",
-                                                   SQLite::OPEN_READWRITE | SQLite::OPEN_CREATE,
-                                                   kBusyMilliseconds);
+    auto made = std::make_unique<SQLite::Database>(
+        file, SQLite::OPEN_READWRITE | SQLite::OPEN_CREATE, kBusyMilliseconds);
     // One write to stable storage per set: the log of the journal is flushed before it returns.
     made->exec("PRAGMA journal_mode = WAL");
     made->exec("PRAGMA synchronous = FULL");
     made->exec("CREATE TABLE IF NOT EXISTS preference "
                "(key TEXT PRIMARY KEY, type INTEGER NOT NULL, value)");
+    if (made->execAndGet("PRAGMA quick_check(1)").getString() != "ok")
+        throw SQLite::Exception("the file is damaged", SQLITE_CORRUPT);
     return made;
+}
+
+// Who cannot keep a value any more waits for it forever: values that are lost cost less.
+std::unique_ptr<SQLite::Database> open()
+{
+    const std::string folder = platform::stateDirectory() + "/preferences";
+    platform::createPrivateDirectories(folder);
+    const std::string file = folder + "/" + platform::applicationId() + ".db";
+    try {
+        return openSound(file);
+    } catch (const SQLite::Exception &error) {
+        if (error.getErrorCode() != SQLITE_NOTADB && error.getErrorCode() != SQLITE_CORRUPT)
+            throw;
+    }
+    dlog_print(DLOG_ERROR, "PREFERENCE", "%s is damaged: it is kept as .broken, a new one begins",
+               file.c_str());
+    std::filesystem::rename(file, file + ".broken");
+    return openSound(file);
 }
 
 // Runs `work` on the open store. An error closes it, so that the next call starts afresh.

@@ -60,6 +60,9 @@ public:
     {
         exec("PRAGMA journal_mode = WAL");
         exec("PRAGMA synchronous = FULL");
+        // What is damaged deep inside would refuse every post from now on.
+        if (execAndGet("PRAGMA quick_check(1)").getString() != "ok")
+            throw SQLite::Exception("the file is damaged", SQLITE_CORRUPT);
         exec(schema);
     }
 

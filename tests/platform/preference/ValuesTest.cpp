@@ -190,10 +190,11 @@ TEST_F(Values, AStoreThatRefusesWritesKeepsWhatItHas)
     EXPECT_EQ(PREFERENCE_ERROR_NONE, preference_set_int(kSize, 6)) << "there is room again";
 }
 
-TEST_F(Values, ADamagedStoreIsAnInputOutputErrorAndStaysAsItIs)
+TEST_F(Values, ADamagedStoreIsKeptAsideAndAFreshOneBegins)
 {
     const std::string damaged = fileOf("com.velmora.damaged");
     std::ofstream(damaged) << std::string(5000, 'x');
-    EXPECT_EQ("-5 5\n", probe("PELLIKO_APP_ID=com.velmora.damaged", "set size 5"));
-    EXPECT_EQ(5000U, std::filesystem::file_size(damaged));
+    EXPECT_EQ("0 5\n", probe("PELLIKO_APP_ID=com.velmora.damaged", "set size 5"));
+    EXPECT_EQ("0 5\n", probe("PELLIKO_APP_ID=com.velmora.damaged", "get size"));
+    EXPECT_EQ(5000U, std::filesystem::file_size(damaged + ".broken"));
 }

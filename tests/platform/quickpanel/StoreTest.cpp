@@ -1,5 +1,8 @@
+#include <csignal>
 #include <filesystem>
 #include <fstream>
+
+#include <sys/resource.h>
 
 #include <gtest/gtest.h>
 
@@ -104,6 +107,43 @@ TEST_F(PanelStore, AnUnreadableFileIsKeptAside)
     Store store(path_);
     EXPECT_TRUE(store.list("").empty());
     EXPECT_TRUE(std::filesystem::exists(path_.string() + ".broken"));
+}
+
+TEST_F(PanelStore, AFileThatIsDamagedInsideIsKeptAsideToo)
+{
+    {
+        Store store(path_);
+        Event event = post("7");
+        store.post(event);
+    }
+    std::fstream bytes(path_, std::ios::in | std::ios::out | std::ios::binary);
+    bytes.seekp(4096);
+    bytes << std::string(2000, 'x') << std::flush;
+    Store store(path_);
+    EXPECT_TRUE(store.list("").empty());
+    EXPECT_TRUE(std::filesystem::exists(path_.string() + ".broken"));
+    Event event = post("8");
+    store.post(event);
+    EXPECT_EQ(store.list("").size(), 1u);
+}
+
+TEST_F(PanelStore, AFullDiskRefusesAPostAndKeepsTheOthers)
+{
+    Store store(path_);
+    Event first = post("7");
+    store.post(first);
+    rlimit before{};
+    getrlimit(RLIMIT_FSIZE, &before);
+    const rlimit nothing = {1, before.rlim_max};
+    const auto handler = signal(SIGXFSZ, SIG_IGN);
+    setrlimit(RLIMIT_FSIZE, &nothing);
+    Event second = post("8");
+    EXPECT_ANY_THROW(store.post(second));
+    setrlimit(RLIMIT_FSIZE, &before);
+    signal(SIGXFSZ, handler);
+    EXPECT_EQ(store.list("").size(), 1u);
+    store.post(second); // there is room again
+    EXPECT_EQ(store.list("").size(), 2u);
 }
 
 TEST_F(PanelStore, AFolderThatIsMissingIsAnError)
