@@ -24,7 +24,7 @@ LIBRARIES = [
     ("curl/", ["service/pelliko-service/Curl*", "service/korrin/Curl*"], "transfers go through CurlTransfer or CurlPost"),
     ("sqlite3.h", ["src/PellikoDatabaseManager/UploadInfoDatabase.*", "platform/contacts/Database.cpp",
                    "platform/quickpanel/Store.cpp", "platform/preference/PreferenceStore.cpp",
-                   "service/pelliko-service/UploadQueue.cpp", "service/server/store/*"],
+                   "service/pelliko-service/QueueFile.cpp", "service/server/store/*"],
      "only the files that own a table know SQLite"),
     ("SQLiteCpp/", ["platform/*", "service/*"], "the application uses SQLite's own interface"),
     ("boost/", ["service/server/*"], "Boost is for the share server"),
