@@ -31,6 +31,14 @@ Evas_Object *withLeastHeight(Evas_Object *parent, Evas_Object *part)
     return row;
 }
 
+// The toolkit takes any two presses that follow each other quickly for one double press, also when
+// the second is into another entry, and gives that no focus.
+void focusPressed(void *, Evas *, Evas_Object *entry, void *)
+{
+    if (!elm_object_focus_get(entry))
+        elm_object_focus_set(entry, EINA_TRUE);
+}
+
 } // namespace
 
 Field addField(Evas_Object *box, const char *name, const char *guide,
@@ -48,6 +56,7 @@ Field addField(Evas_Object *box, const char *name, const char *guide,
     elm_object_part_text_set(field.entry, "elm.guide", guide);
     setAccessibleName(field.entry, translated(name));
     elm_object_scale_set(field.entry, entryScale);
+    evas_object_event_callback_add(field.entry, EVAS_CALLBACK_MOUSE_UP, focusPressed, nullptr);
     append(box, withLeastHeight(box, field.entry));
     return field;
 }

@@ -2,6 +2,7 @@
 
 #include "Language.h"
 
+#include <string_view>
 #include <utility>
 
 namespace pelliko::signin
@@ -29,7 +30,7 @@ FormPage::FormPage(const Page &page, const Typed &proposal, Wishes wishes)
     setTypedText(server_, proposal.server);
     setTypedText(number_, proposal.number);
     for (const Field &field : {server_, number_, code_})
-        evas_object_smart_callback_add(field.entry, "activated", onEnter, this);
+        evas_object_event_callback_add(field.entry, EVAS_CALLBACK_KEY_DOWN, onKey, this);
     focusFirst();
 }
 
@@ -83,15 +84,23 @@ void FormPage::onCancel(void *page, Evas_Object *, void *)
     cancel();
 }
 
-void FormPage::onEnter(void *data, Evas_Object *entry, void *)
+// The toolkit's own signal for this key comes a moment later: the letters that follow at once would
+// still go to the field that is left.
+void FormPage::onKey(void *page, Evas *, Evas_Object *entry, void *event)
 {
-    auto *page = static_cast<FormPage *>(data);
-    if (entry == page->server_.entry)
-        elm_object_focus_set(page->number_.entry, EINA_TRUE);
-    else if (entry == page->number_.entry)
-        elm_object_focus_set(page->code_.entry, EINA_TRUE);
+    const std::string_view key = static_cast<const Evas_Event_Key_Down *>(event)->key;
+    if (key == "Return" || key == "KP_Enter")
+        static_cast<FormPage *>(page)->enter(entry);
+}
+
+void FormPage::enter(const Evas_Object *entry)
+{
+    if (entry == server_.entry)
+        elm_object_focus_set(number_.entry, EINA_TRUE);
+    else if (entry == number_.entry)
+        elm_object_focus_set(code_.entry, EINA_TRUE);
     else
-        page->submit();
+        submit();
 }
 
 } // namespace pelliko::signin

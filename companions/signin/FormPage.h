@@ -33,9 +33,10 @@ private:
     void submit();
     void enable(bool enabled);
     void focusFirst();
+    void enter(const Evas_Object *entry);
     static void onSubmit(void *page, Evas_Object *, void *);
     static void onCancel(void *page, Evas_Object *, void *);
-    static void onEnter(void *page, Evas_Object *entry, void *);
+    static void onKey(void *page, Evas *, Evas_Object *entry, void *event);
 
     Wishes wishes_;
     companion::Field server_;

@@ -4,9 +4,13 @@ Controls are found by their label through the accessibility bus and pressed with
 middle of their extents, so that a button that cannot be pressed fails here too.
 """
 
+import contextlib
+import functools
 import subprocess
 
+import Xlib.X
 import Xlib.display
+import Xlib.error
 import Xlib.ext.damage
 import pyatspi
 from gi.repository import Gio, GLib
@@ -14,12 +18,26 @@ from gi.repository import Gio, GLib
 from world import LIMIT, WorldError, run, wait_for
 
 _EVENTS = ("object:state-changed:showing", "object:state-changed:visible", "object:children-changed",
-           "object:bounds-changed", "window:create", "window:activate")
+           "object:bounds-changed", "window:create", "window:activate", "object:state-changed:focused",
+           "object:text-changed:insert", "object:text-changed:delete")
+_CURSOR_WIDTH, _CURSOR_HEIGHT = 16, 64  # what is drawn anew when a text cursor blinks, in whole tiles
 
+
+def _no_matter(_event):
+    """Its only purpose is to wake the loop."""
+
+
+@functools.cache
+def _listen():
+    """Once and for good: a program tells no change that nobody listened for when it came, and the state that is
+    remembered of its controls would stay as it was."""
+    for event in _EVENTS:
+        pyatspi.Registry.registerEventListener(_no_matter, event)
 
 
 def announce_reader():
     """Says that a screen reader is there: the toolkit shows its controls only to programs started after this."""
+    _listen()
     bus = Gio.bus_get_sync(Gio.BusType.SESSION)
     bus.call_sync("org.a11y.Bus", "/org/a11y/bus", "org.freedesktop.DBus.Properties", "Set",
                   GLib.Variant("(ssv)", ("org.a11y.Status", "ScreenReaderEnabled", GLib.Variant("b", True))),
@@ -71,8 +89,14 @@ def find(label, role=None):
     return None
 
 
+def _blinks(event):
+    area = getattr(event, "area", None)
+    return area is not None and area.width <= _CURSOR_WIDTH and area.height <= _CURSOR_HEIGHT
+
+
 class Drawing:
-    """Wakes the loop whenever something is drawn on the screen, and tells `drawn` if that is given."""
+    """Wakes the loop whenever something is drawn on the screen, and tells `drawn` if that is given and it was more
+    than a text cursor, which blinks for ever."""
 
     def __init__(self, drawn=None):
         self.display = Xlib.display.Display()
@@ -83,9 +107,8 @@ class Drawing:
         self.watch = GLib.io_add_watch(self.display.fileno(), GLib.PRIORITY_DEFAULT, GLib.IOCondition.IN, self._read)
 
     def _read(self, *_):
-        while self.display.pending_events():
-            self.display.next_event()
-        if self.drawn:
+        events = [self.display.next_event() for _ in range(self.display.pending_events())]
+        if self.drawn and not all(map(_blinks, events)):
             self.drawn()
         return True
 
@@ -94,21 +117,55 @@ class Drawing:
         self.display.close()
 
 
+@contextlib.contextmanager
+def _awake():
+    """Wakes the loop at the events of programs, and when something is drawn."""
+    _listen()
+    drawing = Drawing()
+    try:
+        yield
+    finally:
+        drawing.close()
+
+
 def wait_for_control(label, role=None, limit=LIMIT):
     """Waits until a control with this label shows and returns its extents.
 
     A program may announce a control a moment before it answers for it; what it draws then is looked at too.
     """
-    listener = lambda event: None  # noqa: E731 - its only purpose is to wake the loop
-    for event in _EVENTS:
-        pyatspi.Registry.registerEventListener(listener, event)
-    drawing = Drawing()
-    try:
+    with _awake():
         return wait_for(lambda: find(label, role), f"the control “{label}”", limit)
+
+
+def _window_with_keyboard(display):
+    """The class names of the window that gets the keys; none while there is no such one."""
+    window = display.get_input_focus().focus
+    try:
+        return window.get_wm_class() or () if hasattr(window, "get_wm_class") else ()
+    except Xlib.error.BadWindow:  # it went away while it was looked at
+        return ()
+
+
+def wait_active(name, active=True, limit=LIMIT):
+    """Waits until the keyboard belongs to a window of this name, which gets every key from then on; or to no such."""
+    display = Xlib.display.Display()
+    # The window manager notes on the root which window it gave the keyboard to, after it did. The note alone may mean
+    # a window that is gone, whose number another has got.
+    display.screen().root.change_attributes(event_mask=Xlib.X.PropertyChangeMask)
+
+    def look():
+        names = _window_with_keyboard(display)
+        while display.pending_events():  # also those that came with the answers, which wake no loop
+            display.next_event()
+            names = _window_with_keyboard(display)
+        return (name in names) == active
+
+    watch = GLib.io_add_watch(display.fileno(), GLib.PRIORITY_DEFAULT, GLib.IOCondition.IN, lambda *_: True)
+    try:
+        wait_for(look, f"a window “{name}” to {'get' if active else 'lose'} the keyboard", limit)
     finally:
-        drawing.close()
-        for event in _EVENTS:
-            pyatspi.Registry.deregisterEventListener(listener, event)
+        GLib.source_remove(watch)
+        display.close()
 
 
 def press(label, role=None, limit=LIMIT):
@@ -122,15 +179,33 @@ def key(name):
     run("xdotool", "key", name)
 
 
+def _entry(label):
+    """Whether the entry with this label has the focus, and its text; None while there is none."""
+    for node in nodes():
+        try:
+            if node.name == label and "entry" in node.getRoleName():
+                node.clear_cache()  # what is remembered may be older than the last press
+                text = node.queryText()
+                return (node.getState().contains(pyatspi.STATE_FOCUSED), text.getText(0, text.characterCount))
+        except Exception:  # the object went away while it was looked at
+            continue
+    return None
+
+
+def text_of(label):
+    """What the entry with this label holds; None while there is no such entry."""
+    found = _entry(label)
+    return found and found[1]
+
+
 def type_into(label, text):
-    """Replaces the text of an entry as a person does: a press into it, all marked, removed, typed."""
-    press(label, "entry")
-    wait_still(0.2)
-    key("ctrl+a")
-    key("BackSpace")
-    if text:
-        run("xdotool", "type", "--delay", "5", "--", text)
-    wait_still(0.2)
+    """Replaces the text of an entry as a person does: a press into it, all letters removed, others typed."""
+    with _awake():
+        press(label, "entry")
+        wait_for(lambda: (_entry(label) or [False])[0], f"the focus of “{label}”")
+        run("xdotool", "key", "End", *["BackSpace"] * len(text_of(label)),
+            *(["type", "--delay", "5", "--", text] if text else []))
+        wait_for(lambda: text_of(label) == text, f"“{label}” to hold “{text}”")
 
 
 def wait_still(quiet=0.4, limit=5.0):
@@ -156,9 +231,18 @@ def wait_still(quiet=0.4, limit=5.0):
             GLib.source_remove(timer)
 
 
-def screenshot(path):
-    """Saves the whole screen, once it stands still, as a PNG."""
-    wait_still()
+def colour(x, y):
+    """What is drawn at a place of the screen now."""
+    display = Xlib.display.Display()
+    try:
+        return display.screen().root.get_image(x, y, 1, 1, Xlib.X.ZPixmap, 0xFFFFFFFF).data
+    finally:
+        display.close()
+
+
+def screenshot(path, limit=5.0):
+    """Saves the whole screen, once it stands still or `limit` seconds later, as a PNG."""
+    wait_still(limit=limit)
     done = subprocess.run(["import", "-window", "root", path], capture_output=True, text=True)
     if done.returncode != 0:
         raise WorldError(f"no screenshot: {done.stderr.strip()}")

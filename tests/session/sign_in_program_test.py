@@ -22,8 +22,7 @@ class SignInProgram(share_case.ShareCase):
         self.requests_before = len(world.requests())
         self.person = world.add_contact("Ann Example", "+44 7700 900123")
         world.share([self.file("note.txt", b"note")], [self.person])
-        screen.wait_for_control("Sign in", "button")
-        screen.wait_still()
+        screen.wait_active("korrin")
 
     def test_the_share_goes_on_after_the_sign_in(self):
         code = world.run("pelliko-server", "account", "invite", "--data", SERVER_DATA).strip()

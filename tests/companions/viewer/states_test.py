@@ -85,9 +85,10 @@ class States(ViewerCase):
         self.see_share()
 
     def test_a_share_that_ends_while_it_is_looked_at_says_so(self):
-        self.service.received = [doubles.received(TOKEN, ANN, files=FILES, expires=int(time.time()) + 4)]
         self.open()
         self.see("Save all", "button")
+        self.service.received = [doubles.received(TOKEN, ANN, files=FILES, expires=int(time.time()) + 2)]
+        self.service.change()
         self.see(EXPIRED)
         self.assertIsNone(screen.find("Save all"))
 
@@ -209,6 +210,23 @@ class SavingFiles(ViewerCase):
         self.service.finish(0, saved)
         self.press("thing.xyzzy, 3 B, Saved. Press to open")
         self.see("No program opens this kind of file. 1 file was saved.")
+
+    def test_a_second_press_at_once_looks_pressed_too(self):
+        self.open()
+        for label in ("Save all", "holiday.jpg, 2.4 MB, Press to save"):
+            extents = self.see(label, "button")
+            screen.wait_still(0.2)
+            x, y = extents.x + extents.width // 8, extents.y + extents.height // 2
+            before = screen.colour(x, y + 10)
+            world.run("xdotool", "mousemove", str(x), str(y), "mousedown", "1")
+            screen.wait_still(0.2)
+            pressed = screen.colour(x, y + 10)
+            self.assertNotEqual(before, pressed, label)
+            world.run("xdotool", "mousemove", "5", "5", "mouseup", "1", "mousemove", str(x), str(y), "mousedown", "1",
+                      "mouseup", "1", "mousedown", "1")
+            screen.wait_still(0.2)
+            self.assertEqual(pressed, screen.colour(x, y + 10), label)
+            world.run("xdotool", "mousemove", "5", "5", "mouseup", "1")
 
     def test_the_keyboard_is_enough(self):
         self.open()
