@@ -45,9 +45,13 @@ class Registration(ServerCase):
         for body in ["", "[]", '{"number": "+4915199999999"}', '{"number": 1, "code": 2}']:
             answer = self.request("POST", "/api/v1/accounts", body, {"Idempotency-Key": "k"}, token=False)
             self.assert_refused(answer, 400, "bad_request")
-        answer = self.request("POST", "/api/v1/accounts", json.dumps({"number": "+491519", "code": code}),
+        answer = self.request("POST", "/api/v1/accounts", json.dumps({"number": "+4915199", "code": code}),
                               token=False)
         self.assert_refused(answer, 400, "bad_request")
+        for key in ["", "k" * 65]:
+            answer = self.register("+4915199", code, headers={"Idempotency-Key": key})
+            self.assert_refused(answer, 400, "bad_request")
+        self.assert_refused(self.register("+4915199", code, key="k" * 64), 403, "code_used_up")
         answer = self.request("GET", "/api/v1/accounts", token=False)
         self.assert_refused(answer, 405, "method_not_allowed")
         answer = self.request("POST", "/api/v1/accounts", "x" * 5000, {"Idempotency-Key": "k"}, token=False)
