@@ -79,14 +79,12 @@ int Panel::post(const std::string &app, int64_t previous, Record record, int64_t
 {
     if (!isKnownType(record))
         return NOTIFICATION_ERROR_INVALID_PARAMETER;
-    const auto posted = previous != 0 ? store_.find(previous) : std::nullopt;
-    if (posted && posted->app == app)
+    if (previous != 0 && store_.posterOf(previous) == app)
         return NOTIFICATION_ERROR_ALREADY_EXIST_ID;
     record.app = app;
     Event event = eventOf(record.isTicker() ? "ticker" : "post", std::move(record));
     if (!event.record.tag.empty()) {
-        if (const auto old = store_.findByTag(app, event.record.tag))
-            event.replaced = old->id;
+        event.replaced = store_.idOfTag(app, event.record.tag).value_or(0);
     }
     store_.post(event);
     *id = event.record.id;
@@ -107,14 +105,12 @@ void Panel::show(int64_t replaced, const Record &record)
 
 int Panel::update(const std::string &app, int64_t id, Record record)
 {
-    const auto posted = store_.find(id);
-    if (!posted || posted->app != app)
+    if (store_.posterOf(id) != app)
         return NOTIFICATION_ERROR_NOT_EXIST_ID;
     if (!isKnownType(record))
         return NOTIFICATION_ERROR_INVALID_PARAMETER;
     if (!record.tag.empty()) {
-        const auto holder = store_.findByTag(app, record.tag);
-        if (holder && holder->id != id)
+        if (store_.idOfTag(app, record.tag).value_or(id) != id)
             return NOTIFICATION_ERROR_ALREADY_EXIST_ID;
     }
     record.id = id;

@@ -1,9 +1,12 @@
 #include "Store.h"
 
 #include <filesystem>
+#include <optional>
 
 #include <SQLiteCpp/SQLiteCpp.h>
 #include <sqlite3.h>
+
+#include "notification.h"
 
 namespace pelliko::quickpanel
 {
@@ -136,6 +139,28 @@ private:
     }
 };
 
+namespace
+{
+
+// While it lives a commit does not wait until the disk has it. A killed panel loses nothing
+// thereby, a power cut perhaps the last changes.
+class WithoutWaiting
+{
+public:
+    explicit WithoutWaiting(SQLite::Database &database) : database_(database)
+    {
+        database_.tryExec("PRAGMA synchronous = NORMAL");
+    }
+    ~WithoutWaiting() { database_.tryExec("PRAGMA synchronous = FULL"); }
+    WithoutWaiting(const WithoutWaiting &) = delete;
+    WithoutWaiting &operator=(const WithoutWaiting &) = delete;
+
+private:
+    SQLite::Database &database_;
+};
+
+} // namespace
+
 Store::Store(const std::string &path)
 {
     try {
@@ -167,6 +192,24 @@ std::optional<Record> Store::findByTag(const std::string &app, const std::string
     statement.bind(1, app);
     statement.bind(2, tag);
     return statement.executeStep() ? std::optional(recordOf(statement)) : std::nullopt;
+}
+
+std::optional<std::string> Store::posterOf(int64_t id) const
+{
+    SQLite::Statement statement(*database_, "SELECT app FROM notification WHERE id = ?");
+    statement.bind(1, id);
+    return statement.executeStep() ? std::optional(statement.getColumn(0).getString())
+                                   : std::nullopt;
+}
+
+std::optional<int64_t> Store::idOfTag(const std::string &app, const std::string &tag) const
+{
+    SQLite::Statement statement(*database_,
+                                "SELECT id FROM notification WHERE app = ? AND tag = ?");
+    statement.bind(1, app);
+    statement.bind(2, tag);
+    return statement.executeStep() ? std::optional(statement.getColumn(0).getInt64())
+                                   : std::nullopt;
 }
 
 std::vector<Record> Store::list(const std::string &app) const
@@ -209,8 +252,13 @@ void Store::post(Event &event)
     transaction.commit();
 }
 
+// How far an upload is comes many times a second, while its poster waits, and is worth nothing
+// after a power cut: only that there is such a notification is.
 void Store::update(Event &event)
 {
+    std::optional<WithoutWaiting> hasty;
+    if (event.record.type == NOTIFICATION_TYPE_ONGOING)
+        hasty.emplace(*database_);
     SQLite::Transaction transaction(*database_);
     database_->change(event.record);
     database_->appendHistory(event);

@@ -32,12 +32,16 @@ public:
 
     std::optional<Record> find(int64_t id) const;
     std::optional<Record> findByTag(const std::string &app, const std::string &tag) const;
+    // Who posted it, and what carries a tag, without reading the content.
+    std::optional<std::string> posterOf(int64_t id) const;
+    std::optional<int64_t> idOfTag(const std::string &app, const std::string &tag) const;
     // Oldest first; of all applications when app is empty.
     std::vector<Record> list(const std::string &app) const;
     std::vector<Variant> history() const;
 
     // Gives the event's record a new id, never used before, and removes event.replaced.
     void post(Event &event);
+    // A change of what goes on may be lost in a power cut, not when the panel is killed.
     void update(Event &event);
     // Removes the event's record.
     void remove(Event &event);
