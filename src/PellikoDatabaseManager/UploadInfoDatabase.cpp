@@ -18,6 +18,7 @@ namespace
 {
 
 constexpr const char *databasePath = "/opt/usr/apps/com.velmora.pelliko/data/.pelliko.db";
+constexpr const char *brokenPath = "/opt/usr/apps/com.velmora.pelliko/data/.pelliko.db.broken";
 constexpr const char *tableName = "UPLOAD_INFO";
 
 struct SqliteFree {
@@ -32,7 +33,7 @@ struct ExecResult {
     const char *text() const { return textOrNull(error.get()); }
 };
 
-sqlite3 *_openDatabase()
+sqlite3 *_openFile()
 {
     sqlite3 *handle = nullptr;
     if (sqlite3_open(databasePath, &handle) != SQLITE_OK) {
@@ -40,6 +41,35 @@ sqlite3 *_openDatabase()
         sqlite3_close(handle);
         return nullptr;
     }
+    return handle;
+}
+
+bool _isDamaged(sqlite3 *handle)
+{
+    sqlite3_stmt *check = nullptr;
+    int code = sqlite3_prepare_v2(handle, "PRAGMA quick_check(1)", -1, &check, nullptr);
+    if (code == SQLITE_OK)
+        code = sqlite3_step(check);
+    const bool sound =
+        code != SQLITE_ROW ||
+        strcmp(reinterpret_cast<const char *>(sqlite3_column_text(check, 0)), "ok") == 0;
+    sqlite3_finalize(check);
+    return !sound || code == SQLITE_NOTADB || code == SQLITE_CORRUPT;
+}
+
+// An upload that has no row is given up when a restart interrupts it: a file that takes no rows
+// any more must not stay.
+sqlite3 *_openDatabase()
+{
+    sqlite3 *handle = _openFile();
+    if (handle && _isDamaged(handle)) {
+        LOG_ERROR("DB is damaged, it is kept as %s", brokenPath);
+        sqlite3_close(handle);
+        rename(databasePath, brokenPath);
+        handle = _openFile();
+    }
+    if (!handle)
+        return nullptr;
     // The insert writes texts in double quotes; a library may be built to refuse that.
     sqlite3_db_config(handle, SQLITE_DBCONFIG_DQS_DML, 1, nullptr);
     LOG_DEBUG("DB Opened Successfully.");

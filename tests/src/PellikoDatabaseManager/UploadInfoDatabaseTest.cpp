@@ -5,6 +5,7 @@
 
 #include <cstdlib>
 #include <filesystem>
+#include <fstream>
 #include <glib.h>
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
@@ -18,6 +19,7 @@ namespace
 namespace fs = std::filesystem;
 using test::FileLog;
 using test::holdsInFreshProcess;
+using ::testing::Contains;
 using ::testing::ElementsAre;
 using ::testing::HasSubstr;
 using ::testing::IsEmpty;
@@ -105,6 +107,30 @@ TEST(UploadInfoDatabaseFile, CreatesTheTableAndSaysWhatItRan)
                                                 "Table UPLOAD_INFO created successfully"));
         EXPECT_TRUE(fs::exists(databasePath));
     }));
+}
+
+TEST(UploadInfoDatabaseFile, DamagedFileIsKeptAsideAndAFreshOneBegins)
+{
+    const std::string broken = std::string(databasePath) + ".broken";
+    // What is no database at all, and one with a page that cannot be read.
+    for (const std::streamoff place : {0, 4096}) {
+        fs::remove(databasePath);
+        EXPECT_TRUE(holdsInFreshProcess([] { EXPECT_TRUE(createTableUploadInfoDb()); }));
+        std::fstream(databasePath, std::ios::in | std::ios::out | std::ios::binary).seekp(place)
+            << std::string(2000, 'x');
+        EXPECT_TRUE(holdsInFreshProcess([] {
+            const FileLog log;
+            EXPECT_TRUE(createTableUploadInfoDb());
+            UploadNotiData node{};
+            node.request_id = 7;
+            writeUploadDataToDb(&node);
+            EXPECT_TRUE(readUploadDataFromDb());
+            EXPECT_THAT(log.messages(), Contains("DB is damaged, it is kept as " +
+                                                 std::string(databasePath) + ".broken"));
+        }));
+        EXPECT_TRUE(fs::remove(broken));
+    }
+    fs::remove(databasePath);
 }
 
 TEST(UploadInfoDatabaseFile, FailedOpeningIsNotTriedAgain)
