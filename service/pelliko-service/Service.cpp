@@ -215,6 +215,8 @@ int runService(const Settings &settings)
     run.object.reset();
     run.engine.reset();
     run.shares.reset();
+    // Who still waited was answered just now.
+    g_dbus_connection_flush_sync(bus, nullptr, nullptr);
     return run.status;
 }
 

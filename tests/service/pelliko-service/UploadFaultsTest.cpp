@@ -1,5 +1,6 @@
 #include "FaultPlan.h"
 #include "World.h"
+#include "pelliko_shares.h"
 
 #include <JsonValue.h>
 #include <gmock/gmock.h>
@@ -30,6 +31,22 @@ protected:
     size_t sharesOnServer()
     {
         return JsonValue::parse(askServer("GET", "/api/v1/shares"))["shares"].size();
+    }
+
+    static void onSentList(int result, const pelliko_sent_share_s *, int, void *data)
+    {
+        *static_cast<int *>(data) = result;
+    }
+
+    // On the connection of the client library, behind everything that it has sent.
+    static bool answersToPing()
+    {
+        g_autoptr(GDBusConnection) bus = g_bus_get_sync(G_BUS_TYPE_SESSION, nullptr, nullptr);
+        g_autoptr(GVariant) reply = g_dbus_connection_call_sync(
+            bus, "com.velmora.pelliko.Service", "/com/velmora/pelliko/Service",
+            "org.freedesktop.DBus.Peer", "Ping", nullptr, nullptr, G_DBUS_CALL_FLAGS_NONE, -1,
+            nullptr, nullptr);
+        return reply != nullptr;
     }
 };
 } // namespace
@@ -157,24 +174,38 @@ TEST_F(UploadFaults, aQueueThatIsLockedMakesTheServiceSayThatItInitializes)
     makeAccount();
     startService();
     service_->end(SIGTERM);
-    Process locker({"/usr/bin/python3", "-c",
-                    "import sqlite3, sys, signal\n"
-                    "db = sqlite3.connect(sys.argv[1], isolation_level=None)\n"
-                    "db.execute('PRAGMA locking_mode = EXCLUSIVE')\n"
-                    "db.execute('BEGIN EXCLUSIVE')\n"
-                    "print('locked', flush=True)\n"
-                    "signal.pause()\n",
-                    folder_ + "/queue.db"});
-    ASSERT_TRUE(runUntil([&] { return !locker.lines().empty(); }));
+    const auto locker = lockQueue();
     startService();
+    int listed = 1;
+    pelliko_shares_list_sent(onSentList, &listed, nullptr);
     int32_t id = 3;
     EXPECT_EQ(request({makeFile("photo.jpg", 100)}, &id), PELLIKO_ERROR_SERVICE_INITIALIZING);
     EXPECT_EQ(id, 3);
-    locker.end(SIGKILL);
+    runUntil([] { return !g_main_context_pending(nullptr); });
+    EXPECT_EQ(listed, 1) << "nobody is held up by a list, so it waits for the queue";
+    locker->end(SIGKILL);
+    EXPECT_TRUE(runUntil([&] { return listed == 0; }));
     RecordingApplication application;
     ASSERT_TRUE(runUntil([&] { return request({makeFile("photo.jpg", 100)}, &id) == 0; }));
     ASSERT_TRUE(waitForEnd(id));
     EXPECT_EQ(reportsOf(id).back().status, 7);
+}
+
+TEST_F(UploadFaults, aServiceThatEndsBeforeItsQueueIsLoadedTellsWhoWaitsForAList)
+{
+    startServer();
+    makeAccount();
+    startService();
+    service_->end(SIGTERM);
+    const auto locker = lockQueue();
+    startService();
+    int listed = 1;
+    pelliko_shares_list_sent(onSentList, &listed, nullptr);
+    // A call that comes after it is there, so the service has the first one too.
+    ASSERT_TRUE(answersToPing());
+    service_->end(SIGTERM);
+    EXPECT_TRUE(runUntil([&] { return listed != 1; }));
+    EXPECT_EQ(listed, PELLIKO_ERROR_SERVICE_INITIALIZING);
 }
 
 TEST_F(UploadFaults, aFullDiskRefusesWhatIsNewAndHoldsWhatIsKnown)

@@ -240,6 +240,21 @@ std::string World::smallDisk(int64_t bytes)
     return "/proc/" + std::to_string(pid) + "/root" + queueFolder_;
 }
 
+std::unique_ptr<Process> World::lockQueue()
+{
+    auto locker = std::make_unique<Process>(
+        std::vector<std::string>{"/usr/bin/python3", "-c",
+                                 "import sqlite3, sys, signal\n"
+                                 "db = sqlite3.connect(sys.argv[1], isolation_level=None)\n"
+                                 "db.execute('PRAGMA locking_mode = EXCLUSIVE')\n"
+                                 "db.execute('BEGIN EXCLUSIVE')\n"
+                                 "print('locked', flush=True)\n"
+                                 "signal.pause()\n",
+                                 folder_ + "/queue.db"});
+    EXPECT_TRUE(runUntil([&] { return !locker->lines().empty(); }));
+    return locker;
+}
+
 std::string World::makeFile(const std::string &name, int64_t size)
 {
     const std::string path = folder_ + "/" + name;

@@ -84,6 +84,9 @@ protected:
     std::string smallDisk(int64_t bytes);
 
     std::string makeFile(const std::string &name, int64_t size);
+    /** The queue is locked by another program, as by a backup, until that ends. */
+    std::unique_ptr<Process> lockQueue();
+
     /** Asks for an upload to the two usual recipients. */
     int request(const std::vector<std::string> &files, int32_t *id, bool wifiOnly = false);
     /** The same to others: sender's country code, empty for none, and number. */
