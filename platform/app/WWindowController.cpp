@@ -13,6 +13,18 @@ Elm_Win_Type hostType(Elm_Win_Type type)
     return static_cast<int>(type) == kHandsetNotificationType ? NOTIFICATION_WINDOW_TYPE : type;
 }
 
+// Windows of a handset are as large as its screen; a desktop leaves one that was given no size at a
+// single pixel.
+void giveSize(Evas_Object *window)
+{
+    int width = 0, height = 0;
+    evas_object_geometry_get(window, nullptr, nullptr, &width, &height);
+    if (width > 1 && height > 1)
+        return;
+    elm_win_screen_size_get(window, nullptr, nullptr, &width, &height);
+    evas_object_resize(window, width, height);
+}
+
 } // namespace
 
 WWindowController::WWindowController(const char *name, Elm_Win_Type type) : impl_(new Impl)
@@ -62,6 +74,7 @@ bool WWindowController::Impl::create()
     window = createWindow ? createWindow(name.c_str(), type) : nullptr;
     if (!window)
         return false;
+    giveSize(window);
     evas_object_event_callback_add(window, EVAS_CALLBACK_SHOW, onShowOrHide, this);
     evas_object_event_callback_add(window, EVAS_CALLBACK_HIDE, onShowOrHide, this);
     evas_object_event_callback_add(window, EVAS_CALLBACK_DEL, onDeleted, this);

@@ -164,6 +164,14 @@ private:
         kept_.clear();
     }
 
+    static bool fillsScreen(const Evas_Object *win)
+    {
+        int width = 0, height = 0, screen_width = 0, screen_height = 0;
+        evas_object_geometry_get(win, nullptr, nullptr, &width, &height);
+        elm_win_screen_size_get(win, nullptr, nullptr, &screen_width, &screen_height);
+        return width > 1 && width == screen_width && height == screen_height;
+    }
+
     void showWindow()
     {
         auto *controller =
@@ -181,7 +189,8 @@ private:
         Evas_Object *win = controller->getWindow();
         record("window " + std::to_string(attached) + " type " +
                std::to_string(elm_win_type_get(win)) + " found " +
-               std::to_string(getWindowController("recorder") == controller));
+               std::to_string(getWindowController("recorder") == controller) + " full " +
+               std::to_string(fillsScreen(win)));
         evas_object_hide(win);
         evas_object_del(win);
         record(controller->getWindow() ? "window stays" : "window gone");

@@ -13,7 +13,7 @@ TEST(Window, AttachingCreatesTheNotificationWindowAtOnce)
     std::vector<std::string> diary = app.diaryWith("ended");
     ASSERT_GT(diary.size(), 2U);
     diary.erase(diary.begin() + 1);
-    EXPECT_THAT(diary, testing::ElementsAre("create", "resume", "window 1 type 11 found 1", "pause",
-                                            "window gone", testing::StartsWith("later"),
+    EXPECT_THAT(diary, testing::ElementsAre("create", "resume", "window 1 type 11 found 1 full 1",
+                                            "pause", "window gone", testing::StartsWith("later"),
                                             "terminate", "ended 0"));
 }
