@@ -163,7 +163,9 @@ class Faults(share_case.ShareCase):
         self.assert_downloads_equal(self.messages(1)[0], {"concert.mp4": data})
         log = os.open(".app-logs/app.log", os.O_RDONLY, dir_fd=small)
         with os.fdopen(log, encoding="utf-8") as file:
-            self.assertIn("Upload ", file.read().rsplit("operation = ", 1)[1])
+            lines = file.read()
+        self.assertIn("Upload Complete. Updating notification", lines)
+        self.assertNotIn("Records created successfully", lines, "it was not as full as it should be")
 
 
 if __name__ == "__main__":

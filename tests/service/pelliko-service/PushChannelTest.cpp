@@ -160,6 +160,28 @@ TEST_F(Channel, aRefusalIsNotAskedAgainSoon)
     EXPECT_TRUE(connected());
 }
 
+TEST_F(Channel, aWishToBeLeftAloneOutlastsTheNetworkAndIsOneServers)
+{
+    const auto comeBack = [this] {
+        hands.gate.network = false;
+        channel.networkChanged();
+        hands.gate.network = true;
+        channel.networkChanged();
+    };
+    start();
+    hands.http.answer(503, "", {{"retry-after", "600"}});
+    comeBack();
+    EXPECT_FALSE(connected());
+    hands.timers.pass(599'999);
+    EXPECT_FALSE(connected());
+    hands.timers.pass(1);
+    EXPECT_TRUE(connected());
+    hands.http.answer(503, "", {{"retry-after", "600"}});
+    hands.account->server = "http://another";
+    channel.accountChanged();
+    EXPECT_TRUE(connected());
+}
+
 TEST_F(Channel, whatIsNoPushIsSkipped)
 {
     start();

@@ -136,6 +136,22 @@ TEST_F(OneRequest, withoutANetworkItWaitsForTheNetworkAlone)
     EXPECT_EQ(hands.http.open.size(), 1U);
 }
 
+TEST_F(OneRequest, aWishToBeLeftAloneOutlastsTheNetwork)
+{
+    begin(hands.queued("0123456789"));
+    hands.http.answer(503, "<html>", {{"retry-after", "600"}});
+    EXPECT_THAT(statuses(), ElementsAre(6)) << "so long a wait is told";
+    hands.gate.network = false;
+    request->networkChanged();
+    hands.gate.network = true;
+    request->networkChanged();
+    EXPECT_TRUE(hands.http.open.empty());
+    hands.timers.pass(599'999);
+    EXPECT_TRUE(hands.http.open.empty());
+    hands.timers.pass(1);
+    EXPECT_EQ(hands.http.oldest().method, "POST");
+}
+
 TEST_F(OneRequest, aRefusalEndsItAndLeavesNothingToWithdraw)
 {
     begin(hands.queued("0123456789"));
