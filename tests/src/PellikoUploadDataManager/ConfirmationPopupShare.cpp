@@ -39,17 +39,19 @@ TEST_F(ConfirmationPopup, ShareHandsTheFilesOverAndHides)
     EXPECT_EQ(lines.back(), "uploadStart ret = 0");
 }
 
-// All presses are on their way before the first one closes the popup.
+// Presses that were made before the popup closed may still be delivered while its button is in use.
 TEST_F(ConfirmationPopup, SeveralPressesInARowShareOnce)
 {
     service.answerRequests(0, 7);
     share(1, 1500, {{"Ann"}});
     ad->upload_item->files = eina_list_append(nullptr, g_strdup("/a/b.jpg"));
     openPopup();
+    Evas_Object *share_button = button("button2");
+    evas_object_ref(share_button);
     for (int i = 0; i < 3; ++i)
-        press(button("button2"));
-    ASSERT_TRUE(closes());
-    turnLoopOnce();
+        evas_object_smart_callback_call(share_button, "clicked", nullptr);
+    evas_object_unref(share_button);
+    EXPECT_EQ(ad->popup, nullptr);
     EXPECT_EQ(service.calls().size(), 1U);
 }
 
