@@ -216,8 +216,9 @@ Task<void> handleRequest(Exchange &exchange, Context &context)
     // Half of a body went out: only a cut tells the receiver that it is not whole.
     if (exchange.answered())
         throw Disconnected();
-    Response response =
-        isLinkPath(exchange.request()) ? errorPage(refusal) : errorResponse(refusal);
+    Response response = isLinkPath(exchange.request())
+                            ? errorPage(refusal, languageOf(exchange.request()))
+                            : errorResponse(refusal);
     if (exchange.request().path.rfind("/api/v1/uploads", 0) == 0)
         response.headers.push_back({"Tus-Resumable", tusVersion});
     co_await exchange.respond(std::move(response));

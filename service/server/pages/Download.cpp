@@ -132,7 +132,7 @@ Task<void> zipFile(Exchange &exchange, Context &context, ZipWriter &zip, FileRec
 Task<void> showLandingPage(Exchange &exchange, Context &context, std::string token)
 {
     const LinkRecord link = co_await findLiveLink(context, token);
-    co_await exchange.respond(landingPage(link, token));
+    co_await exchange.respond(landingPage(link, token, languageOf(exchange.request())));
 }
 
 Task<void> downloadFile(Exchange &exchange, Context &context, std::string token, std::size_t index)

@@ -2,6 +2,7 @@
 
 #include "http/Errors.h"
 #include "http/Message.h"
+#include "pages/PageLanguage.h"
 #include "store/Metadata.h"
 
 #include <string>
@@ -9,11 +10,15 @@
 namespace pelliko::server
 {
 
+/// The language that a request's reader prefers.
+[[nodiscard]] PageLanguage languageOf(const Request &request);
+
 /// The page behind a link: who sent it, the files, until when, and a button for everything. Works
 /// without script, in the dark and from 320 pixels on; links are relative to the page's address.
-[[nodiscard]] Response landingPage(const LinkRecord &link, const std::string &token);
+[[nodiscard]] Response landingPage(const LinkRecord &link, const std::string &token,
+                                   const PageLanguage &language);
 
 /// A refusal as a page for people.
-[[nodiscard]] Response errorPage(const Refusal &refusal);
+[[nodiscard]] Response errorPage(const Refusal &refusal, const PageLanguage &language);
 
 } // namespace pelliko::server
