@@ -129,7 +129,7 @@ TEST(PageLanguage, NoPageMixesInEnglish)
             EXPECT_THAT(page, Not(HasSubstr(words))) << catalogue.tag;
         for (const std::string &own : {errorPage(Refusal(Error::gone), language).body,
                                        errorPage(Refusal(Error::notFound), language).body}) {
-            for (const char *words : {"available", "sender", "link is not", "Nothing here"})
+            for (const char *words : {"available", "the sender", "link is not", "Nothing here"})
                 EXPECT_THAT(own, Not(HasSubstr(words))) << catalogue.tag;
         }
         EXPECT_THAT(errorPage(Refusal(Error::noSpace), language).body,
