@@ -84,6 +84,18 @@ class Downloads(ServerCase):
             self.assertEqual(answer.status, 404, path)
             self.assertIn(b"<h1>Nothing here</h1>", answer.body)
 
+    def test_pages_speak_the_language_that_the_browser_asks_for(self):
+        _, path = self.make_finished(b"12345")
+        for asked, tag, words in (("pl, en;q=0.5", "pl", "Pobierz (5 bajtów)"), ("sw", "en", "Download (5 bytes)"),
+                                  ("zh-HK", "zh-TW", "下載")):  # fmt: skip
+            page = self.get(path, Accept_Language=asked)
+            self.assertEqual(page.headers["Content-Language"], tag)
+            self.assertEqual(page.headers["Vary"], "Accept-Language")
+            self.assertIn(words, page.body.decode())
+        unknown = self.get("/s/" + "A" * 22, Accept_Language="ar")
+        self.assertEqual(unknown.status, 404)
+        self.assertIn('<html lang="ar" dir="rtl">', unknown.body.decode())
+
     def test_zip_of_all_has_every_file_under_its_own_name(self):
         contents = [os.urandom(1000000), b"two", b"", b"three"]
         names = ["写真.jpg", "a.txt", "a.txt", "A.TXT"]
