@@ -1,8 +1,8 @@
 // Launch requests between applications, and their replies.
 //
 // A handle may be used by one thread at a time; different handles, clones included, share nothing
-// that changes and may be used on different threads. Sending, answering and receiving belong to the
-// main loop. Nothing here needs the toolkit: callbacks come from GLib's default main context.
+// that changes and may be used on different threads. Sending and receiving belong to the main loop;
+// answering does not. No toolkit is needed: callbacks come from GLib's default main context.
 #pragma once
 
 #include "tizen.h"

@@ -19,4 +19,10 @@ std::string ModemTransport::send(const Sms &sms)
     return error ? *error : withoutModem_->send(sms);
 }
 
+Fate ModemTransport::fateOf(const Sms &sms)
+{
+    const Fate fate = withoutModem_->fateOf(sms);
+    return fate == Fate::NotTaken && modem::mayHaveModem() ? Fate::Unknown : fate;
+}
+
 } // namespace pelliko::messaging

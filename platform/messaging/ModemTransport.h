@@ -15,6 +15,9 @@ class ModemTransport : public SmsTransport
 public:
     explicit ModemTransport(std::unique_ptr<SmsTransport> withoutModem);
     std::string send(const Sms &sms) override;
+    // What a modem did with a message that nobody waited for is not known: its service has dropped
+    // it, or does not say whether it is still on its way.
+    Fate fateOf(const Sms &sms) override;
 
 private:
     std::unique_ptr<SmsTransport> withoutModem_;

@@ -5,6 +5,7 @@
 #include <cstring>
 #include <ctime>
 #include <filesystem>
+#include <fstream>
 
 #include <fcntl.h>
 #include <sys/file.h>
@@ -52,6 +53,12 @@ std::string utcNow()
     return text;
 }
 
+// A text cut in the middle of a character must still make a readable line.
+std::string written(const nlohmann::ordered_json &value)
+{
+    return value.dump(-1, ' ', false, nlohmann::json::error_handler_t::replace);
+}
+
 std::string lineFor(const Sms &sms)
 {
     nlohmann::ordered_json record;
@@ -59,8 +66,29 @@ std::string lineFor(const Sms &sms)
     record["text"] = sms.text;
     record["sim"] = sms.sim;
     record["time"] = utcNow();
-    // A text cut in the middle of a character must still make a readable line.
-    return record.dump(-1, ' ', false, nlohmann::json::error_handler_t::replace) + "\n";
+    return written(record) + "\n";
+}
+
+// The beginning that all lines of the message to that number with that text have in common.
+std::string beginningOf(const Sms &sms)
+{
+    nlohmann::ordered_json record;
+    record["to"] = sms.to;
+    record["text"] = sms.text;
+    std::string text = written(record);
+    text.back() = ',';
+    return text;
+}
+
+// Half a line is no message: its writer was killed, and nobody will read it.
+bool hasLine(std::istream &lines, const std::string &beginning)
+{
+    std::string line;
+    while (std::getline(lines, line)) {
+        if (line.starts_with(beginning) && line.back() == '}')
+            return true;
+    }
+    return false;
 }
 
 // A writer that was killed may have left half a line; the new one then starts on its own.
@@ -97,6 +125,24 @@ std::string OutboxTransport::defaultPath()
     if (path && *path)
         return path;
     return std::filesystem::path(platform::stateDirectory()) / "sms-outbox.jsonl";
+}
+
+Fate OutboxTransport::fateOf(const Sms &sms)
+{
+    const Descriptor file(open(path_.c_str(), O_RDWR | O_CLOEXEC));
+    if (file.get() < 0)
+        return errno == ENOENT ? Fate::NotTaken : Fate::Unknown;
+    // A writer that was killed has lost its lock by now; one that lives is waited for.
+    if (flock(file.get(), LOCK_EX) != 0)
+        return Fate::Unknown;
+    std::ifstream lines(path_);
+    const bool found = hasLine(lines, beginningOf(sms));
+    if (lines.bad() || !lines.is_open())
+        return Fate::Unknown;
+    if (!found)
+        return Fate::NotTaken;
+    // Its writer may not have come to this.
+    return fsync(file.get()) == 0 ? Fate::Taken : Fate::Unknown;
 }
 
 std::string OutboxTransport::send(const Sms &sms)

@@ -13,6 +13,7 @@ class OutboxTransport : public SmsTransport
 public:
     explicit OutboxTransport(std::string path);
     std::string send(const Sms &sms) override;
+    Fate fateOf(const Sms &sms) override;
 
     // $PELLIKO_SMS_OUTBOX, else sms-outbox.jsonl in the platform's state directory.
     static std::string defaultPath();

@@ -7,6 +7,7 @@
 #include "OutboxTransport.h"
 #include "Structure.h"
 #include "msg.h"
+#include "msg_fate.h"
 #include "msg_transport.h"
 
 using namespace pelliko::messaging;
@@ -47,6 +48,19 @@ int deliverRequest(const Service &service, const Structure &request)
     return message ? deliver(*service.transport, *message) : MSG_ERR_INVALID_PARAMETER;
 }
 
+msg_fate_e answerOf(Fate fate)
+{
+    switch (fate) {
+    case Fate::Taken:
+        return MSG_FATE_TAKEN;
+    case Fate::NotTaken:
+        return MSG_FATE_NOT_TAKEN;
+    case Fate::Unknown:
+        break;
+    }
+    return MSG_FATE_UNKNOWN;
+}
+
 } // namespace
 
 extern "C" {
@@ -83,6 +97,18 @@ int msg_sms_send_message(msg_handle_t handle, msg_struct_t request)
     } catch (const std::exception &error) {
         std::fprintf(stderr, "messaging: %s\n", error.what());
         return MSG_ERR_UNKNOWN;
+    }
+}
+
+msg_fate_e msg_sms_fate(msg_handle_t handle, const char *number, const char *text)
+{
+    if (!handle || !number || !text)
+        return MSG_FATE_UNKNOWN;
+    try {
+        return answerOf(static_cast<Service *>(handle)->transport->fateOf({number, text, 1}));
+    } catch (const std::exception &error) {
+        std::fprintf(stderr, "messaging: %s\n", error.what());
+        return MSG_FATE_UNKNOWN;
     }
 }
 }

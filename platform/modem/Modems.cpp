@@ -51,6 +51,17 @@ bool anySimReady(const ModemList &list)
                        [](const Modem &modem) { return modem.sim == SimState::Ready; });
 }
 
+bool mayHaveModem()
+{
+    for (const auto &service : knownServices()) {
+        startOnSystemBus(service->busName());
+        const std::optional<ModemList> list = service->read();
+        if (list && (!list->modems.empty() || !list->error.empty()))
+            return true;
+    }
+    return false;
+}
+
 std::optional<std::string> sendThroughModem(int slot, const std::string &to,
                                             const std::string &text)
 {

@@ -22,6 +22,10 @@ ModemList currentModems();
 /// Whether a SIM of `list` can be used.
 bool anySimReady(const ModemList &list);
 
+/// Whether sendThroughModem would use a modem, or cannot tell because a service does not answer.
+/// Starts a modem service that is installed but not running. Any thread, blocks for a bounded time.
+bool mayHaveModem();
+
 /// Sends through the modem of `slot` (counted from 0): empty on success, else one sentence; nothing
 /// when the machine has no modem (the account's SIM is none). Starts a modem service that is
 /// installed but not running. Any thread, blocks for a bounded time, needs no main loop.

@@ -6,6 +6,7 @@
 
 #include "ModemManagerDouble.h"
 #include "ModemManagerService.h"
+#include "msg_fate.h"
 
 namespace
 {
@@ -200,4 +201,15 @@ TEST(ModemManagerSms, GoesToANumberOnly)
     EXPECT_EQ(send(0, "Hello", ""), "the number cannot be a phone number");
     EXPECT_EQ(send(0, "Hello", "+49\xFF"), "the number cannot be a phone number");
     EXPECT_THAT(service.attempts(), IsEmpty());
+}
+
+TEST(ModemManagerSms, HasNoKnownFateWhenItsSenderDied)
+{
+    msg_handle_t handle = nullptr;
+    ASSERT_EQ(msg_open_msg_handle(&handle), MSG_SUCCESS);
+    ModemManagerDouble service;
+    EXPECT_EQ(msg_sms_fate(handle, number, "text"), MSG_FATE_NOT_TAKEN) << "there is no modem yet";
+    service.addModem(1);
+    EXPECT_EQ(msg_sms_fate(handle, number, "text"), MSG_FATE_UNKNOWN);
+    msg_close_msg_handle(&handle);
 }
