@@ -77,14 +77,12 @@ void ResumeLauncher::onClaimTime()
     lookAfter(0); // others may have lost their listener meanwhile
 }
 
+// One that ends while the next look is waited for was there for something else, such as the
+// messages of a share: that says nothing about how often to ask.
 void ResumeLauncher::applicationGone()
 {
     if (step_ == Step::claiming) {
         onEndedWithoutClaim();
-    } else if (step_ == Step::waiting) {
-        // It was busy with something else; a fresh one answers.
-        context_.timers.cancel(std::exchange(timer_, 0));
-        again();
     }
 }
 

@@ -100,6 +100,18 @@ TEST_F(Resume, crashesAfterClaimingNeverGiveARequestUp)
         << "the launches come more and more slowly";
 }
 
+TEST_F(Resume, anApplicationThatCameForSomethingElseDelaysNothing)
+{
+    launcher.lookSoon();
+    const int64_t wait = hands.timers.next();
+    for (int i = 0; i < 5; ++i) {
+        launcher.applicationGone();
+    }
+    EXPECT_EQ(hands.timers.next(), wait);
+    hands.timers.pass(wait);
+    EXPECT_EQ(launches(), 1U);
+}
+
 TEST_F(Resume, withoutOrphansNothingIsLaunched)
 {
     open.clear();
