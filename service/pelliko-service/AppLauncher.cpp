@@ -15,6 +15,8 @@ constexpr const char *operationDefault = "http://tizen.org/appcontrol/operation/
 constexpr const char *operationSend = "http://tizen.org/appcontrol/operation/send";
 constexpr const char *operationSendText = "http://tizen.org/appcontrol/operation/send_text";
 
+constexpr gint resultFailed = -1;
+
 // Owns the reply or the error of one launch while it is looked at.
 using Answered = std::function<void(GVariant *reply, const GError *error)>;
 
@@ -89,6 +91,32 @@ Answered receiptFor(std::function<void(LaunchResult)> done)
     };
 }
 
+LaunchResult resultOf(GVariant *reply)
+{
+    gint result = -1;
+    g_variant_get(reply, "(i@a{sv})", &result, nullptr);
+    switch (result) {
+    case 0:
+        return LaunchResult::received;
+    case resultFailed:
+        return LaunchResult::notSent;
+    default: // it ended, or let go of the request, without a word about the messages
+        return LaunchResult::unknown;
+    }
+}
+
+// The messages are settled when the application says so, which may be minutes after the launch.
+Answered settlementFor(std::function<void(LaunchResult)> done)
+{
+    return [receipt = receiptFor(done), done](GVariant *reply, const GError *error) {
+        if (reply) {
+            done(resultOf(reply));
+        } else {
+            receipt(nullptr, error);
+        }
+    };
+}
+
 bool saysResumed(GVariant *reply)
 {
     gint result = -1;
@@ -133,10 +161,11 @@ void AppLauncher::launchSms(const SmsLaunch &data, std::function<void(LaunchResu
     addText(extras, "from_msisdn", data.from);
     addText(extras, "expired_time", std::to_string(data.expires));
     addText(extras, "req_id", std::to_string(data.id));
+    addText(extras, "sms_key", data.key);
     addText(extras, "file_count", std::to_string(data.fileCount));
     addTexts(extras, "to_msisdn", data.numbers);
-    launch(bus_, operationSendText, g_variant_builder_end(&extras), false,
-           receiptFor(std::move(done)));
+    launch(bus_, operationSendText, g_variant_builder_end(&extras), true,
+           settlementFor(std::move(done)));
 }
 
 void AppLauncher::launchPush(const std::vector<std::string> &tokens,

@@ -11,6 +11,7 @@ namespace pelliko::service
 /** What the application is told when its messages are wanted. */
 struct SmsLaunch {
     int32_t id = 0;
+    std::string key; ///< the same for every launch of this share, and of no other
     std::string url;
     std::string from; ///< the user's own number
     int64_t expires = 0;
@@ -19,9 +20,9 @@ struct SmsLaunch {
 };
 
 enum class LaunchResult {
-    received, ///< the application has taken the launch
-    notSent,  ///< the application surely did not get it
-    unknown   ///< the receipt is missing; the application may have got it
+    received, ///< the application has taken the launch; for messages: it has settled them all
+    notSent,  ///< the application surely did not get it, or said that it must be asked again
+    unknown   ///< the answer is missing; the application may have got it
 };
 
 /** Launches the application. Belongs to the main loop; the results come from there, never from
@@ -31,6 +32,8 @@ class Launcher
 public:
     virtual ~Launcher() = default;
 
+    /** Asks for a share's messages; the answer comes when the last of them is settled. A repeated
+     * launch sends only what is still owed. */
     virtual void launchSms(const SmsLaunch &launch, std::function<void(LaunchResult)> done) = 0;
 
     /** Tells of received shares. */

@@ -8,8 +8,7 @@ namespace pelliko::service
 {
 namespace
 {
-// An application that ends each time before it confirms may have sent each time: better few than
-// many.
+// An application that ends each time before it answers is broken: it is not started for ever.
 constexpr int mostLaunches = 5;
 } // namespace
 
@@ -29,7 +28,7 @@ void SmsDelivery::start(std::function<void(bool)> done)
 {
     done_ = std::move(done);
     if (request_.smsState == SmsState::launching) {
-        g_message("request %d: no receipt of the launch is known, it is repeated", request_.id);
+        g_message("request %d: no answer to the launch is known, it is repeated", request_.id);
     }
     timer_ = context_.timers.after(0, [this] { launch(); });
 }
@@ -42,7 +41,7 @@ void SmsDelivery::launch()
         return;
     }
     if (request_.smsAttempts >= mostLaunches) {
-        giveUp("the application never confirmed its launch");
+        giveUp("the application never settled them");
         return;
     }
     const auto account = context_.account();
@@ -50,11 +49,9 @@ void SmsDelivery::launch()
         again([this] { launch(); });
         return;
     }
-    const SmsLaunch data{request_.id,
-                         request_.url,
-                         account->number,
-                         request_.expires,
-                         static_cast<int>(request_.files.size()),
+    const SmsLaunch data{request_.id,        request_.key,
+                         request_.url,       account->number,
+                         request_.expires,   static_cast<int>(request_.files.size()),
                          request_.smsNumbers};
     context_.launcher.launchSms(data,
                                 [this, alive = std::weak_ptr<bool>(alive_)](LaunchResult result) {

@@ -8,7 +8,8 @@ namespace pelliko::service
 
 /**
  * Has the application send the messages of a finished share. Each step is on disk before the next:
- * a launch whose receipt is stored is never repeated, one without is. Ends when it is destroyed.
+ * a launch whose answer is stored is never repeated, one without is; the application knows what it
+ * has sent. Ends when it is destroyed.
  */
 class SmsDelivery
 {
@@ -19,7 +20,7 @@ public:
     SmsDelivery(const SmsDelivery &) = delete;
     SmsDelivery &operator=(const SmsDelivery &) = delete;
 
-    /** Begins. @param done receives whether the launch was received; not called from inside */
+    /** Begins. @param done receives whether the messages are settled; not called from inside */
     void start(std::function<void(bool received)> done);
 
 private:

@@ -28,8 +28,8 @@ enum class RequestState {
 enum class SmsState {
     none,      ///< nobody is told by SMS
     wanted,    ///< the application has not been launched, or surely did not get the launch
-    launching, ///< a launch was sent; no receipt is known
-    delivered  ///< the application has confirmed the launch
+    launching, ///< a launch was sent; no answer is known
+    delivered  ///< the application has settled every message
 };
 
 /** A file of a request; a size of -1 means that it was no readable file when it was asked for. */
@@ -55,12 +55,12 @@ struct QueuedRequest {
     std::vector<Recipient> recipients;
     bool wifiOnly = false;
     std::string reshareOf;
-    std::string key;   ///< makes creating the share repeatable
+    std::string key;   ///< random; makes creating the share and sending its messages repeatable
     std::string share; ///< the server's name, empty until it is known
     std::string url;   ///< the link, kept until the messages are on their way
     int64_t expires = 0;
     SmsState smsState = SmsState::none;
-    int smsAttempts = 0; ///< launches without a receipt
+    int smsAttempts = 0; ///< launches without an answer
     std::vector<std::string> smsNumbers;
     int endStatus = 0; ///< a PellikoUploadStatus once it has ended
     int error = 0;

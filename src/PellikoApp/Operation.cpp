@@ -109,11 +109,11 @@ void _doDefault(PellikoAppData *ad)
 void _doSendSms(PellikoAppData *ad)
 {
     LOG_DEBUG("Send SMS to receiver");
-    if (startDetachedWorker([job = makeSmsJob(ad)] { runSmsJob(job); }))
+    const SmsJob job = makeSmsJob(ad);
+    if (startDetachedWorker([job] { runSmsJob(job); }))
         LOG_DEBUG("operation_type=[%d]", ad->operation_type);
     else
-        updatePreference(); // as after messages that could not be sent: the process must not wait
-                            // for them
+        endSmsJob(job, false);
 }
 
 void _leaveRefusedShare(PellikoAppData *ad)

@@ -1,7 +1,9 @@
 #include "PellikoApp/SmsSender.h"
 
 #include "AppLog/AppLog.h"
+#include "PellikoApp/CText.h"
 #include "PellikoApp/Decimal.h"
+#include "PellikoApp/OwedMessages.h"
 #include "PellikoApp/TextFormat.h"
 #include "PellikoUploadManager/UsagePreferences.h"
 #include "PellikoVelmoraLog/PellikoVelmoraLog.h"
@@ -21,6 +23,7 @@ namespace
 
 constexpr const char *textId =
     "IDS_RSH_BODY_FILES_HAVE_BEEN_SHARED_VIA_PELLIKO_C_NP1SS_HEXPIRES_C_P2SS_ABB";
+constexpr const char *keyOfShare = "sms_key";
 constexpr size_t textSize = 256; ///< bytes of a message with its terminator
 constexpr size_t dateSize = 32;
 constexpr size_t secondsDigits = 10; ///< what follows in expired_time are milliseconds
@@ -98,7 +101,7 @@ void _fillMessage(msg_struct_t message, const char *number, const char *text, in
     _setText(address, MSG_ADDRESS_INFO_ADDRESS_VALUE_STR, number);
 }
 
-void _sendOne(msg_handle_t handle, const char *number, const char *text, int32_t sim_index)
+bool _sendOne(msg_handle_t handle, const char *number, const char *text, int32_t sim_index)
 {
     msg_struct_t message = msg_create_struct(MSG_STRUCT_MESSAGE_INFO);
     _fillMessage(message, number, text, sim_index);
@@ -109,10 +112,24 @@ void _sendOne(msg_handle_t handle, const char *number, const char *text, int32_t
     msg_set_bool_value(options, MSG_SEND_OPT_SETTING_BOOL, false);
     msg_set_struct_handle(request, MSG_REQUEST_MESSAGE_HND, message);
 
-    if (msg_sms_send_message(handle, request) != MSG_SUCCESS)
+    const bool sent = msg_sms_send_message(handle, request) == MSG_SUCCESS;
+    if (!sent)
         LOG_ERROR("msg_sms_send_message Failed");
     msg_release_struct(&request);
     msg_release_struct(&message);
+    return sent;
+}
+
+// Not kept in the record: a request without a key must not be taken for a repetition.
+void _readKey(app_control_h request, SmsJob &job)
+{
+    char *key = nullptr;
+    if (!request || app_control_get_extra_data(request, keyOfShare, &key) != APP_CONTROL_ERROR_NONE)
+        return;
+    job.journal_key = CText(key).get();
+    app_control_h clone = nullptr;
+    if (app_control_clone(&clone, request) == APP_CONTROL_ERROR_NONE)
+        job.request.reset(clone, app_control_destroy);
 }
 
 } // namespace
@@ -162,34 +179,62 @@ SmsJob makeSmsJob(const PellikoAppData *ad)
     job.expired_time = _copy(ad->expired_time);
     job.sim_index = ad->sim_index;
     job.text_format = translated(textId);
+    _readKey(ad->app_control, job);
     return job;
 }
 
-void _sendSms(const SmsJob &job)
+bool _sendSms(const SmsJob &job)
 {
     if (!job.from_msisdn || job.to_msisdn_list.empty() || !job.url || job.file_count == 0) {
         LOG_ERROR("Fail:Invalid Input Parameter");
-        return;
+        return true;
     }
     msg_handle_t handle = nullptr;
     if (msg_open_msg_handle(&handle) != MSG_SUCCESS) {
         LOG_ERROR("msg_open_msg_handle Failed");
-        return;
+        return false;
     }
     char text[textSize];
     _buildText(job, text);
     LOG_DEBUG("to_msisdn_count=%d", static_cast<int>(job.to_msisdn_list.size()));
-    for (const std::string &number : job.to_msisdn_list)
-        _sendOne(handle, number.c_str(), text, job.sim_index);
+    OwedMessages owed(job.journal_key, handle, text);
+    for (const std::string &number : job.to_msisdn_list) {
+        if (owed.take(number))
+            owed.settle(number, _sendOne(handle, number.c_str(), text, job.sim_index));
+    }
     if (msg_close_msg_handle(&handle) != MSG_SUCCESS)
         LOG_ERROR("msg_close_msg_handle Failed");
     PellikoVelmoraLog::getInstance()->insertVelmoraLogSendSms();
+    return owed.complete();
+}
+
+namespace
+{
+
+void _answer(const SmsJob &job, bool settled)
+{
+    app_control_h reply = nullptr;
+    if (!job.request || app_control_create(&reply) != APP_CONTROL_ERROR_NONE)
+        return;
+    const int error = app_control_reply_to_launch_request(reply, job.request.get(),
+                                                          settled ? APP_CONTROL_RESULT_SUCCEEDED
+                                                                  : APP_CONTROL_RESULT_FAILED);
+    LOG_DEBUG("messages settled = %d, answer = %d", settled, error);
+    app_control_destroy(reply);
+}
+
+} // namespace
+
+void endSmsJob(const SmsJob &job, bool settled)
+{
+    // The announcement may end the process, so the answer comes before it.
+    _answer(job, settled);
+    updatePreference();
 }
 
 void runSmsJob(const SmsJob &job)
 {
-    _sendSms(job);
-    updatePreference();
+    endSmsJob(job, _sendSms(job));
 }
 
 } // namespace pelliko

@@ -4,6 +4,7 @@
 
 #include <app_control.h>
 #include <cstdint>
+#include <memory>
 #include <optional>
 #include <string>
 #include <vector>
@@ -25,6 +26,10 @@ struct SmsJob {
     std::optional<std::string> expired_time; ///< decimal seconds since the epoch, or milliseconds
     int32_t sim_index = 0;                   ///< SIM slot, from 0
     std::string text_format;                 ///< translated; takes the address and the date
+    /// The share's name in the journal of messages; empty: whoever asks again gets them again.
+    std::string journal_key;
+    /// Who asked and wants to know when the messages are settled; none without a key.
+    std::shared_ptr<app_control_s> request;
 };
 
 /// Reads the data of a "send_text" request into the record; what the request does not carry keeps
@@ -39,11 +44,15 @@ void _parseSmsTo(PellikoAppData *ad, app_control_h request);
 SmsJob makeSmsJob(const PellikoAppData *ad);
 
 /// Sends one message per recipient; blocks until the messaging service has accepted or refused each
-/// of them. Failures are logged only. Any thread.
-void _sendSms(const SmsJob &job);
+/// of them. Failures are logged only. With a key, messages that were settled before are left out;
+/// false when one could not be sent because the journal cannot be used. Any thread.
+bool _sendSms(const SmsJob &job);
 
-/// What the worker does: sends, then announces that the messages are done, also when sending
-/// failed. Any thread.
+/// The end of a round of messages: tells who asked for it that all are settled, or that they must
+/// be asked for again, then announces that the messages are done. Any thread.
+void endSmsJob(const SmsJob &job, bool settled);
+
+/// What the worker does: sends, then ends the round, also when sending failed. Any thread.
 void runSmsJob(const SmsJob &job);
 
 } // namespace pelliko

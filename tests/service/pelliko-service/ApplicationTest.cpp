@@ -188,3 +188,25 @@ TEST_F(ApplicationLaunch, aLaunchWithoutReceiptIsRepeatedAndOneWithIsNot)
     ASSERT_EQ(count(*application, operationSendText), 2U) << "only the second request was told";
     EXPECT_EQ(application->launches.back().texts.at("req_id"), std::to_string(next));
 }
+
+TEST_F(ApplicationLaunch, messagesThatWereNotSettledAreAskedForAgainBeforeTheShareEnds)
+{
+    startServer();
+    makeAccount();
+    startService();
+    RecordingApplication application;
+    application.messagesResult = -1;
+    std::vector<int> reported;
+    int32_t id = 0;
+    application.onLaunch = [&](const SeenLaunch &) {
+        reported = statusesOf(id);
+        application.messagesResult = 0;
+    };
+    ASSERT_EQ(request({makeFile("photo.jpg", 1000)}, &id), 0);
+    ASSERT_TRUE(waitForEnd(id));
+    EXPECT_EQ(reported.back(), 3) << "the share had not ended when it asked again";
+    EXPECT_EQ(reportsOf(id).back().status, 7);
+    ASSERT_EQ(count(application, operationSendText), 2U);
+    EXPECT_EQ(application.launches[0].texts.at("sms_key"),
+              application.launches[1].texts.at("sms_key"));
+}

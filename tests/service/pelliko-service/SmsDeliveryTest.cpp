@@ -65,6 +65,18 @@ TEST_F(Sms, missingReceiptsAreNotTriedForever)
     EXPECT_EQ(hands.launcher.launches.size(), 5U);
 }
 
+TEST_F(Sms, everyLaunchOfAShareHasTheSameKey)
+{
+    const auto delivery = start();
+    hands.launcher.answer(LaunchResult::unknown);
+    hands.timers.pass(hands.timers.next());
+    const auto &launches = hands.launcher.launches;
+    ASSERT_EQ(launches.size(), 2U);
+    EXPECT_EQ(launches[0].key.size(), 22U);
+    EXPECT_EQ(launches[1].key, launches[0].key);
+    EXPECT_NE(hands.queued("another").key, launches[0].key);
+}
+
 TEST_F(Sms, aLaunchInFlightDoesNotReachADeliveryThatHasEnded)
 {
     auto delivery = start();

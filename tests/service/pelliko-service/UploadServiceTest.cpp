@@ -52,7 +52,7 @@ TEST_F(UploadService, sharesOneFileAndHasTheApplicationTellTheRecipients)
     ASSERT_EQ(application.launches.size(), 1U);
     const SeenLaunch &launch = application.launches[0];
     EXPECT_EQ(launch.operation, "http://tizen.org/appcontrol/operation/send_text");
-    EXPECT_FALSE(launch.replyWanted);
+    EXPECT_TRUE(launch.replyWanted);
     EXPECT_EQ(launch.texts.at("from_msisdn"), "+447700900100");
     EXPECT_EQ(launch.texts.at("req_id"), std::to_string(id));
     EXPECT_EQ(launch.texts.at("file_count"), "1");

@@ -15,6 +15,7 @@ namespace
 constexpr const char *number = "+447700900100";
 constexpr const char *serviceName = "com.velmora.pelliko.Service";
 
+constexpr const char *operationSendText = "http://tizen.org/appcontrol/operation/send_text";
 constexpr const char *applicationXml =
     "<node><interface name='com.velmora.Platform.Application1'><method name='Launch'>"
     "<arg name='request' type='a{sv}' direction='in'/><arg name='reply_wanted' type='b' "
@@ -122,13 +123,16 @@ void RecordingApplication::onCall(GDBusConnection *, const char *, const char *,
     auto &self = *static_cast<RecordingApplication *>(data);
     const SeenLaunch launch = readLaunch(parameters);
     self.launches.push_back(launch);
-    if (!launch.replyWanted && !self.confirms) {
-        return; // left open: the receipt is lost when the connection ends
+    const bool messages = launch.operation == operationSendText;
+    if ((messages || !launch.replyWanted) && !self.confirms) {
+        return; // left open: the answer is lost when the connection ends
     }
     GVariantBuilder reply;
     g_variant_builder_init(&reply, G_VARIANT_TYPE_VARDICT);
     int result = 0;
-    if (launch.replyWanted && self.resumes) {
+    if (messages) {
+        result = self.messagesResult;
+    } else if (launch.replyWanted && self.resumes) {
         g_variant_builder_add(&reply, "{sv}", "resume_by_app", g_variant_new_string("1"));
     } else if (launch.replyWanted) {
         result = -2;

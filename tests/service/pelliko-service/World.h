@@ -47,8 +47,9 @@ public:
     RecordingApplication &operator=(const RecordingApplication &) = delete;
 
     std::vector<SeenLaunch> launches;
-    bool resumes = true;  ///< answer a resume launch with "resume_by_app"
-    bool confirms = true; ///< return from a send_text launch
+    bool resumes = true;    ///< answer a resume launch with "resume_by_app"
+    bool confirms = true;   ///< return from a launch for messages or pushes
+    int messagesResult = 0; ///< what a launch for messages is answered with
     std::function<void(const SeenLaunch &)> onLaunch;
 
 private:
