@@ -49,8 +49,8 @@ class ShareCase(unittest.TestCase):
         return not any(error for _case, error in self._outcome.result.failures + self._outcome.result.errors
                        if _case is self)
 
-    def _keep_evidence(self):
-        target = os.path.join(SEEN, self.id())
+    def _keep_evidence(self, part=""):
+        target = os.path.join(SEEN, self.id() + part)
         os.makedirs(target, exist_ok=True)
         if "DISPLAY" in os.environ:
             screen.screenshot(os.path.join(target, "screen.png"))
