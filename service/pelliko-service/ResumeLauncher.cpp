@@ -2,6 +2,7 @@
 
 #include <glib.h>
 
+#include <algorithm>
 #include <utility>
 
 namespace pelliko::service
@@ -42,6 +43,13 @@ void ResumeLauncher::look()
         missedClaims_.clear();
         return;
     }
+    // Those of the last launch are well: what this one is for has nothing to do with it.
+    const bool newOnes = std::none_of(asked_.begin(), asked_.end(),
+                                      [this](int32_t id) { return launchedFor_.count(id) != 0; });
+    if (newOnes) {
+        backoff_.reset();
+    }
+    launchedFor_ = {asked_.begin(), asked_.end()};
     g_message("the application is launched to take %zu requests over", asked_.size());
     step_ = Step::launched;
     context_.launcher.launchResume(asked_, [this, alive = std::weak_ptr<bool>(alive_)](bool taken) {

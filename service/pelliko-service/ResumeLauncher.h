@@ -4,6 +4,7 @@
 #include "RequestContext.h"
 
 #include <map>
+#include <set>
 
 namespace pelliko::service
 {
@@ -55,6 +56,7 @@ private:
     Step step_ = Step::idle;
     uint64_t timer_ = 0;
     std::vector<int32_t> asked_;
+    std::set<int32_t> launchedFor_; ///< by the last launch
     std::map<int32_t, int> missedClaims_;
     std::shared_ptr<bool> alive_ = std::make_shared<bool>(true);
 };

@@ -10,7 +10,6 @@
 #include "PellikoUploadDataManager/UploadNotiData.h"
 #include "PellikoUploadManager/ExitPolicy.h"
 #include "PellikoUploadManager/UploadStatus.h"
-#include "PellikoUploadManager/UsagePreferences.h"
 
 #include <algorithm>
 #include <pelliko_client.h>

@@ -158,10 +158,11 @@ class KillRounds(Killing):
         print(f"round {number} of seed {OPTIONS.seed}: {len(data)} bytes to {len(people)}, {victim} dies after "
               f"{moment:.3f} s {'of messages' if among_messages else 'of upload'}", flush=True)
         sent_before = len(self.outbox.read())
-        changes = self.changes[JOURNAL]
+        changes, known = self.changes[JOURNAL], len(self.states())
         self.share_it(f"round{number}.bin.mp4", data, people)
         if among_messages:
-            world.wait_for(lambda: self.changes[JOURNAL] > changes, "the first message to be begun")
+            world.wait_for(lambda: self.changes[JOURNAL] > changes and len(self.states()) > known,
+                           "the first message to be begun")
         self.let_pass(moment)
         self.kill(victim)
         self.bring_back(victim)

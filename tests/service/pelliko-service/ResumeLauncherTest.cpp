@@ -112,6 +112,20 @@ TEST_F(Resume, anApplicationThatCameForSomethingElseDelaysNothing)
     EXPECT_EQ(launches(), 1U);
 }
 
+TEST_F(Resume, launchesThatHelpedDoNotDelayThoseForOthers)
+{
+    for (int32_t id = 1; id <= 10; ++id) {
+        open = {id};
+        launcher.lookSoon();
+        EXPECT_LE(hands.timers.next(), 2 * hands.settings.firstLaunchRetryMs);
+        hands.timers.pass(hands.timers.next());
+        ASSERT_EQ(launches(), static_cast<size_t>(id));
+        hands.launcher.answerResume(true);
+        claim(id);
+        launcher.applicationGone();
+    }
+}
+
 TEST_F(Resume, withoutOrphansNothingIsLaunched)
 {
     open.clear();
