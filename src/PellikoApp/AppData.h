@@ -93,6 +93,7 @@ public:
     char *from_msisdn = nullptr;
     char *expired_time = nullptr; ///< decimal seconds since the epoch
     char *req_id = nullptr;       ///< decimal request id
+    char *sms_key = nullptr;      ///< SMS: the share in the journal; null: the request has none
     int32_t file_count = 0;
     int32_t to_msisdn_count = 0;
     Eina_List *to_msisdn_list = nullptr; ///< char *

@@ -1,7 +1,6 @@
 #include "PellikoApp/SmsSender.h"
 
 #include "AppLog/AppLog.h"
-#include "PellikoApp/CText.h"
 #include "PellikoApp/Decimal.h"
 #include "PellikoApp/OwedMessages.h"
 #include "PellikoApp/TextFormat.h"
@@ -120,16 +119,21 @@ bool _sendOne(msg_handle_t handle, const char *number, const char *text, int32_t
     return sent;
 }
 
-// Not kept in the record: a request without a key must not be taken for a repetition.
-void _readKey(app_control_h request, SmsJob &job)
+// A request without a key must not be taken for a repetition of the one before.
+void _readKey(app_control_h request, PellikoAppData *ad)
 {
-    char *key = nullptr;
-    if (!request || app_control_get_extra_data(request, keyOfShare, &key) != APP_CONTROL_ERROR_NONE)
-        return;
-    job.journal_key = CText(key).get();
+    g_free(ad->sms_key);
+    ad->sms_key = nullptr;
+    _readText(request, keyOfShare, &ad->sms_key);
+}
+
+void _keepRequest(app_control_h request, SmsJob &job)
+{
     app_control_h clone = nullptr;
-    if (app_control_clone(&clone, request) == APP_CONTROL_ERROR_NONE)
+    if (request && app_control_clone(&clone, request) == APP_CONTROL_ERROR_NONE)
         job.request.reset(clone, app_control_destroy);
+    else if (request) // nobody could answer later, and who asked waits: better again than never
+        app_control_reply_to_launch_request(request, request, APP_CONTROL_RESULT_FAILED);
 }
 
 } // namespace
@@ -141,6 +145,7 @@ void _getSmsData(app_control_h request, PellikoAppData *ad)
     _readText(request, "from_msisdn", &ad->from_msisdn);
     _readText(request, "expired_time", &ad->expired_time);
     _readText(request, "req_id", &ad->req_id);
+    _readKey(request, ad);
     _readFileCount(request, ad);
     _parseSmsTo(ad, request);
 }
@@ -179,7 +184,10 @@ SmsJob makeSmsJob(const PellikoAppData *ad)
     job.expired_time = _copy(ad->expired_time);
     job.sim_index = ad->sim_index;
     job.text_format = translated(textId);
-    _readKey(ad->app_control, job);
+    if (ad->sms_key) {
+        job.journal_key = ad->sms_key;
+        _keepRequest(ad->app_control, job);
+    }
     return job;
 }
 
@@ -211,16 +219,18 @@ bool _sendSms(const SmsJob &job)
 namespace
 {
 
+// The request stands in for the reply, which carries nothing: a handle that could not be made would
+// leave who asked without an answer. One that failed is given once more for the same reason.
 void _answer(const SmsJob &job, bool settled)
 {
-    app_control_h reply = nullptr;
-    if (!job.request || app_control_create(&reply) != APP_CONTROL_ERROR_NONE)
+    if (!job.request)
         return;
-    const int error = app_control_reply_to_launch_request(reply, job.request.get(),
-                                                          settled ? APP_CONTROL_RESULT_SUCCEEDED
-                                                                  : APP_CONTROL_RESULT_FAILED);
+    app_control_h request = job.request.get();
+    const auto result = settled ? APP_CONTROL_RESULT_SUCCEEDED : APP_CONTROL_RESULT_FAILED;
+    int error = app_control_reply_to_launch_request(request, request, result);
+    if (error != APP_CONTROL_ERROR_NONE)
+        error = app_control_reply_to_launch_request(request, request, result);
     LOG_DEBUG("messages settled = %d, answer = %d", settled, error);
-    app_control_destroy(reply);
 }
 
 } // namespace

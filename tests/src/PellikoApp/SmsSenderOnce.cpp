@@ -99,10 +99,10 @@ TEST_F(SmsOnce, OnlyTheKeyOfTheRequestInHandCounts)
     LaunchRequest with;
     with.text("sms_key", "k");
     app_control_clone(&ad->app_control, with);
+    _getSmsData(with, ad);
     EXPECT_EQ(makeSmsJob(ad).journal_key, "k");
     EXPECT_NE(makeSmsJob(ad).request, nullptr);
-    app_control_destroy(ad->app_control);
-    app_control_create(&ad->app_control);
+    _getSmsData(LaunchRequest(), ad);
     EXPECT_EQ(makeSmsJob(ad).journal_key, "");
     EXPECT_EQ(makeSmsJob(ad).request, nullptr);
 }
