@@ -11,9 +11,10 @@ namespace
 constexpr long smallAtATime = 4;
 }
 
-FilesUpload::FilesUpload(HttpSender &http, Account account, std::vector<TusFile> files,
-                         int64_t chunkBytes)
-    : http_(http), account_(std::move(account)), files_(std::move(files)), chunkBytes_(chunkBytes)
+FilesUpload::FilesUpload(HttpSender &http, const Timers &timers, Account account,
+                         std::vector<TusFile> files, int64_t chunkBytes)
+    : http_(http), timers_(timers), account_(std::move(account)), files_(std::move(files)),
+      chunkBytes_(chunkBytes)
 {
     for (size_t index = 0; index < files_.size(); ++index) {
         present_.push_back(files_[index].offset);
@@ -28,6 +29,12 @@ void FilesUpload::start(Progress progress, Done done)
     progress_ = std::move(progress);
     done_ = std::move(done);
     startMore();
+}
+
+// One that takes several appends.
+bool FilesUpload::isLarge(size_t index) const
+{
+    return files_[index].stamp.size > AppendSize(chunkBytes_).bytes();
 }
 
 bool FilesUpload::mayStart(size_t index) const
@@ -61,7 +68,7 @@ void FilesUpload::startMore()
 
 void FilesUpload::startFile(size_t index)
 {
-    auto upload = std::make_unique<TusUpload>(http_, account_, files_[index], chunkBytes_);
+    auto upload = std::make_unique<TusUpload>(http_, timers_, account_, files_[index], chunkBytes_);
     TusUpload &started = *upload;
     running_[index] = std::move(upload);
     started.start(

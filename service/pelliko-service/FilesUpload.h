@@ -22,13 +22,14 @@ public:
      */
     using Done = TusUpload::Done;
 
-    FilesUpload(HttpSender &http, Account account, std::vector<TusFile> files, int64_t chunkBytes);
+    FilesUpload(HttpSender &http, const Timers &timers, Account account, std::vector<TusFile> files,
+                int64_t chunkBytes);
 
     /** Begins. The end may come from inside this call, and this may be destroyed by it. */
     void start(Progress progress, Done done);
 
 private:
-    bool isLarge(size_t index) const { return files_[index].stamp.size > chunkBytes_; }
+    bool isLarge(size_t index) const;
     bool mayStart(size_t index) const;
     void startMore();
     void startFile(size_t index);
@@ -37,6 +38,7 @@ private:
     void finish(const Failure *failure, int64_t restMs);
 
     HttpSender &http_;
+    const Timers &timers_;
     Account account_;
     std::vector<TusFile> files_;
     int64_t chunkBytes_;

@@ -207,8 +207,8 @@ void Request::uploadFiles(const ShareRecord &share)
     if (!paused_) {
         progress_.update(present);
     }
-    files_ = std::make_unique<FilesUpload>(context_.http, account_, std::move(files),
-                                           context_.settings.chunkBytes);
+    files_ = std::make_unique<FilesUpload>(context_.http, context_.timers, account_,
+                                           std::move(files), context_.settings.chunkBytes);
     files_->start([this](int64_t bytes, bool stored) { onProgress(bytes, stored); },
                   [this](const Failure *failure, int64_t restMs) {
                       if (failure) {

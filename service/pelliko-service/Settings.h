@@ -14,7 +14,7 @@ struct Settings {
     int64_t firstRetryMs = 2'000;              ///< first wait after a failed transfer
     int64_t longestRetryMs = 300'000;          ///< the waits double up to this
     int64_t giveUpMs = 3LL * 24 * 3600 * 1000; ///< no success for so long ends a request
-    int64_t chunkBytes = 8LL * 1024 * 1024;    ///< most bytes of one append
+    int64_t chunkBytes = 256LL * 1024 * 1024;  ///< most bytes of one append
     int64_t sendRate = 0;                      ///< most bytes a second of one transfer, 0: no limit
     int64_t stallSeconds = 60;                 ///< so long without a byte ends a transfer
     int64_t firstLaunchRetryMs = 2'000;        ///< first wait after a failed launch

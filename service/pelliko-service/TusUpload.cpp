@@ -11,8 +11,10 @@
 namespace pelliko::service
 {
 
-TusUpload::TusUpload(HttpSender &http, Account account, TusFile file, int64_t chunkBytes)
-    : http_(http), account_(std::move(account)), file_(std::move(file)), chunkBytes_(chunkBytes)
+TusUpload::TusUpload(HttpSender &http, const Timers &timers, Account account, TusFile file,
+                     int64_t chunkBytes)
+    : http_(http), timers_(timers), account_(std::move(account)), file_(std::move(file)),
+      appendSize_(chunkBytes)
 {
 }
 
@@ -65,7 +67,7 @@ void TusUpload::appendNext()
             return;
         }
     }
-    sendChunk(std::min(chunkBytes_, file_.stamp.size - file_.offset));
+    sendChunk(std::min(appendSize_.bytes(), file_.stamp.size - file_.offset));
 }
 
 void TusUpload::sendChunk(int64_t length)
@@ -79,6 +81,7 @@ void TusUpload::sendChunk(int64_t length)
     patch.headers.push_back("Content-Type: application/offset+octet-stream");
     patch.headers.push_back("Upload-Offset: " + std::to_string(file_.offset));
     patch.range = {source_, file_.offset, length};
+    appendBegunMs_ = timers_.steadyMs();
     transfer_ = http_.send(
         std::move(patch), [this](int64_t sent) { progress_(file_.offset + sent, false); },
         [this](const HttpAnswer &answer) { onAppended(answer); });
@@ -96,6 +99,7 @@ void TusUpload::onAppended(const HttpAnswer &answer)
         fail(failureNamed("unexpected_answer"));
     } else {
         asked_ = false;
+        appendSize_.tookMs(timers_.steadyMs() - appendBegunMs_);
         progress_(file_.offset, true);
         appendNext();
     }

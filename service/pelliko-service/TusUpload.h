@@ -1,8 +1,10 @@
 #pragma once
 
 #include "Account.h"
+#include "AppendSize.h"
 #include "ErrorTable.h"
 #include "Http.h"
+#include "Timers.h"
 
 namespace pelliko::service
 {
@@ -30,7 +32,9 @@ public:
      */
     using Done = std::function<void(const Failure *failure, int64_t restMs)>;
 
-    TusUpload(HttpSender &http, Account account, TusFile file, int64_t chunkBytes);
+    /** @param chunkBytes most bytes of one append */
+    TusUpload(HttpSender &http, const Timers &timers, Account account, TusFile file,
+              int64_t chunkBytes);
     ~TusUpload();
     TusUpload(const TusUpload &) = delete;
     TusUpload &operator=(const TusUpload &) = delete;
@@ -49,9 +53,11 @@ private:
     void fail(const Failure &failure, int64_t restMs = 0);
 
     HttpSender &http_;
+    const Timers &timers_;
     Account account_;
     TusFile file_;
-    int64_t chunkBytes_;
+    AppendSize appendSize_;
+    int64_t appendBegunMs_ = 0;
     std::shared_ptr<SourceFile> source_;
     Progress progress_;
     Done done_;

@@ -11,7 +11,10 @@
 #include <boost/beast/http/parser.hpp>
 #include <boost/beast/http/read.hpp>
 
+#include <sys/socket.h>
+
 #include <algorithm>
+#include <cerrno>
 #include <limits>
 #include <utility>
 
@@ -75,6 +78,8 @@ struct BodyReader::State {
     bool takesChunks = false;
     bool awaitsContinue = false;
     bool interrupted = false;
+    /// The socket may have bytes that nobody has waited for.
+    bool mayHaveMore = false;
 };
 
 BodyReader::BodyReader(asio::ip::tcp::socket &socket, Watchdog &watchdog,
@@ -130,7 +135,7 @@ Task<HeadResult> BodyReader::readHead()
     state.head->header_limit(headLimit);
     state.head->body_limit(boost::none);
     state.request = {};
-    state.keepAlive = state.interrupted = false;
+    state.keepAlive = state.interrupted = state.mayHaveMore = false;
     state.remaining = 0;
     auto [error, count] =
         co_await http::async_read_header(state.socket, state.buffer, *state.head, asTuple);
@@ -193,6 +198,51 @@ Task<std::size_t> BodyReader::readPlain(std::span<char> into)
     if (state.interrupted)
         throw Interrupted();
     throw Disconnected();
+}
+
+Task<bool> BodyReader::awaitPlainBytes()
+{
+    State &state = *m_state;
+    if (state.interrupted)
+        throw Interrupted();
+    if (state.chunks || state.buffer.size() > 0 || state.remaining == 0)
+        co_return false;
+    if (!state.mayHaveMore) {
+        state.watchdog.arm(state.progressTimeout);
+        auto [error] = co_await state.socket.async_wait(asio::ip::tcp::socket::wait_read, asTuple);
+        state.watchdog.disarm();
+        if (state.interrupted)
+            throw Interrupted();
+        if (error)
+            throw Disconnected();
+    }
+    co_return true;
+}
+
+std::size_t BodyReader::takeNow(std::span<char> buffer, std::size_t most, const BodyTaker &take)
+{
+    State &state = *m_state;
+    state.mayHaveMore = true;
+    std::size_t taken = 0;
+    while (taken < most && state.remaining > 0) {
+        const auto wanted =
+            std::min({state.remaining, std::uint64_t{buffer.size()}, std::uint64_t{most - taken}});
+        const ssize_t count =
+            ::recv(state.socket.native_handle(), buffer.data(), wanted, MSG_DONTWAIT);
+        if (count < 0 && errno == EINTR)
+            continue;
+        if (count < 0 && errno == EAGAIN)
+            state.mayHaveMore = false;
+        if (count <= 0) {
+            if (state.mayHaveMore && taken == 0)
+                throw Disconnected();
+            break;
+        }
+        state.remaining -= static_cast<std::uint64_t>(count);
+        taken += static_cast<std::size_t>(count);
+        take({buffer.data(), static_cast<std::size_t>(count)});
+    }
+    return taken;
 }
 
 Task<std::size_t> BodyReader::readChunked(std::span<char> into)

@@ -35,6 +35,9 @@ public:
     [[nodiscard]] const char *what() const noexcept override { return "interrupted"; }
 };
 
+/// Takes a piece of a body, which is gone after the call.
+using BodyTaker = std::function<void(std::string_view piece)>;
+
 /// One request and its answer. Used on the network thread only.
 class Exchange
 {
@@ -47,7 +50,14 @@ public:
     /// Throws Disconnected or Interrupted.
     virtual Task<std::size_t> readBody(std::span<char> into) = 0;
 
-    /// Ends a running readBody, and every later one, with Interrupted. An answer can still be sent.
+    /// Gives bytes of the body to `take`, on a thread of the pool, as long as more are there and
+    /// until `most` are taken; each piece fits `buffer`. Returns how many; 0 at the body's
+    /// end. Throws as readBody does, and what `take` throws.
+    virtual Task<std::size_t> takeBody(std::span<char> buffer, std::size_t most,
+                                       const BodyTaker &take) = 0;
+
+    /// Ends a running readBody or takeBody, and every later one, with Interrupted. An answer can
+    /// still be sent.
     virtual void interrupt() = 0;
 
     /// Sends a whole answer. For HEAD the body is left out and its length stays.

@@ -17,7 +17,7 @@ namespace pelliko::server
 /// A blob that is being written, or removed: it has one such record at a time.
 struct ActiveWrite {
     std::string key;
-    /// Null until the first byte is to be written.
+    /// Null as long as no byte is to be written.
     std::shared_ptr<BlobWriter> writer;
     /// The end of what was handed to the writer; durable only after its sync.
     std::uint64_t written = 0;

@@ -3,6 +3,7 @@
 #include "http/Errors.h"
 #include "shares/ShareRules.h"
 #include "store/StorageFailure.h"
+#include "tus/Checkpoints.h"
 #include "tus/TusHeaders.h"
 
 #include <algorithm>
@@ -16,8 +17,8 @@ namespace
 {
 
 constexpr std::size_t bufferSize = 256 * 1024;
-/// A crash loses at most this much of a running upload.
-constexpr std::uint64_t checkpointEvery = 16 * 1024 * 1024;
+/// How much one thread of the pool stores before others get their turn.
+constexpr std::size_t stepSize = 1024 * 1024;
 
 Task<void> openWriter(Context &context, ActiveWrite &write)
 {
@@ -27,27 +28,27 @@ Task<void> openWriter(Context &context, ActiveWrite &write)
 
 /// Copies the body into the blob, up to `end`.
 Task<void> copyBody(Exchange &exchange, Context &context, std::shared_ptr<ActiveWrite> write,
-                    std::uint64_t end)
+                    std::uint64_t end, Checkpoints &checkpoints)
 {
+    if (exchange.request().bodyLength == 0)
+        co_return;
+    co_await openWriter(context, *write);
     std::vector<char> buffer(bufferSize);
-    std::uint64_t safe = write->written;
+    std::uint64_t at = write->written;
+    const BodyTaker store = [&](std::string_view piece) {
+        piece = piece.substr(0, end - at);
+        write->writer->write(at, piece);
+        at += piece.size();
+    };
     while (true) {
-        const std::size_t count = co_await exchange.readBody(buffer);
+        const std::uint64_t before = at;
+        const std::size_t count = co_await exchange.takeBody(buffer, stepSize, store);
         if (count == 0)
             co_return;
-        if (!write->writer)
-            co_await openWriter(context, *write);
-        const auto fitting = std::min<std::uint64_t>(count, end - write->written);
-        const std::string_view bytes(buffer.data(), static_cast<std::size_t>(fitting));
-        const auto store = [&] { write->writer->write(write->written, bytes); };
-        co_await context.pool.run(store);
-        write->written += fitting;
-        if (fitting < count)
+        write->written = at;
+        if (at - before < count)
             throw Refusal(Error::tooLarge, "The upload is longer than announced.");
-        if (write->written - safe >= checkpointEvery) {
-            co_await checkpoint(context, write);
-            safe = write->written;
-        }
+        co_await checkpoints.advance();
     }
 }
 
@@ -104,19 +105,6 @@ Task<UploadRecord> findWantedUpload(Context &context, std::int64_t account, std:
     co_return std::move(*found);
 }
 
-Task<void> checkpoint(Context &context, std::shared_ptr<ActiveWrite> write)
-{
-    if (!write->writer)
-        co_return;
-    const std::uint64_t upTo = write->kept = write->written;
-    const bool wanted = co_await context.pool.run([&] {
-        write->writer->sync();
-        return context.metadata.recordOffset(write->key, upTo);
-    });
-    if (!wanted)
-        throw Refusal(Error::gone);
-}
-
 Task<std::uint64_t> appendBody(Exchange &exchange, Context &context, std::int64_t account,
                                std::string upload)
 {
@@ -131,9 +119,15 @@ Task<std::uint64_t> appendBody(Exchange &exchange, Context &context, std::int64_
     checkAppend(exchange.request(), current, offset);
     const std::shared_ptr<ActiveWrite> write = lease.write();
     write->written = write->kept = offset;
+    Checkpoints checkpoints(context, write);
     std::exception_ptr ending;
     try {
-        co_await copyBody(exchange, context, write, current.file.size);
+        co_await copyBody(exchange, context, write, current.file.size, checkpoints);
+    } catch (const std::exception &) {
+        ending = std::current_exception();
+    }
+    try {
+        co_await checkpoints.finish();
     } catch (const std::exception &) {
         ending = std::current_exception();
     }

@@ -11,10 +11,6 @@ namespace pelliko::server
 /// The upload of this account, still wanted; anything else is refused.
 Task<UploadRecord> findWantedUpload(Context &context, std::int64_t account, std::string upload);
 
-/// Makes what was written so far durable and then notes the new offset. Refuses (gone) when the
-/// share ended meanwhile.
-Task<void> checkpoint(Context &context, std::shared_ptr<ActiveWrite> write);
-
 /// Appends the request's body at its Upload-Offset, as the upload's only writer. Whatever ends the
 /// body early, what arrived is kept. Returns the new offset; it is on stable storage.
 Task<std::uint64_t> appendBody(Exchange &exchange, Context &context, std::int64_t account,

@@ -6,6 +6,7 @@
 #include "shares/ShareJson.h"
 #include "shares/ShareRules.h"
 #include "text/Escape.h"
+#include "tus/Checkpoints.h"
 #include "tus/TusAppend.h"
 #include "tus/TusHeaders.h"
 

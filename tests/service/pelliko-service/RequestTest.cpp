@@ -195,6 +195,26 @@ TEST_F(OneRequest, largeFilesGoInChunks)
     EXPECT_EQ(hands.http.oldest().range.length, 2);
 }
 
+TEST_F(OneRequest, whereTheWayIsFastAppendsBecomeLonger)
+{
+    constexpr int64_t mib = 1024 * 1024;
+    QueuedRequest record = hands.queued("");
+    std::filesystem::resize_file(record.files[0].path, 300 * mib);
+    stampOf(record.files[0].path, record.files[0].stamp);
+    begin(record);
+    hands.http.answer(201, shareRecord);
+    EXPECT_EQ(hands.http.oldest().range.length, 8 * mib);
+    hands.timers.pass(100);
+    upload(std::to_string(8 * mib));
+    EXPECT_EQ(hands.http.oldest().range.length, 32 * mib);
+    hands.timers.pass(300);
+    upload(std::to_string(40 * mib));
+    EXPECT_EQ(hands.http.oldest().range.length, 32 * mib) << "that took long enough";
+    hands.timers.pass(5'000);
+    upload(std::to_string(72 * mib));
+    EXPECT_EQ(hands.http.oldest().range.length, 8 * mib);
+}
+
 TEST_F(OneRequest, anOffsetThatDoesNotGrowIsNoProgress)
 {
     begin(hands.queued("0123456789"));

@@ -1,0 +1,37 @@
+#pragma once
+
+#include "http/Context.h"
+
+#include <memory>
+
+namespace pelliko::server
+{
+
+/// Makes what was written so far durable and then notes the new offset. Refuses (gone) when the
+/// share ended meanwhile.
+Task<void> checkpoint(Context &context, std::shared_ptr<ActiveWrite> write);
+
+/// The checkpoints of one append, made while more of its body arrives, one at a time. Network
+/// thread only.
+class Checkpoints
+{
+public:
+    Checkpoints(Context &context, std::shared_ptr<ActiveWrite> write);
+
+    /// A piece was written: begins a checkpoint when one is due, and waits for the one before.
+    /// Throws what ended that.
+    Task<void> advance();
+
+    /// Waits for the running one, if there is one, and throws what ended it.
+    Task<void> finish();
+
+private:
+    struct Running;
+
+    Context &m_context;
+    std::shared_ptr<ActiveWrite> m_write;
+    std::shared_ptr<Running> m_running;
+    std::uint64_t m_begunUpTo;
+};
+
+} // namespace pelliko::server
