@@ -26,6 +26,8 @@ SENDER, RECIPIENT = "+447700900100", "+447700900199"
 SERVICE, SERVICE_PATH = "com.velmora.pelliko.Service", "/com/velmora/pelliko/Service"
 UPLOADED = 3  # the service's report that a share is ready for its recipients
 ENDS = (4, 5, 7)  # failed, cancelled, shared
+NGINX = shutil.which("nginx", path=os.environ["PATH"] + ":/usr/sbin")
+CREATED = 0x100  # of inotify
 LARGE = 32 * 1024 * 1024  # files whose removal takes the disk a while
 
 
@@ -53,7 +55,7 @@ class ShareServer:
         reading, writing = os.pipe()
         self.process = subprocess.Popen(
             [self.program, "serve", "--data", self.data, "--listen", "127.0.0.1:0", "--ready-fd", str(writing),
-             "--daily-limit", str(2**50)], pass_fds=[writing], stderr=subprocess.DEVNULL)
+             "--daily-limit", str(2**50), "--share-limit", str(2**50)], pass_fds=[writing], stderr=subprocess.DEVNULL)
         os.close(writing)
         with os.fdopen(reading) as ready:
             self.url = ready.readline().strip()
@@ -187,11 +189,9 @@ class Nginx:
               uwsgi_temp_path {self.home}/t3; scgi_temp_path {self.home}/t4;
               server {{ listen {self.url[7:]}; root {self.root}; client_max_body_size 0; dav_methods PUT; }}
             }}""", encoding="ascii")
-        program = shutil.which("nginx", path=os.environ["PATH"] + ":/usr/sbin")
-        # The listening socket is there before the program goes on to serve.
-        self.process = subprocess.Popen([program, "-e", self.home + "/error", "-c", self.home + "/nginx.conf"])
-        seen = watch.Watch(self.home, 0x100 | 0x8 | watch.MODIFIED)
-        with seen:
+        with watch.Watch(self.home, CREATED) as seen:
+            # It writes its process id when it listens.
+            self.process = subprocess.Popen([NGINX, "-e", self.home + "/error", "-c", self.home + "/nginx.conf"])
             while not os.path.exists(self.home + "/pid"):
                 seen.wait()
 
@@ -223,7 +223,8 @@ class TusClient:
     """tus-js-client in one Node.js process, which starts before the clock does."""
 
     def __init__(self, build):
-        subprocess.run([ROOT / "tests" / "browser" / "run", build], check=True)
+        subprocess.run([ROOT / "tests" / "browser" / "run", build], check=True,
+                       stdout=subprocess.DEVNULL)
         self.environment = {**os.environ, "PELLIKO_NODE_MODULES": os.path.join(build, "browser")}
 
     def upload(self, server, files, uploads):
@@ -240,7 +241,7 @@ def versions(build):
         return done.stdout.splitlines()[0].strip()
     package = json.loads(pathlib.Path(build, "browser", "node_modules", "tus-js-client", "package.json").read_text(
         encoding="utf-8"))
-    nginx = shutil.which("nginx", path=os.environ["PATH"] + ":/usr/sbin")
-    return "; ".join([" ".join(first("curl", "--version").split()[:2]), first(nginx, "-v").removeprefix("nginx version: "),
+    return "; ".join([" ".join(first("curl", "--version").split()[:2]),
+                      first(NGINX, "-v").removeprefix("nginx version: "),
                       f"tus-js-client {package['version']} on Node.js {first('node', '--version')}",
                       f"Linux {os.uname().release}, {os.cpu_count()} processors"])
