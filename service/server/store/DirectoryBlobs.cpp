@@ -66,16 +66,10 @@ void makeDirectory(const fs::path &path)
         fail("cannot make", path);
 }
 
-/// What the disk is given at a time.
-constexpr std::uint64_t writebackStep = 1024 * 1024;
-
 class FileWriter final : public BlobWriter
 {
 public:
-    FileWriter(File file, std::uint64_t size)
-        : m_file(std::move(file)), m_writebackEnd(size), m_nameUnsynced(size == 0)
-    {
-    }
+    FileWriter(File file, bool isNew) : m_file(std::move(file)), m_nameUnsynced(isNew) {}
 
     void write(std::uint64_t offset, std::string_view bytes) override
     {
@@ -89,7 +83,6 @@ public:
             bytes.remove_prefix(static_cast<std::size_t>(count));
             offset += static_cast<std::uint64_t>(count);
         }
-        beginWriteback(offset);
     }
 
     void truncate(std::uint64_t size) override
@@ -110,22 +103,9 @@ public:
     }
 
 private:
-    /// The disk works while more arrives, so that a sync finds most of it done. Only a hint:
-    /// failures show in the sync.
-    void beginWriteback(std::uint64_t end)
-    {
-        if (end >= m_writebackEnd && end - m_writebackEnd < writebackStep)
-            return;
-        if (end > m_writebackEnd)
-            sync_file_range(m_file.get(), static_cast<off_t>(m_writebackEnd),
-                            static_cast<off_t>(end - m_writebackEnd), SYNC_FILE_RANGE_WRITE);
-        m_writebackEnd = end;
-    }
-
     File m_file;
-    std::uint64_t m_writebackEnd;
     // A new file whose directory is not synced is gone after a power cut, however often it was
-    // synced. An empty one may be new.
+    // synced.
     std::atomic<bool> m_nameUnsynced;
 };
 
@@ -177,7 +157,8 @@ std::unique_ptr<BlobWriter> DirectoryBlobs::openForWriting(const std::string &ke
     };
     if (fstat(file.get(), &info) != 0)
         fail("cannot look at", path);
-    return std::make_unique<FileWriter>(std::move(file), static_cast<std::uint64_t>(info.st_size));
+    // An empty file may be one whose name was never synced.
+    return std::make_unique<FileWriter>(std::move(file), info.st_size == 0);
 }
 
 std::unique_ptr<BlobReader> DirectoryBlobs::openForReading(const std::string &key)

@@ -18,9 +18,11 @@ namespace
 
 namespace asio = boost::asio;
 
-/// A crash loses what a running checkpoint covers and what arrived since it began. Pieces of up to
-/// a MiB may go beyond each, so that these are 16 MiB at most.
-constexpr std::uint64_t checkpointEvery = 7 * 1024 * 1024;
+/// Less is not worth a wait for the disk.
+constexpr std::uint64_t leastStep = 8 * 1024 * 1024;
+/// What may be stored and not be noted, and is lost in a crash, where the disk is slower than the
+/// network; a piece of up to a MiB may come on top.
+constexpr std::uint64_t mostUnnoted = 63 * 1024 * 1024;
 
 } // namespace
 
@@ -50,15 +52,19 @@ Task<void> checkpoint(Context &context, std::shared_ptr<ActiveWrite> write)
 }
 
 Checkpoints::Checkpoints(Context &context, std::shared_ptr<ActiveWrite> write)
-    : m_context(context), m_write(std::move(write)), m_begunUpTo(m_write->written)
+    : m_context(context), m_write(std::move(write)), m_begunUpTo(m_write->written),
+      m_notedUpTo(m_begunUpTo)
 {
 }
 
 Task<void> Checkpoints::advance()
 {
-    if (m_write->written - m_begunUpTo < checkpointEvery)
+    const bool ended = m_running && m_running->ended;
+    const bool tooFar = m_write->written - m_notedUpTo >= mostUnnoted;
+    if (ended || tooFar)
+        co_await finish();
+    if (m_running || m_write->written - m_begunUpTo < leastStep)
         co_return;
-    co_await finish();
     m_begunUpTo = m_write->written;
     const auto executor = co_await asio::this_coro::executor;
     m_running = std::make_shared<Running>(executor);
@@ -79,6 +85,7 @@ Task<void> Checkpoints::finish()
         co_await running->done.async_wait(asio::as_tuple(asio::use_awaitable));
     if (running->error)
         std::rethrow_exception(running->error);
+    m_notedUpTo = m_begunUpTo;
 }
 
 } // namespace pelliko::server

@@ -18,8 +18,8 @@ class Checkpoints
 public:
     Checkpoints(Context &context, std::shared_ptr<ActiveWrite> write);
 
-    /// A piece was written: begins a checkpoint when one is due, and waits for the one before.
-    /// Throws what ended that.
+    /// A piece was written: begins a checkpoint when one is due and none runs. Waits for a running
+    /// one only when much more has come meanwhile. Throws what ended one.
     Task<void> advance();
 
     /// Waits for the running one, if there is one, and throws what ended it.
@@ -32,6 +32,7 @@ private:
     std::shared_ptr<ActiveWrite> m_write;
     std::shared_ptr<Running> m_running;
     std::uint64_t m_begunUpTo;
+    std::uint64_t m_notedUpTo;
 };
 
 } // namespace pelliko::server

@@ -122,10 +122,10 @@ class Uploads(ServerCase):
         self.assertEqual(self.get(link + "/0").body, content)
 
     def test_bytes_in_full_steps_survive_kill_9_unasked(self):
-        length = 40 * MIB
+        length = 100 * MIB
         upload = self.make_share(length)["files"][0]["upload"]
         connection = self.connect()
-        connection.sendall(self.patch_head(upload, 0, length) + bytes(38 * MIB))
+        connection.sendall(self.patch_head(upload, 0, length) + bytes(98 * MIB))
         self.kill()
         self.start()
         self.assertGreaterEqual(self.offset(upload), 16 * MIB)
