@@ -161,6 +161,8 @@ class Catalogues(unittest.TestCase):
         for folder, sources in OTHERS.items():
             code = "".join(path.read_text() for path in (SOURCE / sources).rglob("*.cpp"))
             joined = re.sub(r'"\s*"', "", code)
+            for entry in (SOURCE / sources).rglob("*.desktop"):
+                joined += re.sub("^[^=]*=(.*)$", r'"\1"', entry.read_text(), flags=re.M)
             for key in texts(folder, "de"):
                 # Units are put together.
                 if not re.fullmatch(r"%s .B|\.", own_id(key)):

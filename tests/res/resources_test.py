@@ -67,6 +67,15 @@ class Resources(unittest.TestCase):
             self.assertEqual(stat.S_IMODE((APP / name).stat().st_mode) & 0o444, 0o444, name)
         self.assertEqual(stat.S_IMODE((APP / FILES[0]).stat().st_mode), 0o644)
 
+    def test_menus_name_the_companions_in_every_language(self):
+        entries = list((BUILD / "companions").glob("*/*.desktop"))
+        self.assertEqual(len(entries), 3)
+        wanted = {path.stem for path in (SOURCE / "res/locale").glob("*.po")} - {"en"}
+        for entry in entries:
+            for key in ("Name", "Comment"):
+                found = set(re.findall(rf"^{key}\[(\w+)\]=\S", entry.read_text(), re.M))
+                self.assertEqual(found, wanted, f"{entry}: {key}")
+
     def test_letters_can_be_told_from_their_ground(self):
         classes = colors()
         for letters, ground in PAIRS:

@@ -18,6 +18,8 @@ def texts_of_sources():
     """Single texts, and pairs of one and many."""
     source = "".join(path.read_text(encoding="utf-8") for path in sorted(ROOM.glob("*.cpp")))
     single = {joined(found) for found in re.findall(r"(?:mark|translated|filledIn)\(\s*" + LITERAL, source)}
+    for entry in ROOM.glob("*.desktop"):
+        single |= set(re.findall(r"^(?:Name|Comment)=(.+)", entry.read_text(encoding="utf-8"), re.M))
     pairs = re.findall(r"counted\(\s*" + LITERAL + r",\s*" + LITERAL, source)
     return single, {(joined(one), joined(many)) for one, many in pairs}
 
