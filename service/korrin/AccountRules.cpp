@@ -23,7 +23,7 @@ bool isHttp(const std::string &address)
 
 } // namespace
 
-std::string plainServer(std::string address)
+std::string plainServer(const std::string &address)
 {
     const auto first = address.find_first_not_of(" \t\r\n");
     const auto last = address.find_last_not_of(" \t\r\n/");

@@ -56,6 +56,6 @@ std::string accountFault(const Account &account);
 bool isImsi(const std::string &text);
 
 /// An address as accounts keep it: without spaces around and slashes at its end.
-std::string plainServer(std::string address);
+std::string plainServer(const std::string &address);
 
 } // namespace pelliko::korrin

@@ -39,7 +39,7 @@ std::string withPlus(const std::string &number)
 std::string regionOf(const std::string &callingCode, const std::string &ownNumber)
 {
     const int code = std::atoi(callingCode.c_str());
-    const std::string codeRegion = mainRegion(code);
+    std::string codeRegion = mainRegion(code);
     PhoneNumber own;
     if (library().Parse(withPlus(ownNumber), noRegion, &own) != PhoneNumberUtil::NO_PARSING_ERROR) {
         return codeRegion;
@@ -171,7 +171,10 @@ NumberForm bestOf(const std::vector<Reading> &candidates, bool letters)
     if (letters && !(faulty && faulty->fault == faultExtension)) {
         return {{}, faultNotANumber};
     }
-    return possible ? *possible : *faulty;
+    if (possible) {
+        return *possible;
+    }
+    return faulty ? *faulty : NumberForm{{}, faultNotANumber};
 }
 } // namespace
 

@@ -13,7 +13,8 @@ struct DownloadKey {
     std::string caller;
     uint32_t number = 0;
 
-    auto operator<=>(const DownloadKey &) const = default;
+    // The check takes the comparison that the compiler writes for a null pointer.
+    auto operator<=>(const DownloadKey &) const = default; // NOLINT(modernize-use-nullptr)
 };
 
 /** All downloads that run. */

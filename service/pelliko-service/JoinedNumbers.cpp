@@ -49,6 +49,7 @@ std::vector<std::string> JoinedNumbers::due(const std::set<std::string> &numbers
     std::sort(open.begin(), open.end());
     open.resize(std::min(open.size(), most));
     std::vector<std::string> result;
+    result.reserve(open.size());
     for (auto &[at, number] : open) {
         result.push_back(std::move(number));
     }

@@ -82,7 +82,7 @@ std::string renameToFree(const std::string &path, const std::string &folder,
                          const std::string &name)
 {
     for (int number = 1; number < mostNumbers; ++number) {
-        const std::string to = folder + "/" + (number == 1 ? name : numberedName(name, number));
+        std::string to = folder + "/" + (number == 1 ? name : numberedName(name, number));
         if (renameNew(path, to)) {
             return to;
         }

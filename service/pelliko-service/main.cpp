@@ -6,6 +6,9 @@
 #include <CLI/CLI.hpp>
 
 #include <clocale>
+#include <cstdio>
+#include <cstdlib>
+#include <exception>
 
 using namespace pelliko::service;
 
@@ -41,11 +44,9 @@ void addSettings(CLI::App &app, Settings &settings)
          "Silence after which the push stream is taken to be dead (ms)");
     time("--grace", settings.graceMs, "Time for living clients to come back after a start (ms)");
 }
-} // namespace
 
-int main(int argc, char **argv)
+int runProgram(int argc, char **argv)
 {
-    std::setlocale(LC_ALL, "");
     CLI::App app{"Pelliko's background upload service. Without a subcommand it runs until it is "
                  "asked to end.",
                  "pelliko-service"};
@@ -76,4 +77,16 @@ int main(int argc, char **argv)
         return statusCommand(json);
     }
     return runService(settings);
+}
+} // namespace
+
+int main(int argc, char **argv)
+{
+    std::setlocale(LC_ALL, "");
+    try {
+        return runProgram(argc, argv);
+    } catch (const std::exception &error) {
+        std::fprintf(stderr, "pelliko-service: %s\n", error.what());
+        return EXIT_FAILURE;
+    }
 }

@@ -70,7 +70,7 @@ std::string timeText(int64_t microseconds)
     char fraction[16];
     g_snprintf(fraction, sizeof fraction, ".%03dZ",
                static_cast<int>(microseconds % G_USEC_PER_SEC / 1000));
-    const std::string result = std::string(text) + fraction;
+    std::string result = std::string(text) + fraction;
     g_free(text);
     g_date_time_unref(seconds);
     return result;

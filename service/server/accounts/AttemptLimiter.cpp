@@ -16,7 +16,7 @@ namespace ip = boost::asio::ip;
 constexpr std::size_t mostAddresses = 10000;
 constexpr std::size_t homeBytes = 8;
 
-std::optional<ip::address> parse(std::string text)
+std::optional<ip::address> parse(const std::string &text)
 {
     const auto first = text.find_first_not_of(' ');
     const auto last = text.find_last_not_of(' ');

@@ -17,9 +17,10 @@ constexpr std::size_t jsonLimit = 1024 * 1024;
 
 std::string idempotencyKeyOf(const Request &request)
 {
-    const std::string *key = request.header("Idempotency-Key");
-    checkIdempotencyKey(key == nullptr ? std::string_view() : *key);
-    return *key;
+    const std::string *header = request.header("Idempotency-Key");
+    std::string key = header == nullptr ? std::string() : *header;
+    checkIdempotencyKey(key);
+    return key;
 }
 
 NewShare newShareOf(ShareRequest request, const Account &account, const Context &context)
