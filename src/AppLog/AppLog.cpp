@@ -4,7 +4,6 @@
 #include "PellikoApp/TextFormat.h"
 
 #include <algorithm>
-#include <atomic>
 #include <cerrno>
 #include <cstdarg>
 #include <cstdio>
@@ -38,26 +37,18 @@ constexpr size_t archiveNameSize = 4096;
 constexpr size_t commandSize = 4351;
 constexpr size_t prefixSize = 512;
 
-// Lines are appended under the shared lock, each with one call of the system, which keeps them
-// whole and in order; a rotation has the file for itself. Waiting rotations go before new lines, or
-// a chatty program would never come to one. None of this needs a destructor: a detached thread may
-// log until the very end of the process.
-pthread_rwlock_t g_lock = PTHREAD_RWLOCK_WRITER_NONRECURSIVE_INITIALIZER_NP;
+// One line at a time, a rotation and its subprocess included. Neither it nor the counters need a
+// destructor: a detached thread may log until the very end of the process. A line is short work, so
+// that a thread which finds the mutex taken is better off trying again than being put to sleep.
+pthread_mutex_t g_mutex = PTHREAD_ADAPTIVE_MUTEX_INITIALIZER_NP;
 int archive_count = 0;
-std::atomic<bool> initialised = false;
+bool initialised = false;
 
-struct SharedLock {
-    SharedLock() { pthread_rwlock_rdlock(&g_lock); }
-    ~SharedLock() { pthread_rwlock_unlock(&g_lock); }
-    SharedLock(const SharedLock &) = delete;
-    SharedLock &operator=(const SharedLock &) = delete;
-};
-
-struct ExclusiveLock {
-    ExclusiveLock() { pthread_rwlock_wrlock(&g_lock); }
-    ~ExclusiveLock() { pthread_rwlock_unlock(&g_lock); }
-    ExclusiveLock(const ExclusiveLock &) = delete;
-    ExclusiveLock &operator=(const ExclusiveLock &) = delete;
+struct Lock {
+    Lock() { pthread_mutex_lock(&g_mutex); }
+    ~Lock() { pthread_mutex_unlock(&g_mutex); }
+    Lock(const Lock &) = delete;
+    Lock &operator=(const Lock &) = delete;
 };
 
 // A trace reads the same in every language: "45.500000" also where people write a comma.
@@ -94,9 +85,6 @@ void _initialiseOnce()
 {
     if (initialised)
         return;
-    const ExclusiveLock lock;
-    if (initialised)
-        return;
     _countArchives();
     initialised = true;
 }
@@ -122,12 +110,11 @@ void _rotate()
         ++archive_count;
 }
 
-// The local time of the second, which threads share a lock for asking: each asks once a second.
-// False when it cannot be told.
+// The local time of a second; the C library is asked once for each. False when it cannot be told.
 bool _localTime(time_t now, struct tm &local)
 {
-    thread_local time_t known_second = -1;
-    thread_local struct tm known;
+    static time_t known_second = -1;
+    static struct tm known;
     if (now != known_second) {
         if (!localtime_r(&now, &known))
             return false;
@@ -155,7 +142,6 @@ size_t _printPrefix(char (&prefix)[prefixSize], const char *file, const char *fu
     return std::min(static_cast<size_t>(std::max(length, 0)), sizeof(prefix) - 1);
 }
 
-// One call of the system for the whole line: what other threads append comes before or after it.
 // On a full disk the rest of the line is lost.
 void _writeLine(int out, char *prefix, size_t prefixLength, const char *message)
 {
@@ -170,7 +156,6 @@ void _writeLine(int out, char *prefix, size_t prefixLength, const char *message)
 off_t _append(const char *file, const char *function, int line, const char *tag,
               const char *message)
 {
-    const SharedLock lock;
     const int out = open(logPath, O_RDWR | O_CREAT | O_APPEND | O_CLOEXEC, 0666);
     if (out < 0)
         return -1;
@@ -182,24 +167,16 @@ off_t _append(const char *file, const char *function, int line, const char *tag,
     return size;
 }
 
-// Two threads may have found the file full: it is packed once.
-void _rotateIfStillFull()
+void _appendLine(const char *file, const char *function, int line, const char *tag,
+                 const char *message)
 {
-    const ExclusiveLock lock;
-    struct stat info;
-    if (stat(logPath, &info) != 0 || info.st_size < rotationSize)
+    const Lock lock;
+    _initialiseOnce();
+    if (_append(file, function, line, tag, message) < rotationSize)
         return;
     _rotate();
     if (truncate(logPath, 0) != 0)
         return; // the next line tries again
-}
-
-void _appendLine(const char *file, const char *function, int line, const char *tag,
-                 const char *message)
-{
-    _initialiseOnce();
-    if (_append(file, function, line, tag, message) >= rotationSize)
-        _rotateIfStillFull();
 }
 
 } // namespace

@@ -4,9 +4,10 @@
 #include "text/Escape.h"
 
 #include <algorithm>
-#include <array>
 #include <cctype>
 #include <ctime>
+#include <iomanip>
+#include <sstream>
 #include <utility>
 #include <vector>
 
@@ -189,11 +190,10 @@ std::string PageLanguage::date(std::int64_t secondsSinceEpoch) const
     const std::time_t time = secondsSinceEpoch;
     std::tm parts{};
     gmtime_r(&time, &parts);
-    std::array<char, 64> written{};
     const std::string format = text("%Y-%m-%d %H:%M UTC");
-    return std::strftime(written.data(), written.size(), format.c_str(), &parts) > 0
-               ? written.data()
-               : readableDate(secondsSinceEpoch);
+    std::ostringstream written;
+    written << std::put_time(&parts, format.c_str());
+    return written.str();
 }
 
 std::string withValue(std::string text, std::string_view place, std::string_view value)
