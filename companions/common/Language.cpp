@@ -30,6 +30,19 @@ Language &language()
     return kept;
 }
 
+// The session's own language, for a locale that is not installed. A wish in LANGUAGE goes before
+// it.
+void nameLanguageOfSession()
+{
+    for (const char *variable : {"LC_ALL", "LC_MESSAGES", "LANG"}) {
+        const char *value = getenv(variable);
+        if (!value || !*value)
+            continue;
+        setenv("LANGUAGE", (std::string(value) + ":en").c_str(), 0);
+        return;
+    }
+}
+
 // Message catalogues are looked up by LANGUAGE as soon as the locale is any but "C".
 void applyLanguage()
 {
@@ -39,8 +52,11 @@ void applyLanguage()
         setenv("LANGUAGE", (std::string(name.get()) + ":en").c_str(), 1);
     }
     const char *locale = setlocale(LC_ALL, "");
-    if (!locale || std::strcmp(setlocale(LC_MESSAGES, nullptr), "C") == 0)
+    if (!locale || std::strcmp(setlocale(LC_MESSAGES, nullptr), "C") == 0) {
+        if (!name)
+            nameLanguageOfSession();
         setlocale(LC_ALL, "C.UTF-8");
+    }
     elm_language_set(name ? name.get() : "");
 }
 

@@ -6,6 +6,7 @@ import socket
 import stat
 import subprocess
 import sys
+import tempfile
 import unittest
 
 HERE = os.path.dirname(os.path.abspath(__file__))
@@ -290,9 +291,9 @@ class Cancelling(SignInCase):
 
 
 class ByItself(SignInCase):
-    def start(self):
+    def start(self, **environment):
         screen.wait_active(WINDOW, False)
-        self.program = subprocess.Popen(["korrin"])
+        self.program = subprocess.Popen(["korrin"], env=os.environ | environment)
         self.addCleanup(self.stop)
 
     def stop(self):
@@ -343,6 +344,13 @@ class ByItself(SignInCase):
                   "type", "--delay", "1", "--args", "1", account_command("invite"), "key", "Return")
         screen.wait_for_control("You are signed in")
         self.assertEqual(NUMBER, self.account()["number"])
+
+    def test_speaks_the_language_of_a_session_whose_locale_is_not_installed(self):
+        with tempfile.TemporaryDirectory() as without_keys:
+            self.start(LANG="fr_FR.UTF-8", XDG_DATA_HOME=without_keys)
+            screen.wait_for_control("Se connecter", "button")
+            screen.key("Escape")
+            self.assertEqual(0, self.program.wait(world.LIMIT))
 
     def test_speaks_german(self):
         setter = os.path.join(os.environ["PELLIKO_BUILD"], "tests", "key-setter")
