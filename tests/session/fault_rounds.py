@@ -34,10 +34,14 @@ class Stage:
         self.outbox = world.Follower(os.environ["PELLIKO_SMS_OUTBOX"])
         self.application = world.BusName(world.APP)
         self.bus = Gio.bus_get_sync(Gio.BusType.SESSION)
+        # Waiting for the end of a request is looked at again when the service tells of a change.
+        self.changes = self.bus.signal_subscribe(world.SERVICE, "com.velmora.pelliko.Shares1", "Changed", None, None,
+                                                 Gio.DBusSignalFlags.NONE, lambda *_: None)
         self.display = Xlib.display.Display()
         self.button = None
 
     def close(self):
+        self.bus.signal_unsubscribe(self.changes)
         self.panel.close()
         self.display.close()
 
@@ -184,16 +188,24 @@ class Round:
         self.status = os.waitstatus_to_exitcode(self.ended[0])
         self.said = self.lines()
         # The service may bring up another one, which this plan has no part in.
-        world.wait_for(lambda: self.stage.application.owner is None, "the application to be gone", LIMIT)
+        world.wait_for(lambda: self._all_ended() and self.stage.application.owner is None,
+                       "the request to end and the application to be gone", LIMIT)
         self.posted = [(item.get("title") or item.get("text", ""), item.get("tag", ""))
                        for item in self.stage.panel.items[self.panel_before:]
                        if item.get("app") == world.APP and item["event"] == "post"]
         self.messages = len(self.stage.outbox.read()) - self.outbox_before
-        self.requests = [request["state"] for request in world.requests() if request["id"] not in self.requests_before]
+        self.requests = self._states()
         self.report = self._read("report.")
         self.errors = self._read("errors")
         self.trace = self._read("trace").splitlines()
         self.hit = any(line.endswith(" failed") for line in self.trace)
+
+    def _states(self):
+        return [request["state"] for request in world.requests() if request["id"] not in self.requests_before]
+
+    def _all_ended(self):
+        """Messages that could not be sent are asked for once more, which changes what became of a share."""
+        return all(state in ("shared", "failed", "cancelled") for state in self._states())
 
     def _read(self, beginning):
         text = ""
