@@ -19,7 +19,7 @@ TEST_F(ConfirmationPopup, OneRecipientGetsTheSingleLayoutWithASummary)
 {
     share(1, 1500, {{"Anna Müller", true}});
     openPopup();
-    photograph("confirmation-single");
+    picture = "confirmation-single";
     EXPECT_THAT(log.messages(), Contains("Setting confirmation_popup_share_view_single"));
     EXPECT_THAT(log.messages(), Contains("ad->operation_type =4,g_total_recipients =1"));
     EXPECT_STREQ(elm_object_part_text_get(ad->popup, "title,text"), "Share files via Pelliko");
@@ -46,7 +46,7 @@ TEST_F(ConfirmationPopup, SeveralRecipientsGetAHeadingAndARow)
            {"محمد", true},
            {"Zoë & <b>Co</b>", false, "/nowhere.png"}});
     openPopup();
-    photograph("confirmation-several");
+    picture = "confirmation-several";
     EXPECT_EQ(layoutText("elm.swallow.label.text"), "Recipients (6)");
     EXPECT_EQ(body(),
               "4 files (3.00MB)<br><br>2 files are not supported and will not be shared. To "
@@ -78,7 +78,7 @@ TEST_F(ConfirmationPopup, ReshareAsksTheServiceForTheFilesAndShowsWhateverTheirS
     ad->req_id_to_reshare = 5;
     share(0, 0, {{"Anna Müller", true}, {"Bob"}});
     openPopup();
-    photograph("confirmation-reshare");
+    picture = "confirmation-reshare";
     EXPECT_THAT(service.calls(), ::testing::ElementsAre("GetUploadInfo (5,)"));
     EXPECT_EQ(ad->upload_item->files_count, 3);
     EXPECT_EQ(ad->upload_item->files_size, 5000000);
@@ -107,7 +107,7 @@ TEST_F(ConfirmationPopup, LanguageChangeRetextsTheOpenPopup)
     Evas_Object *popup = ad->popup;
     speak("de_DE.UTF-8");
     ASSERT_TRUE(settle(button("button2")));
-    photograph("confirmation-german");
+    picture = "confirmation-german";
     EXPECT_EQ(ad->popup, popup);
     EXPECT_STREQ(elm_object_part_text_get(ad->popup, "title,text"), "Dateien über Pelliko teilen");
     EXPECT_EQ(body(), "1 Datei wird nicht unterstützt und nicht geteilt. Nur über WLAN teilen, um "
@@ -150,7 +150,7 @@ TEST_F(ConfirmationPopup, WholeRowOfTheCheckBoxAnswersToThePointer)
     EXPECT_TRUE(waitUntil([this] { return ad->wifi_check == 1; }));
     EXPECT_TRUE(elm_check_state_get(ad->wifi_check_box));
     ASSERT_TRUE(settle(ad->wifi_check_box));
-    photograph("confirmation-wifi-only");
+    picture = "confirmation-wifi-only";
     press(ad->wifi_check_box);
     EXPECT_TRUE(waitUntil([this] { return ad->wifi_check == 0; }));
     EXPECT_FALSE(elm_check_state_get(ad->wifi_check_box));

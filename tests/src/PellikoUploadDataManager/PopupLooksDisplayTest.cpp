@@ -66,9 +66,8 @@ protected:
     void open(const std::string &name)
     {
         _createPopupView(ad);
-        ASSERT_TRUE(settle(button("button2")));
-        ASSERT_TRUE(settle(ad->popup_layout));
-        photograph("looks-" + name + "-" + size);
+        picture = "looks-" + name + "-" + size;
+        ASSERT_TRUE(settle({button("button2"), ad->popup_layout}));
     }
 
     static const Evas_Object *part(const Evas_Object *widget, const char *name)
@@ -252,13 +251,14 @@ TEST_P(PopupLooks, ProcessingContacts)
     _showProcessingPopup(ad);
     Evas_Object *layout = elm_object_content_get(ad->processing_popup);
     ASSERT_TRUE(settle(layout));
-    photograph("looks-processing-" + size);
+    picture = "looks-processing-" + size;
     expectWholeLine(layout, "elm.text");
     const Box ring = boxOf(elm_object_part_content_get(layout, "processing"));
     EXPECT_EQ(ring.width, ring.height);
     EXPECT_GT(ring.width, 0);
     const Box words = boxOf(part(layout, "elm.text"));
     EXPECT_LE(ring.x + ring.width, words.x);
+    keepPicture();
     evas_object_del(ad->processing_popup);
 }
 
@@ -279,7 +279,7 @@ protected:
         _createPopupView(ad);
         const Evas_Object *ok = elm_object_part_content_get(button("button1"), "ok_button");
         ASSERT_TRUE(settle(ok));
-        photograph("looks-status-" + name + "-" + size);
+        picture = "looks-status-" + name + "-" + size;
         expectWholeTitle();
         expectWholeLine(ok, "elm.text");
         expectWholeBlock(part(ad->popup_layout, "elm.swallow.text"), "status line");

@@ -41,7 +41,7 @@ protected:
 TEST_F(ShareFailPopup, TellsWhatHappenedAndOffersOneButton)
 {
     Evas_Object *popup = open();
-    photograph("share-failed");
+    picture = "share-failed";
     EXPECT_STREQ(elm_object_part_text_get(popup, "title,text"), "Sharing failed");
     EXPECT_STREQ(elm_object_text_get(popup),
                  "Pelliko is temporarily not available. Try again later.");

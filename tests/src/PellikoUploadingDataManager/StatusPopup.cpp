@@ -252,7 +252,7 @@ TEST_F(StatusPopup, LanguageChangesEveryTextOfOne)
     EXPECT_STREQ(elm_object_text_get(ad->cancel_button), "Abbrechen");
     EXPECT_STREQ(elm_object_text_get(okButton()), "OK");
     ASSERT_TRUE(settle(ad->cancel_button));
-    photograph("status-german");
+    picture = "status-german";
 }
 
 TEST_F(StatusPopup, LanguageChangesEveryTextOfSeveral)
@@ -263,7 +263,7 @@ TEST_F(StatusPopup, LanguageChangesEveryTextOfSeveral)
     EXPECT_EQ(statusLine(), "Einige Dateien wurden während des Sendens verschoben, gelöscht oder "
                             "umbenannt.");
     ASSERT_TRUE(settle(okButton()));
-    photograph("status-german-several");
+    picture = "status-german-several";
 }
 
 TEST_F(StatusPopup, LanguageChangeWritesNoLineWithoutAState)

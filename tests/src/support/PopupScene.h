@@ -6,9 +6,11 @@
 #include "PellikoUploadDataManager/UploadItem.h"
 #include "PellikoUploadDataManager/UploadNotiData.h"
 #include "support/FileLog.h"
+#include "support/MainLoop.h"
 
 #include <Elementary.h>
 #include <WApp.h>
+#include <algorithm>
 #include <cstdlib>
 #include <filesystem>
 #include <functional>
@@ -16,8 +18,10 @@
 #include <gtest/gtest.h>
 #include <memory>
 #include <string>
+#include <utility>
 #include <vconf-keys.h>
 #include <vconf.h>
+#include <vector>
 
 namespace pelliko::test
 {
@@ -40,6 +44,8 @@ protected:
         elm_policy_set(ELM_POLICY_QUIT, ELM_POLICY_QUIT_NONE);
         elm_app_base_scale_set(1.8);
     }
+
+    void TearDown() override { keepPicture(); }
 
     PopupScene()
     {
@@ -113,22 +119,10 @@ protected:
         ecore_main_loop_begin();
     }
 
-    /// Runs the loop, which sleeps until something happens, until the condition holds.
+    /// Serves the loop's events until the condition holds.
     static bool waitUntil(const std::function<bool()> &condition, double seconds = 10)
     {
-        bool late = false;
-        Ecore_Timer *limit = ecore_timer_add(
-            seconds,
-            [](void *data) -> Eina_Bool {
-                *static_cast<bool *>(data) = true;
-                return ECORE_CALLBACK_CANCEL;
-            },
-            &late);
-        while (!condition() && !late)
-            ecore_main_loop_iterate_may_block(1);
-        if (!late)
-            ecore_timer_del(limit);
-        return !late;
+        return MainLoop::instance().runUntil(condition, seconds);
     }
 
     struct Box {
@@ -143,22 +137,23 @@ protected:
         return box;
     }
 
-    /// Waits until the object stands still for a quarter of a second of frames: it slid in.
-    static bool settle(const Evas_Object *object)
+    /// Waits until the objects stand still for a quarter of a second of frames: they slid in.
+    static bool settle(std::vector<const Evas_Object *> objects)
     {
         struct Watch {
-            const Evas_Object *object;
-            Box last;
+            std::vector<const Evas_Object *> objects;
+            std::vector<Box> last;
             int same;
-        } watch = {object, {}, 0};
+        } watch = {std::move(objects), {}, 0};
         Ecore_Animator *frames = ecore_animator_add(
             [](void *data) -> Eina_Bool {
                 auto *of = static_cast<Watch *>(data);
                 // On a busy machine frames go by before a layout that waits is made.
-                evas_smart_objects_calculate(evas_object_evas_get(of->object));
-                const Box now = boxOf(of->object);
+                evas_smart_objects_calculate(evas_object_evas_get(of->objects.front()));
+                std::vector<Box> now(of->objects.size());
+                std::transform(of->objects.begin(), of->objects.end(), now.begin(), boxOf);
                 of->same = now == of->last ? of->same + 1 : 0;
-                of->last = now;
+                of->last = std::move(now);
                 return ECORE_CALLBACK_RENEW;
             },
             &watch);
@@ -166,6 +161,8 @@ protected:
         ecore_animator_del(frames);
         return still;
     }
+
+    static bool settle(const Evas_Object *object) { return settle(std::vector{object}); }
 
     static int run(const std::string &command) { return system(command.c_str()); }
 
@@ -193,6 +190,15 @@ protected:
         EXPECT_EQ(run("import -window root '" + folder + "/" + name + ".png'"), 0);
     }
 
+    /// Photographs what has a picture's name when the case failed or a person wants to look at it:
+    /// writing one takes longer than the case itself.
+    void keepPicture()
+    {
+        if (!picture.empty() && (HasFailure() || getenv("PELLIKO_KEEP_PICTURES")))
+            photograph(picture);
+        picture.clear();
+    }
+
     Evas_Object *button(const char *part) const
     {
         return elm_object_part_content_get(ad->popup, part);
@@ -213,6 +219,7 @@ protected:
     PellikoAppData *ad = getAppData();
     std::unique_ptr<app_assist::WApp> app;
     FileLog log;
+    std::string picture; ///< the name of what is on the screen
 };
 
 } // namespace pelliko::test
