@@ -39,7 +39,7 @@ TEST_F(StatusPopup, SendingToOneShowsBarSizeAndCancel)
 TEST_F(StatusPopup, SeveralRecipientsHaveAHeadingAndBadges)
 {
     log.restart();
-    tap({.state = NOTI_STATE_PREPARING, .recipients = {"Ann+SMS", "Bo", "SMS +SMS x"}});
+    launch({.state = NOTI_STATE_PREPARING, .recipients = {"Ann+SMS", "Bo", "SMS +SMS x"}});
     EXPECT_EQ(heading(), "Recipients (3)");
     const auto lines = log.messages();
     EXPECT_THAT(lines, Contains("Setting popup_share_view_multiple"));
@@ -82,11 +82,11 @@ TEST_F(StatusPopup, SizesArePrintedInTheirUnit)
         {1048575, "3 files (1024.00 KB)"},
     };
     for (const auto &[bytes, line] : sizes) {
-        tap({.bytes = bytes});
+        launch({.bytes = bytes});
         EXPECT_EQ(sizeLine(), line);
     }
     for (const int bytes : {0, -5}) {
-        tap({.bytes = bytes});
+        launch({.bytes = bytes});
         EXPECT_EQ(sizeLine(), "");
     }
 }
@@ -97,14 +97,14 @@ TEST_F(StatusPopup, OnlyAnUploadWithABarIsAskedForItsProgress)
     const std::pair<int, int> lookups[] = {{0, 0}, {1, 1}, {2, 1}, {3, 1}, {5, 0}, {6, 0}};
     for (const auto &[state, times] : lookups) {
         log.restart();
-        tap({.state = state});
+        launch({.state = state});
         EXPECT_THAT(log.messages(), Contains("Request id found = 7").Times(times)) << state;
     }
 }
 
 TEST_F(StatusPopup, FirstProgressBringsTheButtonAndTheSendingLine)
 {
-    tap({.state = NOTI_STATE_PREPARING});
+    launch({.state = NOTI_STATE_PREPARING});
     updatePopupStatus(1, 0, 0);
     EXPECT_EQ(statusLine(), "Preparing to send files…");
     updatePopupStatus(2, 0.0, 0);
@@ -126,7 +126,7 @@ TEST_F(StatusPopup, FirstProgressBringsTheButtonAndTheSendingLine)
 
 TEST_F(StatusPopup, PauseIsShownAndTheNextProgressGoesOn)
 {
-    tap({});
+    launch({});
     updatePopupStatus(6, 0, 0);
     EXPECT_EQ(log.messages().back(), "default case...");
     EXPECT_EQ(statusLine(), "Sending paused");
@@ -138,7 +138,7 @@ TEST_F(StatusPopup, PauseIsShownAndTheNextProgressGoesOn)
 
 TEST_F(StatusPopup, FinishedFilesAreFollowedByTheRecipients)
 {
-    tap({});
+    launch({});
     updatePopupStatus(3, 100, 0);
     EXPECT_EQ(statusLine(), "Notifying recipients…");
     EXPECT_EQ(g_noti_press_data.upload_status, NOTI_STATE_SENT);
@@ -154,14 +154,14 @@ TEST_F(StatusPopup, FinishedFilesAreFollowedByTheRecipients)
 TEST_F(StatusPopup, FailureNamesTheServerOrTheDevice)
 {
     for (const int error : {-16, -7, -4}) {
-        tap({});
+        launch({});
         updatePopupStatus(4, 0, error);
         EXPECT_EQ(statusLine(), "A server error has occurred while sending files.");
         EXPECT_EQ(g_noti_press_data.upload_status, NOTI_STATE_FAILED_SERVER);
         expectNoBarAndButton();
     }
     for (const int error : {-18, -5, 1}) {
-        tap({});
+        launch({});
         updatePopupStatus(4, 0, error);
         EXPECT_EQ(statusLine(), "Some files have been moved, deleted or renamed while being sent.");
         EXPECT_EQ(g_noti_press_data.upload_status, NOTI_STATE_FAILED_DEVICE);
@@ -171,14 +171,14 @@ TEST_F(StatusPopup, FailureNamesTheServerOrTheDevice)
 
 TEST_F(StatusPopup, EndOfTheShareDoesNotHideACancel)
 {
-    tap({});
+    launch({});
     updatePopupStatus(5, 0, 0);
     EXPECT_EQ(statusLine(), "Sending has been cancelled.");
     EXPECT_EQ(g_noti_press_data.upload_status, NOTI_STATE_CANCELLED);
     expectNoBarAndButton();
     updatePopupStatus(7, 0, 0);
     EXPECT_EQ(statusLine(), "Sending has been cancelled.");
-    tap({});
+    launch({});
     updatePopupStatus(7, 0, 0);
     EXPECT_EQ(statusLine(), "Files sent");
     EXPECT_EQ(g_noti_press_data.upload_status, NOTI_STATE_SENDING);
@@ -187,7 +187,7 @@ TEST_F(StatusPopup, EndOfTheShareDoesNotHideACancel)
 
 TEST_F(StatusPopup, ReportsReachNoPopupThatIsNotItsOwn)
 {
-    tap({});
+    launch({});
     popup_update_enabled = 0;
     updatePopupStatus(5, 0, 0);
     EXPECT_EQ(statusLine(), "Sending…");
@@ -207,7 +207,7 @@ TEST_F(StatusPopup, EndOfAnotherUploadChangesNothing)
     pending(10, 7);
     pending(10, 8);
     pending(10, 9);
-    tap({});
+    launch({});
     report(5, 0, 0, 8);
     report(2, 20, -16, 9);
     ASSERT_TRUE(waitUntil([this] {
@@ -223,7 +223,7 @@ TEST_F(StatusPopup, EndOfAnotherUploadChangesNothing)
 TEST_F(StatusPopup, ProgressOfItsUploadMovesTheBar)
 {
     pending(10);
-    tap({});
+    launch({});
     report(2, 45);
     EXPECT_TRUE(waitUntil([this] { return bar() == 0.45; }));
     report(2, 46, -7);
@@ -234,7 +234,7 @@ TEST_F(StatusPopup, ProgressOfItsUploadMovesTheBar)
 
 TEST_F(StatusPopup, RotationKeepsWhatTheReportsHaveChanged)
 {
-    tap({.state = NOTI_STATE_PREPARING});
+    launch({.state = NOTI_STATE_PREPARING});
     updatePopupStatus(2, 12, 0);
     const Evas_Object *popup = ad->popup;
     evas_object_smart_callback_call(ad->win, "wm,rotation,changed", nullptr);
@@ -268,7 +268,7 @@ TEST_F(StatusPopup, LanguageChangesEveryTextOfSeveral)
 
 TEST_F(StatusPopup, LanguageChangeWritesNoLineWithoutAState)
 {
-    tap({});
+    launch({});
     const LaunchRequest untold;
     getUploadData(untold);
     speak("de_DE.UTF-8");

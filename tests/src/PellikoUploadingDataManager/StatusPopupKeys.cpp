@@ -44,9 +44,9 @@ TEST_F(StatusPopup, NextTapMayCancelAgain)
 {
     pending(45, 7);
     const UploadNotiData *other = pending(10, 8);
-    tap({});
+    launch({});
     cancelUploadCb(ad, ad->cancel_button, nullptr);
-    tap({.request_id = 8});
+    launch({.request_id = 8});
     EXPECT_EQ(g_cancel_in_progress, 0);
     cancelUploadCb(ad, ad->cancel_button, nullptr);
     EXPECT_EQ(other->upload_status, 5);
@@ -55,9 +55,9 @@ TEST_F(StatusPopup, NextTapMayCancelAgain)
 
 TEST_F(StatusPopup, UploadThatHasEndedCanBeTappedTwiceInARow)
 {
-    tap({});
+    launch({});
     const Evas_Object *first = ad->popup;
-    tap({});
+    launch({});
     EXPECT_NE(ad->popup, first);
     EXPECT_EQ(bar(), 0.0);
     cancelUploadCb(ad, ad->cancel_button, nullptr);
@@ -97,7 +97,7 @@ TEST_F(StatusPopup, OkEndsTheApplicationWithAnUploadThatHasEnded)
 
 TEST_F(StatusPopup, ClosingTheWindowIsOk)
 {
-    tap({.state = 6});
+    launch({.state = 6});
     evas_object_smart_callback_call(ad->win, "delete,request", nullptr);
     EXPECT_EQ(ad->popup, nullptr);
     EXPECT_EQ(log.messages().back(), quits);
@@ -107,7 +107,7 @@ TEST_F(StatusPopup, TapTakesThePlaceOfAnOpenConfirmation)
 {
     share(1, 1500, {{"Ann"}, {"Bo"}});
     _createPopupView(ad);
-    tap({});
+    launch({});
     EXPECT_TRUE(isStatusPopup(ad));
     EXPECT_EQ(elm_object_part_content_get(ad->popup, "button2"), nullptr);
     EXPECT_EQ(ad->wifi_check_box, nullptr);

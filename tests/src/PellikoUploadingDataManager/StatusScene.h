@@ -49,8 +49,15 @@ protected:
             .text("total_size", std::to_string(tapped.bytes));
     }
 
-    /// What the launch of a tapped notification does.
+    /// What the launch of a tapped notification does; the popup stands still, as a person meets it.
     void tap(const Tapped &tapped)
+    {
+        launch(tapped);
+        ASSERT_TRUE(settle(okButton()));
+    }
+
+    /// The same, while the popup still slides in: nobody presses it or looks at its place.
+    void launch(const Tapped &tapped)
     {
         LaunchRequest request;
         writeExtras(request, tapped);
@@ -59,7 +66,6 @@ protected:
         is_noti_pressed = 1;
         getUploadData(request);
         doOperation(ad);
-        ASSERT_TRUE(settle(okButton()));
     }
 
     /// An upload that the service has accepted.
