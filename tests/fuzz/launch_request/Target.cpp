@@ -160,7 +160,8 @@ void tryMessages(app_control_h request)
     const SmsJob job = makeSmsJob(&record);
     promise(record.to_msisdn_count == static_cast<int32_t>(job.to_msisdn_list.size()),
             "every recipient gets a message");
-    for (char *text : {record.url, record.from_msisdn, record.expired_time, record.req_id})
+    for (char *text :
+         {record.url, record.from_msisdn, record.expired_time, record.req_id, record.sms_key})
         g_free(text);
     void *number = nullptr;
     EINA_LIST_FREE(record.to_msisdn_list, number) g_free(number);
