@@ -11,9 +11,7 @@ namespace
 {
 using Invocation = GDBusMethodInvocation;
 
-constexpr const char *objectPath = "/com/velmora/pelliko/Service";
 constexpr const char *interfaceName = "com.velmora.pelliko.Service1";
-constexpr const char *initializingError = "com.velmora.pelliko.Service.Error.Initializing";
 // A usual start is over long before; a caller on its main loop is not held longer.
 constexpr guint longestHoldMs = 2'000;
 
@@ -51,11 +49,7 @@ ServiceObject::ServiceObject(GDBusConnection *bus)
 {
     connectRequests();
     connectReports();
-    g_autoptr(GError) error = nullptr;
-    if (!g_dbus_interface_skeleton_export(G_DBUS_INTERFACE_SKELETON(skeleton_), bus, objectPath,
-                                          &error)) {
-        g_warning("the service cannot be put on the bus: %s", error->message);
-    }
+    exportOnBus(G_DBUS_INTERFACE_SKELETON(skeleton_), bus, "the service");
 }
 
 ServiceObject::~ServiceObject()
@@ -121,10 +115,10 @@ void ServiceObject::connectReports()
 }
 
 // The parameters of a call live as long as its invocation, which is answered by the call.
-gboolean ServiceObject::hold(GDBusMethodInvocation *invocation, Call call)
+gboolean ServiceObject::hold(GDBusMethodInvocation *invocation, BusCall call)
 {
     if (!uploads_) {
-        held_.push_back({invocation, std::move(call)});
+        held_.add(invocation, std::move(call));
         if (holdTimer_ == 0) {
             holdTimer_ = g_timeout_add(
                 longestHoldMs,
@@ -137,13 +131,7 @@ gboolean ServiceObject::hold(GDBusMethodInvocation *invocation, Call call)
         }
         return TRUE;
     }
-    try {
-        call();
-    } catch (const std::exception &fault) {
-        g_warning("a call cannot be answered: %s", fault.what());
-        g_dbus_method_invocation_return_error_literal(invocation, G_DBUS_ERROR, G_DBUS_ERROR_FAILED,
-                                                      "the queue cannot be read");
-    }
+    answerCall(invocation, call);
     return TRUE;
 }
 
@@ -152,10 +140,7 @@ void ServiceObject::refuseHeld()
     if (holdTimer_ != 0) {
         g_source_remove(std::exchange(holdTimer_, 0));
     }
-    for (const Held &held : std::exchange(held_, {})) {
-        g_dbus_method_invocation_return_dbus_error(held.invocation, initializingError,
-                                                   "the queue is still being loaded");
-    }
+    held_.refuse("the queue is still being loaded");
 }
 
 void ServiceObject::open(RequestContext &context, Uploads &uploads, ResumeLauncher &resume)
@@ -163,9 +148,7 @@ void ServiceObject::open(RequestContext &context, Uploads &uploads, ResumeLaunch
     context_ = &context;
     uploads_ = &uploads;
     resume_ = &resume;
-    for (const Held &held : std::exchange(held_, {})) {
-        hold(held.invocation, held.call);
-    }
+    held_.answer();
     refuseHeld(); // stops the timer
 }
 
@@ -175,7 +158,7 @@ void ServiceObject::emit(const std::string &listener, int32_t id, const RequestR
     GVariant *values =
         g_variant_new("(ii^ayixi)", id, static_cast<gint>(report.status), report.input.c_str(),
                       report.percent, static_cast<gint64>(report.expires), report.error);
-    if (!g_dbus_connection_emit_signal(bus_, listener.c_str(), objectPath, interfaceName,
+    if (!g_dbus_connection_emit_signal(bus_, listener.c_str(), busObjectPath, interfaceName,
                                        "UploadStatus", values, &error)) {
         g_warning("request %d: a report was not sent: %s", id, error->message);
     }

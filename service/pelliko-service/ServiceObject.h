@@ -1,5 +1,6 @@
 #pragma once
 
+#include "BusObject.h"
 #include "ResumeLauncher.h"
 #include "Uploads.h"
 
@@ -27,16 +28,10 @@ public:
     void emit(const std::string &listener, int32_t id, const RequestReport &report);
 
 private:
-    using Call = std::function<void()>;
-    struct Held {
-        GDBusMethodInvocation *invocation;
-        Call call;
-    };
-
     void on(const char *signal, GCallback handler);
     void connectRequests();
     void connectReports();
-    gboolean hold(GDBusMethodInvocation *invocation, Call call);
+    gboolean hold(GDBusMethodInvocation *invocation, BusCall call);
     void refuseHeld();
     void watch(const std::string &client);
     static void onClientVanished(GDBusConnection *, const char *name, gpointer self);
@@ -54,7 +49,7 @@ private:
     RequestContext *context_ = nullptr;
     Uploads *uploads_ = nullptr;
     ResumeLauncher *resume_ = nullptr;
-    std::vector<Held> held_;
+    HeldCalls held_;
     guint holdTimer_ = 0;
     std::map<std::string, guint> watches_;
 };

@@ -11,9 +11,7 @@ namespace
 {
 using Invocation = GDBusMethodInvocation;
 
-constexpr const char *objectPath = "/com/velmora/pelliko/Service";
 constexpr const char *interfaceName = "com.velmora.pelliko.Shares1";
-constexpr const char *initializingError = "com.velmora.pelliko.Service.Error.Initializing";
 // Changes come in showers, and whoever hears of one asks for the whole list.
 constexpr guint changedDelayMs = 100;
 
@@ -35,11 +33,7 @@ SharesObject::SharesObject(GDBusConnection *bus)
     connectLists();
     connectChanges();
     connectDownloads();
-    g_autoptr(GError) error = nullptr;
-    if (!g_dbus_interface_skeleton_export(G_DBUS_INTERFACE_SKELETON(skeleton_), bus, objectPath,
-                                          &error)) {
-        g_warning("the shares cannot be put on the bus: %s", error->message);
-    }
+    exportOnBus(G_DBUS_INTERFACE_SKELETON(skeleton_), bus, "the shares");
 }
 
 SharesObject::~SharesObject()
@@ -53,17 +47,12 @@ SharesObject::~SharesObject()
 void SharesObject::open(const Parts &parts)
 {
     parts_.emplace(parts);
-    for (const Held &held : std::exchange(held_, {})) {
-        hold(held.invocation, held.call);
-    }
+    held_.answer();
 }
 
 void SharesObject::close()
 {
-    for (const Held &held : std::exchange(held_, {})) {
-        g_dbus_method_invocation_return_dbus_error(held.invocation, initializingError,
-                                                   "the service ends");
-    }
+    held_.refuse("the service ends");
     for (const auto &[caller, watch] : std::exchange(watches_, {})) {
         g_bus_unwatch_name(watch);
     }
@@ -149,19 +138,13 @@ void SharesObject::connectDownloads()
 
 // A call outlives the emission that brought it, and with it the texts among its parameters: it owns
 // copies of those.
-gboolean SharesObject::hold(GDBusMethodInvocation *invocation, Call call)
+gboolean SharesObject::hold(GDBusMethodInvocation *invocation, BusCall call)
 {
     if (!parts_) {
-        held_.push_back({invocation, std::move(call)});
+        held_.add(invocation, std::move(call));
         return TRUE;
     }
-    try {
-        call();
-    } catch (const std::exception &fault) {
-        g_warning("a call cannot be answered: %s", fault.what());
-        g_dbus_method_invocation_return_error_literal(invocation, G_DBUS_ERROR, G_DBUS_ERROR_FAILED,
-                                                      "the queue cannot be read");
-    }
+    answerCall(invocation, call);
     return TRUE;
 }
 
@@ -231,7 +214,7 @@ void SharesObject::emitProgress(const DownloadKey &key, const DownloadProgress &
         g_variant_new("(uixx)", key.number, progress.file, static_cast<gint64>(progress.done),
                       static_cast<gint64>(progress.total));
     // A caller that has gone is noticed by its watch.
-    g_dbus_connection_emit_signal(bus_, key.caller.c_str(), objectPath, interfaceName,
+    g_dbus_connection_emit_signal(bus_, key.caller.c_str(), busObjectPath, interfaceName,
                                   "DownloadProgress", values, nullptr);
 }
 

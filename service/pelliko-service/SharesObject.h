@@ -1,6 +1,7 @@
 // The lists of shares and the downloads on the bus
 #pragma once
 
+#include "BusObject.h"
 #include "Downloads.h"
 #include "ReceivedShares.h"
 #include "Uploads.h"
@@ -38,17 +39,11 @@ public:
     void emitProgress(const DownloadKey &key, const DownloadProgress &progress);
 
 private:
-    using Call = std::function<void()>;
-    struct Held {
-        GDBusMethodInvocation *invocation;
-        Call call;
-    };
-
     void on(const char *signal, GCallback handler);
     void connectLists();
     void connectChanges();
     void connectDownloads();
-    gboolean hold(GDBusMethodInvocation *invocation, Call call);
+    gboolean hold(GDBusMethodInvocation *invocation, BusCall call);
     void getReceived(GDBusMethodInvocation *call, const std::string &token, bool fresh);
     void download(GDBusMethodInvocation *call, guint number, const DownloadWish &wish);
     void watch(const std::string &caller);
@@ -57,7 +52,7 @@ private:
     GDBusConnection *bus_;
     PellikoShares1 *skeleton_;
     std::optional<Parts> parts_;
-    std::vector<Held> held_;
+    HeldCalls held_;
     std::map<std::string, guint> watches_;
     guint changedTimer_ = 0;
 };
