@@ -66,6 +66,16 @@ protected:
         ASSERT_TRUE(reply) << error->message;
     }
 
+    // The proxy keeps the rest back until it gets a signal.
+    void stopInTheMiddleOfAWifiOnlyUpload(int32_t &id)
+    {
+        startServer();
+        startProxy(3'000'000);
+        startService({"--chunk", "1000000"});
+        ASSERT_EQ(request({makeFile("film.mp4", 10'000'000)}, &id, true), 0);
+        ASSERT_TRUE(runUntil([&] { return proxy_->lines().back() == "stalled"; }));
+    }
+
     std::unique_ptr<Process> manager_;
     GDBusConnection *bus_ = nullptr;
 };
@@ -89,13 +99,9 @@ TEST_F(UploadNetwork, aWifiOnlyShareWaitsOnAMeteredNetworkAndGoesOnByItself)
 
 TEST_F(UploadNetwork, aNetworkThatBecomesMeteredStopsAWifiOnlyUploadInTheMiddle)
 {
-    startServer();
     RecordingApplication application;
-    startProxy(3'000'000);
-    startService({"--chunk", "1000000"});
     int32_t id = 0;
-    ASSERT_EQ(request({makeFile("film.mp4", 10'000'000)}, &id, true), 0);
-    ASSERT_TRUE(runUntil([&] { return proxy_->lines().back() == "stalled"; }));
+    ASSERT_NO_FATAL_FAILURE(stopInTheMiddleOfAWifiOnlyUpload(id));
     setMetered(metered);
     ASSERT_TRUE(waitForStatus(id, 6));
     proxy_->signal(SIGUSR1);
@@ -120,13 +126,9 @@ TEST_F(UploadNetwork, anyOtherShareUsesTheMeteredNetwork)
 
 TEST_F(UploadNetwork, changesInQuickSuccessionEndInTheLastState)
 {
-    startServer();
     RecordingApplication application;
-    startProxy(3'000'000);
-    startService({"--chunk", "1000000"});
     int32_t id = 0;
-    ASSERT_EQ(request({makeFile("film.mp4", 10'000'000)}, &id, true), 0);
-    ASSERT_TRUE(runUntil([&] { return proxy_->lines().back() == "stalled"; }));
+    ASSERT_NO_FATAL_FAILURE(stopInTheMiddleOfAWifiOnlyUpload(id));
     for (int i = 0; i < 10; ++i) {
         setMetered(metered);
         setMetered(notMetered);
