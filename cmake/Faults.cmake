@@ -1,8 +1,7 @@
-# pelliko_faulty(TARGET LIBS libs...): where the tests are built, the calls that the static library TARGET makes
-# of public headers of platform/ and service/ go through the fault plan (platform/faults). LIBS are the libraries
-# that TARGET calls.
+# pelliko_faulty(TARGET LIBS libs...): where there is a fault plan (platform/faults), the calls that the static library TARGET
+# makes of public headers of platform/ and service/ go through it. LIBS are the libraries that TARGET calls.
 function(pelliko_faulty target)
-  if(NOT PELLIKO_TESTS)
+  if(NOT TARGET platform_faults)
     return()
   endif()
   cmake_parse_arguments(arg "" "" "LIBS" ${ARGN})
