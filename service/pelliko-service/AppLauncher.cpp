@@ -106,7 +106,7 @@ LaunchResult resultOf(GVariant *reply)
 }
 
 // The messages are settled when the application says so, which may be minutes after the launch.
-Answered settlementFor(std::function<void(LaunchResult)> done)
+Answered settlementFor(const std::function<void(LaunchResult)> &done)
 {
     return [receipt = receiptFor(done), done](GVariant *reply, const GError *error) {
         if (reply) {

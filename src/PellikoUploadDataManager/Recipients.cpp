@@ -80,7 +80,7 @@ Step _appendRecipient(UploadItem &item, int32_t number_id, RecipientRecords &rec
     item.recipient_list = eina_list_append(item.recipient_list, recipient.get());
     // Without memory for its entry the list stays as it was.
     if (eina_list_last_data_get(item.recipient_list) == recipient.get())
-        recipient.release();
+        static_cast<void>(recipient.release());
     if (item.recipient_list)
         LOG_DEBUG("recipient_list is valid");
     else

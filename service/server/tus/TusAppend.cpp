@@ -117,7 +117,7 @@ Task<std::uint64_t> appendBody(Exchange &exchange, Context &context, std::int64_
     if (current.file.blob != before.file.blob)
         throw Refusal(Error::conflict, "The upload was dropped meanwhile.");
     checkAppend(exchange.request(), current, offset);
-    const std::shared_ptr<ActiveWrite> write = lease.write();
+    const std::shared_ptr<ActiveWrite> &write = lease.write();
     write->written = write->kept = offset;
     Checkpoints checkpoints(context, write);
     std::exception_ptr ending;
