@@ -155,6 +155,14 @@ int saveNumber(SQLite::Database &database, int contact_id, const CardNumber &num
     return number_id;
 }
 
+// Numbers that only an earlier card had stay; one of them may have been preferred then.
+void preferNone(SQLite::Database &database, int contact_id)
+{
+    SQLite::Statement update(database, "UPDATE numbers SET is_default = 0 WHERE contact_id = ?");
+    update.bind(1, contact_id);
+    update.exec();
+}
+
 void removeNumber(SQLite::Database &database, int number_id)
 {
     SQLite::Statement unmark(
@@ -197,6 +205,9 @@ SavedContact saveCard(SQLite::Database &database, const ContactCard &card,
     updateContact(database, contact_id, card, picture_path);
 
     SavedContact saved{contact_id, !known, {}};
+    if (std::any_of(card.numbers.begin(), card.numbers.end(),
+                    [](const CardNumber &number) { return number.is_default; }))
+        preferNone(database, contact_id);
     for (const CardNumber &number : card.numbers) {
         saved.number_ids.push_back(saveNumber(database, contact_id, number));
         if (number.joined)

@@ -164,8 +164,7 @@ void AppLauncher::launchSms(const SmsLaunch &data, std::function<void(LaunchResu
     addText(extras, "sms_key", data.key);
     addText(extras, "file_count", std::to_string(data.fileCount));
     addTexts(extras, "to_msisdn", data.numbers);
-    launch(bus_, operationSendText, g_variant_builder_end(&extras), true,
-           settlementFor(done));
+    launch(bus_, operationSendText, g_variant_builder_end(&extras), true, settlementFor(done));
 }
 
 void AppLauncher::launchPush(const std::vector<std::string> &tokens,

@@ -208,6 +208,16 @@ TEST_F(VcardImport, TheMostPreferredNumberIsTheDefault)
     EXPECT_EQ(preferred(), (Rows{"4", "6"}));
 }
 
+TEST_F(VcardImport, ALaterCardsPreferredNumberTakesTheEarlierOnesPlace)
+{
+    imported(card("FN:Ann\r\nTEL;TYPE=pref:1\r\nTEL:2"));
+    imported(card("FN:Ann\r\nTEL:2\r\nTEL;TYPE=pref:3"));
+    EXPECT_EQ(numbers(), (Rows{"1", "2", "3"}));
+    EXPECT_EQ(preferred(), Rows{"3"});
+    imported(card("FN:Ann\r\nTEL:2"));
+    EXPECT_EQ(preferred(), Rows{"3"}) << "a card that prefers none leaves the one that is";
+}
+
 TEST_F(VcardImport, ANumberWithLettersIsKeptAndNamed)
 {
     const ImportReport report =
