@@ -33,6 +33,18 @@ protected:
         return JsonValue::parse(askServer("GET", "/api/v1/shares"))["shares"].size();
     }
 
+    // Whoever holds the queue's lock; while that runs, the service cannot load it.
+    std::unique_ptr<Process> startOnALockedQueue()
+    {
+        startServer();
+        makeAccount();
+        startService();
+        service_->end(SIGTERM);
+        auto locker = lockQueue();
+        startService();
+        return locker;
+    }
+
     static void onSentList(int result, const pelliko_sent_share_s *, int, void *data)
     {
         *static_cast<int *>(data) = result;
@@ -170,12 +182,7 @@ TEST_F(UploadFaults, aTokenThatTheServerDoesNotKnowIsAServerError)
 
 TEST_F(UploadFaults, aQueueThatIsLockedMakesTheServiceSayThatItInitializes)
 {
-    startServer();
-    makeAccount();
-    startService();
-    service_->end(SIGTERM);
-    const auto locker = lockQueue();
-    startService();
+    const auto locker = startOnALockedQueue();
     int listed = 1;
     pelliko_shares_list_sent(onSentList, &listed, nullptr);
     int32_t id = 3;
@@ -193,12 +200,7 @@ TEST_F(UploadFaults, aQueueThatIsLockedMakesTheServiceSayThatItInitializes)
 
 TEST_F(UploadFaults, aServiceThatEndsBeforeItsQueueIsLoadedTellsWhoWaitsForAList)
 {
-    startServer();
-    makeAccount();
-    startService();
-    service_->end(SIGTERM);
-    const auto locker = lockQueue();
-    startService();
+    const auto locker = startOnALockedQueue();
     int listed = 1;
     pelliko_shares_list_sent(onSentList, &listed, nullptr);
     // A call that comes after it is there, so the service has the first one too.
