@@ -16,8 +16,9 @@ function(pelliko_fuzzed)
 endfunction()
 
 # pelliko_fuzz_target(NAME [LIBS libs...] [OPTIONS options...]): the folder NAME beside this list has Target.cpp, the
-# inputs to begin with in corpus/ and words worth trying in dictionary. The test runs all inputs, then new ones for ten seconds;
-# what it finds is kept in the build tree. OPTIONS are the fuzzer's own.
+# inputs to begin with in corpus/ and words worth trying in dictionary. The test runs all inputs, then made-up ones for
+# ten seconds, the same in every run, so that a change is to blame for what it finds, which is kept in the build tree.
+# OPTIONS are the fuzzer's own.
 function(pelliko_fuzz_target name)
   cmake_parse_arguments(arg "" "" "LIBS;OPTIONS" ${ARGN})
   set(program fuzz_${name})
@@ -33,5 +34,6 @@ function(pelliko_fuzz_target name)
   string(JOIN " " options ${arg_OPTIONS})
   file(WRITE "${CMAKE_BINARY_DIR}/fuzz/${name}/options" "${options}\n")
   pelliko_script_test(${program}
-    COMMAND "${PROJECT_SOURCE_DIR}/scripts/fuzz" --build "${CMAKE_BINARY_DIR}" --fresh --seconds 10 ${name} TIMEOUT 90)
+    COMMAND "${PROJECT_SOURCE_DIR}/scripts/fuzz" --build "${CMAKE_BINARY_DIR}" --fresh --seed 1 --seconds 10 ${name}
+    TIMEOUT 90)
 endfunction()

@@ -81,13 +81,14 @@ std::string percentDecoded(const std::string &text)
     return decoded ? decoded.get() : text;
 }
 
-// "tel:+1-202-555-0100;ext=5" is the number up to the parameters.
+// "tel:+1-202-555-0100;ext=5" is the number up to the parameters. An address within an address
+// would be read as another number when the card is written and read again.
 std::string numberText(EVCardAttribute *attribute)
 {
     std::string value = onOneLine(wholeValueOf(attribute));
-    if (g_ascii_strncasecmp(value.c_str(), "tel:", 4) != 0)
-        return value;
-    return onOneLine(percentDecoded(value.substr(4, value.find(';') - 4)));
+    while (g_ascii_strncasecmp(value.c_str(), "tel:", 4) == 0)
+        value = onOneLine(percentDecoded(value.substr(4, value.find(';') - 4)));
+    return value;
 }
 
 void takeTypeWord(const char *word, CardNumber &number, int &preference)

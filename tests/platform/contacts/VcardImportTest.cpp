@@ -123,6 +123,12 @@ TEST_F(VcardImport, ALineEndWithinTheAddressOfANumberIsABlank)
     EXPECT_EQ(numbers(), Rows{"+1 202"});
 }
 
+TEST_F(VcardImport, AnAddressWithinTheAddressOfANumberIsTakenOff)
+{
+    imported(card("FN:Ann\r\nTEL;VALUE=uri:tel:TEL:+1;ext=5") + card("FN:Bob\r\nTEL:tel:%74el:2"));
+    EXPECT_EQ(numbers(), (Rows{"+1", "2"}));
+}
+
 TEST_F(VcardImport, PicturesInsideTheCardAreStored)
 {
     imported(card("FN:Ann\r\nTEL:1\r\nPHOTO;ENCODING=b;TYPE=PNG:iVBORw0K\r\n GgphYmM="));
