@@ -11,8 +11,10 @@ import unittest
 
 HERE = os.path.dirname(os.path.abspath(__file__))
 sys.path.insert(0, os.path.join(HERE, "..", "..", "..", "scripts", "lib"))
+sys.path.insert(0, os.path.join(HERE, "..", "common"))
 sys.dont_write_bytecode = True
 
+import presses  # noqa: E402
 import screen  # noqa: E402
 import tls_server  # noqa: E402
 import world  # noqa: E402
@@ -181,6 +183,8 @@ class Failing(SignInCase):
                 self.sign_in(**fields)
                 self.expect(sentence, name)
                 self.assertFalse(os.path.exists(ACCOUNT))
+                if name == "server_missing":
+                    presses.expect_both_look_pressed("Sign in")
         body = json.dumps({"number": "+4915100000000", "code": used})
         world.run("curl", "-sSf", "-H", "Idempotency-Key: other", "-d", body,
                   f"http://127.0.0.1:{PORT}/api/v1/accounts")

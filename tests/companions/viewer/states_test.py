@@ -9,6 +9,7 @@ sys.path.insert(0, os.path.join(os.path.dirname(os.path.abspath(__file__)), ".."
 
 import companion_case  # noqa: E402
 import doubles  # noqa: E402
+import presses  # noqa: E402
 import screen  # noqa: E402
 import world  # noqa: E402
 
@@ -210,31 +211,7 @@ class SavingFiles(ViewerCase):
         self.service.finish(0, saved)
         self.press("thing.xyzzy, 3 B, Saved. Press to open")
         self.see("No program opens this kind of file. 1 file was saved.")
-
-    def wait_colour(self, x, y, right, what):
-        drawing = screen.Drawing()
-        try:
-            world.wait_for(lambda: right(screen.colour(x, y)), what, 10)
-        finally:
-            drawing.close()
-
-    def test_a_second_press_at_once_looks_pressed_too(self):
-        self.addCleanup(world.run, "xdotool", "mouseup", "1")
-        self.open()
-        for label in ("Save all", "holiday.jpg, 2.4 MB, Press to save"):
-            extents = self.see(label, "button")
-            screen.wait_still(0.2)
-            x, y = extents.x + extents.width // 8, extents.y + extents.height // 2
-            before = screen.colour(x, y + 10)
-            world.run("xdotool", "mousemove", str(x), str(y), "mousedown", "1")
-            self.wait_colour(x, y + 10, lambda now: now != before, f"{label} to look pressed")
-            screen.wait_still(0.2)
-            pressed = screen.colour(x, y + 10)
-            world.run("xdotool", "mousemove", "5", "5", "mouseup", "1", "mousemove", str(x), str(y), "mousedown", "1",
-                      "mouseup", "1", "mousedown", "1")
-            screen.wait_still(0.2)
-            self.wait_colour(x, y + 10, lambda now: now == pressed, f"{label} to look pressed again")
-            world.run("xdotool", "mousemove", "5", "5", "mouseup", "1")
+        presses.expect_both_look_pressed("thing.xyzzy, 3 B, Saved. Press to open")
 
     def test_the_keyboard_is_enough(self):
         self.open()
