@@ -32,10 +32,6 @@ class Faults(share_case.ShareCase):
 
     # --- steps ---
 
-    def watch_panel_again(self):
-        self.panel.close()
-        self.panel = self._watch_panel()
-
     @staticmethod
     def reload_services():
         bus = Gio.bus_get_sync(Gio.BusType.SESSION)
@@ -123,6 +119,7 @@ class Faults(share_case.ShareCase):
         self.assert_downloads_equal(self.messages(1)[0], {"concert.mp4": data})
 
     def test_damaged_databases_do_not_stop_a_share(self):
+        self.panel.close()  # while it begins to watch it would start the panel again
         self.kill("com.velmora.quickpanel")
         self.kill(world.SERVICE)
         paths = [os.path.join(PLATFORM, "notifications.db"), os.path.join(DATA, ".pelliko.db"),
@@ -133,7 +130,7 @@ class Faults(share_case.ShareCase):
                 os.remove(more)
             with open(path, "wb") as file:
                 file.write(b"x" * 20_000)
-        self.watch_panel_again()
+        self.panel = self._watch_panel()
         data = share_case.random_bytes(100_000)
         world.share([self.file("photo.jpg", data)], [self.ann])
         self.confirm()
