@@ -20,7 +20,7 @@ def enter(description, **numbers):
     for name, value in numbers.items():
         parser.add_argument(f"--{name}", type=int, default=value, metavar="N", help=f"default {value}")
     chosen = parser.parse_args()
-    if not os.access(os.path.join(chosen.build, "bin", "pelliko"), os.X_OK):
+    if not os.access(os.path.join(chosen.build, "libexec", "pelliko"), os.X_OK):
         parser.error(f"there are no programs in {chosen.build}: build them, or name another tree with --build")
     if "PELLIKO_STATE" not in os.environ:
         again = ["/usr/bin/python3", "-u", os.path.abspath(sys.argv[0]), *sys.argv[1:]]

@@ -36,12 +36,18 @@ function(pelliko_precompile target)
   endif()
 endfunction()
 
-# pelliko_program(NAME SOURCES... [LIBS libs...]): a program that is installed and put into bin/ of the build.
+# pelliko_program(NAME SOURCES... [LIBS libs...] [HIDDEN]): a program that is installed and put into bin/ of the build;
+# a HIDDEN one, which nobody types, into libexec/.
 function(pelliko_program name)
-  cmake_parse_arguments(arg "" "" "SOURCES;LIBS" ${ARGN})
+  cmake_parse_arguments(arg "HIDDEN" "" "SOURCES;LIBS" ${ARGN})
   add_executable(${name} ${arg_SOURCES})
   target_link_libraries(${name} PRIVATE pelliko_options ${arg_LIBS})
-  install(TARGETS ${name} RUNTIME DESTINATION ${CMAKE_INSTALL_BINDIR})
+  if(arg_HIDDEN)
+    set_target_properties(${name} PROPERTIES RUNTIME_OUTPUT_DIRECTORY "${CMAKE_BINARY_DIR}/libexec")
+    install(TARGETS ${name} RUNTIME DESTINATION ${CMAKE_INSTALL_LIBEXECDIR})
+  else()
+    install(TARGETS ${name} RUNTIME DESTINATION ${CMAKE_INSTALL_BINDIR})
+  endif()
 endfunction()
 
 # Where programs look for their modules, seen from their own folder: the same in the build tree and installed.
@@ -55,20 +61,27 @@ function(pelliko_module name)
   set_target_properties(${name} PROPERTIES PREFIX "" LIBRARY_OUTPUT_DIRECTORY "${CMAKE_RUNTIME_OUTPUT_DIRECTORY}/${pelliko_module_dir}"
                         CXX_VISIBILITY_PRESET hidden VISIBILITY_INLINES_HIDDEN ON)
   target_link_libraries(${name} PRIVATE pelliko_options ${arg_LIBS})
-  install(TARGETS ${name} LIBRARY DESTINATION "${CMAKE_INSTALL_LIBDIR}/pelliko")
+  # The background service loads all of them, and every other program needs that service.
+  install(TARGETS ${name} LIBRARY DESTINATION "${CMAKE_INSTALL_LIBDIR}/pelliko" COMPONENT service)
 endfunction()
 
-# pelliko_activatable(BUS_NAME PROGRAM [UNIT unit]): the bus starts PROGRAM when somebody calls BUS_NAME.
+# pelliko_activatable(BUS_NAME PROGRAM [UNIT unit] [HIDDEN]): the bus starts PROGRAM when somebody calls BUS_NAME.
 # A bus that systemd runs leaves that to the user unit, where systemd would find the installed one.
 # The build tree's file (for sessions) names the program where it was built, the installed one where it goes.
 function(pelliko_activatable bus_name program)
-  cmake_parse_arguments(arg "" "UNIT" "" ${ARGN})
+  cmake_parse_arguments(arg "HIDDEN" "UNIT" "" ${ARGN})
   set(SYSTEMD_SERVICE "")
-  set(EXEC "${CMAKE_RUNTIME_OUTPUT_DIRECTORY}/${program}")
+  set(built "${CMAKE_RUNTIME_OUTPUT_DIRECTORY}")
+  set(installed "${CMAKE_INSTALL_FULL_BINDIR}")
+  if(arg_HIDDEN)
+    set(built "${CMAKE_BINARY_DIR}/libexec")
+    set(installed "${CMAKE_INSTALL_FULL_LIBEXECDIR}")
+  endif()
+  set(EXEC "${built}/${program}")
   set(BUS_NAME "${bus_name}")
   configure_file("${PROJECT_SOURCE_DIR}/dbus/activation.service.in"
                  "${CMAKE_BINARY_DIR}/dbus-services/${bus_name}.service" @ONLY)
-  set(EXEC "${CMAKE_INSTALL_FULL_BINDIR}/${program}")
+  set(EXEC "${installed}/${program}")
   if(arg_UNIT AND CMAKE_INSTALL_PREFIX MATCHES "^/usr(/local)?/?$")
     set(SYSTEMD_SERVICE "SystemdService=${arg_UNIT}\n")
   endif()

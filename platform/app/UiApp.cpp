@@ -2,10 +2,12 @@
 #include "GlibPump.h"
 
 #include <ApplicationId.h>
+#include <FilesReceiver.h>
 #include <Launcher.h>
 #include <RequestReceiver.h>
 
 #include <Elementary.h>
+#include <app_control_delivery.h>
 #include <dlog.h>
 #include <gio/gio.h>
 
@@ -72,6 +74,23 @@ HandOver handOverStart(const Start &start, std::string *error)
 
 enum class Role { First, HandedOver, Failed };
 
+// Files of a command line go where a desktop's go. First when that is this application itself.
+Role passFilesOn(const Start &start)
+{
+    const std::string receiver =
+        start.files.empty() ? applicationId() : receiverOfFiles(applicationId());
+    if (receiver == applicationId())
+        return Role::First;
+    app_control_h request = requestForFiles(start.files);
+    app_control_set_app_id(request, receiver.c_str());
+    const int code = app_control_deliver_launch_request(request);
+    app_control_destroy(request);
+    if (code == APP_CONTROL_ERROR_NONE)
+        return Role::HandedOver;
+    complain(receiver + " cannot be started.");
+    return Role::Failed;
+}
+
 // An instance that is leaving may own the name while it cannot take the request any more; the bus
 // tells either way, so this goes on at once and without waiting.
 Role findRole(RequestReceiver &receiver, const Start &start)
@@ -119,9 +138,13 @@ int ui_app_main(int argc, char **argv, ui_app_lifecycle_callback_s *callback, vo
     const Start start = readStart(argc, argv);
     installGlibPump();
     RequestReceiver receiver(applicationId());
-    const Role role = findRole(receiver, start);
+    Role role = passFilesOn(start);
+    if (role == Role::First)
+        role = findRole(receiver, start);
     if (role != Role::First)
         return role == Role::HandedOver ? APP_ERROR_NONE : APP_ERROR_INVALID_CONTEXT;
+    if (receiver.onlyPassedOn())
+        return APP_ERROR_NONE;
     if (callback->create && !callback->create(user_data))
         return APP_ERROR_INVALID_CONTEXT;
     runLoop(receiver, start, *callback, user_data);

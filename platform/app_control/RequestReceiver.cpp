@@ -1,8 +1,10 @@
 #include "RequestReceiver.h"
 
 #include "ApplicationId.h"
+#include "FilesReceiver.h"
 #include "Handle.h"
 #include "LaunchBus.h"
+#include "Launcher.h"
 #include "Serialisation.h"
 
 #include <com.velmora.Platform.Application1.h>
@@ -71,6 +73,7 @@ struct RequestReceiver::Impl {
     // A call of a desktop, which knows nothing of asking again: the request is sent anew for it.
     void pushForDesktop(app_control_h request);
     void sendAnew(app_control_h request) const;
+    void passOn(RequestPtr request, GDBusMethodInvocation *call);
 
     static gboolean onLaunch(PelliPlatformApplication1 *object, GDBusMethodInvocation *call,
                              GVariant *contents, gboolean replyWanted, gpointer data);
@@ -93,6 +96,9 @@ struct RequestReceiver::Impl {
     bool delivering = false;
     guint scheduled = 0;
     bool anyArrived = false;
+    // How many are on their way to another application, also when this object has gone.
+    std::shared_ptr<int> passing = std::make_shared<int>(0);
+    bool anyPassedOn = false;
     RequestPtr start;
     Handler handler;
     std::deque<Arrival> waiting;
@@ -278,7 +284,15 @@ gboolean RequestReceiver::Impl::onOpen(PelliFreedesktopApplication *object,
                                               "None of the addresses is a local file.");
         return TRUE;
     }
-    static_cast<Impl *>(data)->pushForDesktop(requestForFiles(paths));
+    auto *self = static_cast<Impl *>(data);
+    RequestPtr request(requestForFiles(paths));
+    if (std::string receiver = receiverOfFiles(self->applicationId);
+        receiver != self->applicationId) {
+        request->appId = std::move(receiver);
+        self->passOn(std::move(request), call);
+        return TRUE;
+    }
+    self->pushForDesktop(request.release());
     pelli_freedesktop_application_complete_open(object, call);
     return TRUE;
 }
@@ -298,6 +312,39 @@ void RequestReceiver::Impl::sendAnew(app_control_h request) const
                            kLaunchInterface, "Launch",
                            g_variant_new("(@a{sv}b)", toVariant(request), FALSE), nullptr,
                            G_DBUS_CALL_FLAGS_NONE, -1, nullptr, nullptr, nullptr);
+}
+
+// Files that a desktop opens with this application are for whoever asks for the recipients; the
+// desktop has its answer when that one has taken them.
+void RequestReceiver::Impl::passOn(RequestPtr request, GDBusMethodInvocation *call)
+{
+    anyPassedOn = true;
+    ++*passing;
+    const auto settle = [call, count = passing](const std::string &error) {
+        --*count;
+        if (error.empty())
+            g_dbus_method_invocation_return_value(call, nullptr);
+        else
+            g_dbus_method_invocation_return_error_literal(call, G_DBUS_ERROR, G_DBUS_ERROR_FAILED,
+                                                          error.c_str());
+    };
+    const int code = launch(request.get(), false,
+                            [settle](const LaunchOutcome &outcome) { settle(outcome.error); });
+    if (code != APP_CONTROL_ERROR_NONE)
+        settle(*request->appId + " cannot be started.");
+}
+
+bool RequestReceiver::onlyPassedOn()
+{
+    // Messages that waited for the name were sent before the answer to this question.
+    g_autoptr(GVariant) answer = callBus("GetId", nullptr, nullptr, nullptr);
+    while (g_main_context_iteration(nullptr, FALSE)) {
+    }
+    if (!impl_->anyPassedOn)
+        return false;
+    while (*impl_->passing > 0)
+        g_main_context_iteration(nullptr, TRUE);
+    return impl_->waiting.empty();
 }
 
 void RequestReceiver::Impl::giveBack()

@@ -28,6 +28,10 @@ public:
     /// Takes the application's name on the session bus. From here on requests are kept.
     Claim claim(std::string *error);
 
+    /// After claim(): looks at what has come so far. True when this start was only for requests
+    /// that were passed on to another application, which have arrived there: nothing is left to do.
+    bool onlyPassedOn();
+
     /// From the next turns of the main context on, hands out what is kept and what comes, one after
     /// the other and in order of arrival; a request that comes while the handler runs waits.
     /// `start` is the request that this start itself is: with `always` it comes first, else it is

@@ -17,6 +17,7 @@ import world
 from gi.repository import Gio, GLib
 
 LIMIT = float(os.environ.get("PELLIKO_ROUND_LIMIT", "20"))  # seconds for each step of a round
+PROGRAM = os.path.join(os.environ["PELLIKO_BUILD"], "libexec", "pelliko")
 LATE = 2000  # milliseconds after which the button is looked for where it was not drawn
 OURS = re.compile(r"/(src|platform|service)/[\w/-]+\.(cpp|h)")
 OPERATION = "http://tizen.org/appcontrol/operation/"
@@ -166,8 +167,7 @@ class Round:
             ASAN_OPTIONS=f"detect_leaks={int(leaks)}:log_path={report}:handle_abort=1:exitcode=99:malloc_context_size=14",
             LSAN_OPTIONS="exitcode=0", UBSAN_OPTIONS=f"print_stacktrace=1:halt_on_error=1:log_path={report}")
         with open(os.path.join(self.stage.folder, "errors"), "wb") as errors:
-            self.process = subprocess.Popen(["pelliko"], env=environment, stdin=subprocess.DEVNULL, stdout=errors,
-                                            stderr=errors)
+            self.process = subprocess.Popen([PROGRAM], env=environment, stdin=subprocess.DEVNULL, stdout=errors, stderr=errors)
         self.ended = []
         GLib.child_watch_add(GLib.PRIORITY_DEFAULT, self.process.pid, lambda _pid, status: self.ended.append(status))
         world.wait_for(lambda: self.ended or self.stage.application.owner, "the application to start", LIMIT)

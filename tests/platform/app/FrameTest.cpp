@@ -63,6 +63,14 @@ GVariant *callDesktop(const RecorderApp &app, const char *method, GVariant *argu
                                        G_DBUS_CALL_FLAGS_NONE, -1, nullptr, error);
 }
 
+GVariant *callBus(const char *method)
+{
+    g_autoptr(GDBusConnection) bus = g_bus_get_sync(G_BUS_TYPE_SESSION, nullptr, nullptr);
+    return g_dbus_connection_call_sync(bus, "org.freedesktop.DBus", "/org/freedesktop/DBus",
+                                       "org.freedesktop.DBus", method, nullptr, nullptr,
+                                       G_DBUS_CALL_FLAGS_NONE, -1, nullptr, nullptr);
+}
+
 constexpr const char *kDefault = APP_CONTROL_OPERATION_DEFAULT;
 
 } // namespace
@@ -235,6 +243,55 @@ TEST(Frame, ADesktopOpensFilesAsShares)
     EXPECT_EQ("later {\"extras\":{\"http://tizen.org/appcontrol/data/path\":[\"/a.jpg\",\"/b.jpg\"]"
               "},\"operation\":\"http://tizen.org/appcontrol/operation/multi_share\"}",
               diary[2]);
+}
+
+TEST(Frame, FilesGoToThePickerWhereThereIsOne)
+{
+    const RecorderApp app("Picked");
+    const RecorderApp picker("Picked-picker");
+    const char *several[] = {"file:///a.jpg", "file:///b%20b.jpg", nullptr};
+    g_autoptr(GError) error = nullptr;
+    g_autoptr(GVariant) started =
+        callDesktop(app, "Open", g_variant_new("(^asa{sv})", several, nullptr), &error);
+    ASSERT_TRUE(started) << error->message;
+    // It was started for this alone, and so ends without having begun.
+    EXPECT_TRUE(app.waitUntilGone());
+    EXPECT_THAT(app.diaryWith("ended"), ElementsAre("ended 0"));
+
+    appLaunch({"--app", app.id(), "--extra", task("note")});
+    const char *one[] = {"file:///c.jpg", nullptr};
+    g_autoptr(GVariant) running =
+        callDesktop(app, "Open", g_variant_new("(^asa{sv})", one, nullptr));
+    EXPECT_TRUE(running);
+    EXPECT_EQ(0, app.startByHand({"/d.jpg"}).status);
+    appLaunch({"--app", app.id(), "--extra", task("exit")});
+    appLaunch({"--app", picker.id(), "--extra", task("exit")});
+    app.diaryWith("terminate");
+    for (const std::string &line : app.diary())
+        EXPECT_EQ(std::string::npos, line.find(".jpg")) << line;
+    const std::vector<std::string> diary = picker.diaryWith("ended");
+    ASSERT_LE(4U, diary.size());
+    EXPECT_THAT(diary[1], HasSubstr("[\"/a.jpg\",\"/b b.jpg\"]"));
+    EXPECT_THAT(diary[2], HasSubstr("\"uri\":\"/c.jpg\""));
+    EXPECT_THAT(diary[3], HasSubstr("\"uri\":\"/d.jpg\""));
+}
+
+TEST(Frame, APickerThatDoesNotStartIsTold)
+{
+    const RecorderApp app("Broken");
+    const std::string folder = std::string(std::getenv("XDG_DATA_HOME")) + "/dbus-1/services/";
+    std::ofstream(folder + app.id() + "-picker.service")
+        << "[D-BUS Service]\nName=" << app.id() << "-picker\nExec=/nowhere/picker\n";
+    const char *one[] = {"file:///c.jpg", nullptr};
+    appLaunch({"--app", app.id(), "--extra", task("note")});
+    g_autoptr(GVariant) reload = callBus("ReloadConfig");
+    g_autoptr(GError) error = nullptr;
+    g_autoptr(GVariant) reply =
+        callDesktop(app, "Open", g_variant_new("(^asa{sv})", one, nullptr), &error);
+    EXPECT_FALSE(reply);
+    EXPECT_THAT(error->message, HasSubstr("cannot be started"));
+    appLaunch({"--app", app.id(), "--extra", task("exit")});
+    EXPECT_TRUE(app.waitUntilGone());
 }
 
 TEST(Aul, TellsRunningApplicationsFromOthers)

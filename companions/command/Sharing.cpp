@@ -1,0 +1,229 @@
+#include "Sharing.h"
+
+#include "Contacts.h"
+#include "Files.h"
+#include "People.h"
+
+#include <app_control.h>
+#include <app_control_delivery.h>
+#include <gio/gio.h>
+
+#include <algorithm>
+#include <filesystem>
+#include <iostream>
+#include <iterator>
+#include <unistd.h>
+
+namespace pelliko::command
+{
+namespace
+{
+
+constexpr const char *application = "com.velmora.pelliko";
+constexpr const char *picker = "com.velmora.pelliko-picker";
+// One request to share names no more people; it would pass over the rest without a word.
+constexpr std::size_t mostRecipients = 10;
+// What is longer is a file rather than a text.
+constexpr std::size_t longestText = 1024UL * 1024UL;
+
+class Request
+{
+public:
+    Request(const char *receiver, const char *operation)
+    {
+        app_control_create(&handle_);
+        app_control_set_app_id(handle_, receiver);
+        app_control_set_operation(handle_, operation);
+    }
+    ~Request() { app_control_destroy(handle_); }
+    Request(const Request &) = delete;
+    Request &operator=(const Request &) = delete;
+
+    void setFile(const std::string &path) const { app_control_set_uri(handle_, path.c_str()); }
+    void add(const char *key, const std::string &value) const
+    {
+        app_control_add_extra_data(handle_, key, value.c_str());
+    }
+    void add(const char *key, const std::vector<std::string> &values) const
+    {
+        std::vector<const char *> pointers;
+        pointers.reserve(values.size());
+        for (const std::string &value : values)
+            pointers.push_back(value.c_str());
+        app_control_add_extra_data_array(handle_, key, pointers.data(),
+                                         static_cast<int>(pointers.size()));
+    }
+    int deliver() const { return app_control_deliver_launch_request(handle_); }
+
+private:
+    app_control_h handle_ = nullptr;
+};
+
+// The recipients of a command line: ids of numbers, in order and each once.
+struct Recipients {
+    std::vector<std::string> ids;
+    Exit status = Exit::done;
+};
+
+std::string contactsTool()
+{
+    std::error_code error;
+    const auto self = std::filesystem::read_symlink("/proc/self/exe", error);
+    return (self.parent_path() / "contacts-tool").string();
+}
+
+// Only numbers of the contacts can be shared with: who is not there yet becomes a contact, by the
+// tool that keeps them.
+std::string addedId(const std::string &number, std::string &fault)
+{
+    const std::string tool = contactsTool();
+    g_autoptr(GError) error = nullptr;
+    g_autoptr(GSubprocess) process = g_subprocess_new(
+        static_cast<GSubprocessFlags>(G_SUBPROCESS_FLAGS_STDOUT_PIPE |
+                                      G_SUBPROCESS_FLAGS_STDERR_PIPE),
+        &error, tool.c_str(), "add", "--name", number.c_str(), "--number", number.c_str(), nullptr);
+    g_autofree char *said = nullptr;
+    g_autofree char *complaint = nullptr;
+    if (!process ||
+        !g_subprocess_communicate_utf8(process, nullptr, nullptr, &said, &complaint, &error)) {
+        fault = "the number cannot be added to the contacts: " + std::string(error->message);
+        return {};
+    }
+    if (!g_subprocess_get_successful(process)) {
+        fault = printable(number) + " cannot be added to the contacts: " +
+                std::string(complaint ? g_strstrip(complaint) : "no reason was given");
+        return {};
+    }
+    return g_strstrip(said);
+}
+
+// All are looked for before any is added: a mistake changes nothing.
+bool findAll(const std::vector<std::string> &to, std::vector<Found> &found, Recipients &recipients)
+{
+    std::vector<companion::ContactNumber> contacts;
+    if (recipients.status = readContacts(contacts); recipients.status != Exit::done)
+        return false;
+    for (const std::string &who : to) {
+        found.push_back(findPerson(who, contacts));
+        if (!found.back().fault.empty()) {
+            recipients.status = refuse(Exit::recipient, found.back().fault);
+            return false;
+        }
+    }
+    return true;
+}
+
+Recipients recipientsOf(const std::vector<std::string> &to)
+{
+    Recipients recipients;
+    std::vector<Found> found;
+    if (to.size() > mostRecipients)
+        recipients.status =
+            refuse(Exit::recipient,
+                   "a share has at most " + std::to_string(mostRecipients) + " recipients");
+    if (to.empty() || recipients.status != Exit::done || !findAll(to, found, recipients))
+        return recipients;
+    for (const Found &person : found) {
+        std::string fault;
+        const std::string id =
+            person.id != 0 ? std::to_string(person.id) : addedId(person.newNumber, fault);
+        if (!fault.empty()) {
+            recipients.status = refuse(Exit::recipient, fault);
+            return recipients;
+        }
+        if (std::find(recipients.ids.begin(), recipients.ids.end(), id) == recipients.ids.end())
+            recipients.ids.push_back(id);
+    }
+    return recipients;
+}
+
+Exit deliver(const Request &request, bool toPicker)
+{
+    const std::string who = toPicker ? "the recipient picker" : "Pelliko";
+    switch (request.deliver()) {
+    case APP_CONTROL_ERROR_NONE:
+        return Exit::done;
+    case APP_CONTROL_ERROR_APP_NOT_FOUND:
+        return refuse(Exit::unreachable, who + " is not installed for this session" +
+                                             (toPicker ? "; name recipients with --to" : ""));
+    case APP_CONTROL_ERROR_IO_ERROR:
+        return refuse(Exit::unreachable, "there is no session bus, so Pelliko cannot be started");
+    default:
+        return refuse(Exit::unreachable, who + " could not be started");
+    }
+}
+
+const char *receiverFor(const Recipients &recipients)
+{
+    return recipients.ids.empty() ? picker : application;
+}
+
+Exit send(const Request &request, const Recipients &recipients)
+{
+    if (!recipients.ids.empty())
+        request.add(APP_CONTROL_DATA_TO, recipients.ids);
+    return deliver(request, recipients.ids.empty());
+}
+
+std::string readInput()
+{
+    return {std::istreambuf_iterator<char>(std::cin), std::istreambuf_iterator<char>()};
+}
+
+std::string joined(const std::vector<std::string> &words)
+{
+    std::string text;
+    for (const std::string &word : words)
+        text += (text.empty() ? "" : " ") + word;
+    return text;
+}
+
+// Why a text cannot be shared; empty when it can.
+std::string faultOfText(const std::string &text)
+{
+    if (text.find_first_not_of(" \t\r\n") == std::string::npos)
+        return "the text is empty, so there is nothing to share";
+    if (text.size() > longestText)
+        return "the text is longer than 1 MiB; share it as a file";
+    if (!g_utf8_validate(text.data(), static_cast<gssize>(text.size()), nullptr))
+        return "this is not text (UTF-8); share it as a file";
+    return {};
+}
+
+} // namespace
+
+Exit shareFiles(const std::vector<std::string> &names, const std::vector<std::string> &to)
+{
+    const NamedFiles files = readFiles(names);
+    if (!files.fault.empty())
+        return refuse(Exit::failed, files.fault);
+    const Recipients recipients = recipientsOf(to);
+    if (recipients.status != Exit::done)
+        return recipients.status;
+    const bool single = files.paths.size() == 1;
+    const Request request(receiverFor(recipients),
+                          single ? APP_CONTROL_OPERATION_SHARE : APP_CONTROL_OPERATION_MULTI_SHARE);
+    if (single)
+        request.setFile(files.paths.front());
+    else
+        request.add(APP_CONTROL_DATA_PATH, files.paths);
+    return send(request, recipients);
+}
+
+Exit shareText(const std::vector<std::string> &words, const std::vector<std::string> &to)
+{
+    const bool fromInput = words.empty() || (words.size() == 1 && words.front() == "-");
+    if (words.empty() && isatty(STDIN_FILENO) == 1)
+        return refuse(Exit::usage, "there is no text: name it, or give it on standard input");
+    const std::string text = fromInput ? readInput() : joined(words);
+    if (const std::string fault = faultOfText(text); !fault.empty())
+        return refuse(Exit::failed, fault);
+    const Recipients recipients = recipientsOf(to);
+    if (recipients.status != Exit::done)
+        return recipients.status;
+    const Request request(receiverFor(recipients), APP_CONTROL_OPERATION_SHARE_TEXT);
+    request.add(APP_CONTROL_DATA_TEXT, text);
+    return send(request, recipients);
+}
+
+} // namespace pelliko::command
