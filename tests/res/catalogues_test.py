@@ -18,6 +18,7 @@ OTHERS = {
     "companions/history/locale": "companions",
     "companions/signin/locale": "companions",
     "companions/viewer/locale": "companions",
+    "res/desktop/locale": "res/desktop",
     "service/server/pages/locale": "service/server/pages",
 }
 PLACE = re.compile(r"%(?:(\d)\$)?[-+ #0']*\d*(?:\.\d+)?([a-zA-Z%])")
