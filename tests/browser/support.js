@@ -15,17 +15,28 @@ const packages = createRequire(path.join(process.env.PELLIKO_NODE_MODULES, 'pack
 
 const sha256 = (bytes) => crypto.createHash('sha256').update(bytes).digest('hex');
 
+const browserOptions = {
+  executablePath: '/usr/bin/chromium',
+  args: ['--no-sandbox', '--disable-gpu', '--disable-quic', '--no-first-run',
+    '--disable-background-networking', '--disable-component-update', '--disable-sync'],
+};
+
+/** As most recipients' browsers are, and without script. */
+const contextOptions = {
+  acceptDownloads: true,
+  javaScriptEnabled: false,
+  viewport: { width: 480, height: 800 },
+};
+
 /** Opens a fresh browser that keeps what it needs in `profile`. */
 function openBrowser(profile, options = {}) {
-  return packages('playwright-core').chromium.launchPersistentContext(profile, {
-    executablePath: '/usr/bin/chromium',
-    args: ['--no-sandbox', '--disable-gpu', '--disable-quic', '--no-first-run',
-      '--disable-background-networking', '--disable-component-update', '--disable-sync'],
-    acceptDownloads: true,
-    javaScriptEnabled: false,
-    viewport: { width: 480, height: 800 },
-    ...options,
-  });
+  return packages('playwright-core').chromium.launchPersistentContext(
+    profile, { ...browserOptions, ...contextOptions, ...options });
+}
+
+/** One browser for many tests; each opens a context of its own in it. */
+function launchBrowser() {
+  return packages('playwright-core').chromium.launch(browserOptions);
 }
 
 class Server {
@@ -33,7 +44,7 @@ class Server {
     const server = new Server();
     server.program = path.join(build, 'bin', 'pelliko-server');
     server.directory = fs.mkdtempSync(path.join(os.tmpdir(), 'pelliko-browser-'));
-    const data = path.join(server.directory, 'data');
+    const data = server.data = path.join(server.directory, 'data');
     server.token = execFileSync(server.program,
       ['account', 'add', '--data', data, '--number', '+4915112345678'], { encoding: 'utf8' }).trim();
     server.process = spawn(server.program,
@@ -85,14 +96,15 @@ class Server {
 }
 
 /** Runs the cases one after another, each with a server of its own; the exit code tells. */
-async function runCases(cases) {
+async function runCases(cases, ...more) {
   const build = process.argv[2];
   let failed = 0;
   for (const [name, work] of Object.entries(cases)) {
     const server = await Server.start(build);
+    const begun = Date.now();
     try {
-      await work(server, build);
-      console.log(`ok      ${name}`);
+      await work(server, build, ...more);
+      console.log(`ok      ${name} (${((Date.now() - begun) / 1000).toFixed(1)} s)`);
     } catch (error) {
       failed += 1;
       console.log(`FAILED  ${name}\n${error.stack}`);
@@ -104,4 +116,4 @@ async function runCases(cases) {
   process.exitCode = failed === 0 ? 0 : 1;
 }
 
-module.exports = { openBrowser, packages, runCases, sha256 };
+module.exports = { Server, contextOptions, launchBrowser, openBrowser, packages, runCases, sha256 };

@@ -39,8 +39,12 @@ POPUP_ROOM = 512
 # What a language may share with English: international words, and words that are the same there.
 SAME = {"OK", "%s kB", "%s MB", "%s GB", "%s TB", ".", "%d byte", "%d file", "%d files", "Download (%s)"}
 SAME_IN = {
-    "it": {"1 file ", "%d file", "1 file (%1$s %2$s)"},
-    "id": {"1 file ", "1 file (%1$s %2$s)"},
+    "de": {"Text", "Video"},
+    "fr": {"Archive", "Contact", "Document"},
+    "it": {"1 file ", "%d file", "1 file (%1$s %2$s)", "File", "Video"},
+    "id": {"1 file ", "1 file (%1$s %2$s)", "File", "Video"},
+    "nl": {"Contact", "Document", "Video"},
+    "tr": {"Video"},
 }
 SCRIPTS = {
     "ar": "ARABIC", "bn": "BENGALI", "he": "HEBREW", "hi": "DEVANAGARI", "ru": "CYRILLIC", "uk": "CYRILLIC",

@@ -18,6 +18,8 @@ constexpr ErrorEntry table[] = {
     {Error::methodNotAllowed, "method_not_allowed", 405, "This address has no such method."},
     {Error::conflict, "conflict", 409, "The request does not fit the present state."},
     {Error::gone, "gone", 410, "The share has expired or was withdrawn."},
+    {Error::expired, "gone", 410, "The share has expired."},
+    {Error::withdrawn, "gone", 410, "The share was withdrawn."},
     {Error::unsupportedTusVersion, "unsupported_tus_version", 412,
      "Tus-Resumable has to be 1.0.0."},
     {Error::tooManyFiles, "too_many_files", 413, "A share holds at most 100 files."},

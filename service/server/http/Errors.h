@@ -16,7 +16,11 @@ enum class Error {
     notFound,
     methodNotAllowed,
     conflict,
+    /// The share has ended, whichever way.
     gone,
+    /// The same over the wire; pages tell them apart.
+    expired,
+    withdrawn,
     unsupportedTusVersion,
     tooManyFiles,
     shareTooLarge,

@@ -5,6 +5,8 @@
 #include "accounts/Joined.h"
 #include "http/Errors.h"
 #include "pages/Download.h"
+#include "pages/ErrorPage.h"
+#include "pages/HomePage.h"
 #include "pages/LandingPage.h"
 #include "push/EventStream.h"
 #include "push/ReceivedEndpoints.h"
@@ -164,9 +166,17 @@ Task<void> routeApi(Exchange &exchange, Context &context, Parts parts)
     }
 }
 
-bool isLinkPath(const Request &request)
+Task<void> showHome(Exchange &exchange)
 {
-    return request.path.rfind("/s/", 0) == 0;
+    requireGet(exchange.request());
+    Response page = homePage(languageOf(exchange.request()));
+    co_await exchange.respond(std::move(page));
+}
+
+/// Where people come to, who are answered with pages.
+bool isForPeople(const Request &request)
+{
+    return request.path == "/" || request.path.rfind("/s/", 0) == 0;
 }
 
 Task<void> route(Exchange &exchange, Context &context)
@@ -178,6 +188,8 @@ Task<void> route(Exchange &exchange, Context &context)
         co_await routeLinks(exchange, context, Parts(parts.begin() + 1, parts.end()));
     else if (parts.size() == 1 && parts[0] == "healthz")
         co_await showHealth(exchange, context);
+    else if (exchange.request().path == "/")
+        co_await showHome(exchange);
     else
         throw Refusal(Error::notFound);
 }
@@ -216,7 +228,7 @@ Task<void> handleRequest(Exchange &exchange, Context &context)
     // Half of a body went out: only a cut tells the receiver that it is not whole.
     if (exchange.answered())
         throw Disconnected();
-    Response response = isLinkPath(exchange.request())
+    Response response = isForPeople(exchange.request())
                             ? errorPage(refusal, languageOf(exchange.request()))
                             : errorResponse(refusal);
     if (exchange.request().path.rfind("/api/v1/uploads", 0) == 0)

@@ -3,6 +3,7 @@
 #include "http/Errors.h"
 #include "pages/ByteRange.h"
 #include "pages/LandingPage.h"
+#include "pages/TextInPlace.h"
 #include "pages/ZipWriter.h"
 #include "shares/FileNames.h"
 #include "shares/ShareRules.h"
@@ -13,6 +14,7 @@
 
 #include <algorithm>
 #include <memory>
+#include <optional>
 #include <utility>
 #include <vector>
 
@@ -127,12 +129,33 @@ Task<void> zipFile(Exchange &exchange, Context &context, ZipWriter &zip, FileRec
     }
 }
 
+Task<std::string> readWhole(Context &context, FileRecord file)
+{
+    const auto blob = co_await openBlob(context, file.blob);
+    std::string bytes(file.size, '\0');
+    for (std::size_t offset = 0; offset < bytes.size();) {
+        const std::span<char> rest = std::span(bytes).subspan(offset);
+        const std::size_t count =
+            co_await context.pool.run([&] { return blob->read(offset, rest); });
+        if (count == 0)
+            throw StorageFailure(StorageFailure::Kind::broken, "a blob is shorter than its file");
+        offset += count;
+    }
+    co_return bytes;
+}
+
 } // namespace
 
 Task<void> showLandingPage(Exchange &exchange, Context &context, std::string token)
 {
     const LinkRecord link = co_await findLiveLink(context, token);
-    co_await exchange.respond(landingPage(link, token, languageOf(exchange.request())));
+    std::optional<std::string> text;
+    if (const FileRecord *file = textInPlace(link.share)) {
+        const std::string bytes = co_await readWhole(context, *file);
+        text = readableText(bytes);
+    }
+    Response page = landingPage(link, token, languageOf(exchange.request()), context.now(), text);
+    co_await exchange.respond(std::move(page));
 }
 
 Task<void> downloadFile(Exchange &exchange, Context &context, std::string token, std::size_t index)

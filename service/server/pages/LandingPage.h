@@ -1,10 +1,10 @@
 #pragma once
 
-#include "http/Errors.h"
 #include "http/Message.h"
 #include "pages/PageLanguage.h"
 #include "store/Metadata.h"
 
+#include <optional>
 #include <string>
 
 namespace pelliko::server
@@ -15,10 +15,9 @@ namespace pelliko::server
 
 /// The page behind a link: who sent it, the files, until when, and a button for everything. Works
 /// without script, in the dark and from 320 pixels on; links are relative to the page's address.
+/// `text` is shown in the page.
 [[nodiscard]] Response landingPage(const LinkRecord &link, const std::string &token,
-                                   const PageLanguage &language);
-
-/// A refusal as a page for people.
-[[nodiscard]] Response errorPage(const Refusal &refusal, const PageLanguage &language);
+                                   const PageLanguage &language, Seconds now,
+                                   const std::optional<std::string> &text = std::nullopt);
 
 } // namespace pelliko::server

@@ -75,8 +75,10 @@ void checkCreated(const CreateResult &result)
 
 void checkLive(ShareState state)
 {
-    if (state != ShareState::uploading && state != ShareState::finished)
-        throw Refusal(Error::gone);
+    if (state == ShareState::expired)
+        throw Refusal(Error::expired);
+    if (state == ShareState::withdrawn)
+        throw Refusal(Error::withdrawn);
 }
 
 } // namespace pelliko::server

@@ -1,5 +1,9 @@
 #include "pages/LandingPage.h"
+#include "pages/ErrorPage.h"
+#include "pages/FileKind.h"
+#include "pages/HomePage.h"
 #include "pages/PageCatalogues.h"
+#include "pages/TextInPlace.h"
 
 #include <gmock/gmock.h>
 
@@ -11,52 +15,176 @@ namespace
 using testing::HasSubstr;
 using testing::Not;
 
+constexpr Seconds deadline = 1763733909;
+constexpr Seconds now = deadline - 47 * 3600 - 1800;
+
 LinkRecord link(std::vector<FileRecord> files)
 {
     LinkRecord record;
     record.senderNumber = "+4915112345678";
-    record.share.deadline = 1763733909;
+    record.share.deadline = deadline;
     record.share.files = std::move(files);
     return record;
 }
 
+std::string pageOf(std::vector<FileRecord> files, const PageLanguage &language = {})
+{
+    return landingPage(link(std::move(files)), "TOKEN", language, now).body;
+}
+
+std::string errorBody(Error error, const PageLanguage &language = {})
+{
+    return errorPage(Refusal(error), language).body;
+}
+
+/// Every refusal that a page can tell of; the others belong to the calls of accounts.
+constexpr Error errorsOfPages[] = {
+    Error::badRequest,      Error::notFound,  Error::methodNotAllowed,
+    Error::expired,         Error::withdrawn, Error::rangeNotSatisfiable,
+    Error::tooManyAttempts, Error::internal,  Error::busy,
+    Error::noSpace};
+
 TEST(LandingPage, TellsSenderFilesSizesAndEnd)
 {
     const std::string body =
-        landingPage(link({{"a.jpg", "", 1000, 1000, "", "k"}, {"b.pdf", "", 500, 500, "", "k"}}),
-                    "TOKEN", {})
-            .body;
-    EXPECT_THAT(body, HasSubstr("2 files from +4915112345678"));
+        pageOf({{"a.jpg", "", 1000, 1000, "", "k"}, {"b.pdf", "", 500, 500, "", "k"}});
+    EXPECT_THAT(body, HasSubstr("<h1>2 files from +4915112345678</h1>"));
     EXPECT_THAT(body, HasSubstr("1.5 kB in all"));
-    EXPECT_THAT(body, HasSubstr("21 November 2025, 14:05 UTC"));
+    EXPECT_THAT(body,
+                HasSubstr("<time datetime=\"2025-11-21T14:05:09Z\">21 November 2025, 14:05 UTC"));
+    EXPECT_THAT(body, HasSubstr("47 hours left"));
     EXPECT_THAT(body, HasSubstr("href=\"TOKEN/all.zip\""));
     EXPECT_THAT(body, HasSubstr("href=\"TOKEN/1\""));
+    EXPECT_THAT(body, HasSubstr("<span class=\"kind\">Picture</span>"));
+    EXPECT_THAT(body, HasSubstr("<span class=\"kind\">Document</span>"));
     EXPECT_THAT(body, Not(HasSubstr("<script")));
 }
 
 TEST(LandingPage, OneFileNeedsNoZip)
 {
-    const std::string body = landingPage(link({{"a.jpg", "", 1, 1, "", "k"}}), "TOKEN", {}).body;
+    const std::string body = pageOf({{"a.jpg", "", 1, 1, "", "k"}});
     EXPECT_THAT(body, HasSubstr("1 file from"));
     EXPECT_THAT(body, Not(HasSubstr("all.zip")));
 }
 
+TEST(LandingPage, TheLastHoursAreTold)
+{
+    const auto left = [](Seconds seconds) {
+        return landingPage(link({{"a", "", 1, 1, "", "k"}}), "TOKEN", {}, deadline - seconds).body;
+    };
+    EXPECT_THAT(left(7200), HasSubstr("2 hours left"));
+    EXPECT_THAT(left(7199), HasSubstr("1 hour left"));
+    EXPECT_THAT(left(3599), HasSubstr("Less than an hour left"));
+    EXPECT_THAT(left(-5), HasSubstr("Less than an hour left"));
+}
+
 TEST(LandingPage, NamesCannotBecomeMarkup)
 {
-    const std::string body =
-        landingPage(link({{"<img src=x onerror=\"a\">.jpg", "", 1, 1, "", "k"}}), "TOKEN", {}).body;
+    const std::string body = pageOf({{"<img src=x onerror=\"a\">.jpg", "", 1, 1, "", "k"}});
     EXPECT_THAT(body, Not(HasSubstr("<img")));
     EXPECT_THAT(body, HasSubstr("&lt;img src=x onerror=&quot;a&quot;&gt;.jpg"));
 }
 
-TEST(LandingPage, EndedAndUnknownLinksSayWhy)
+TEST(LandingPage, ATextIsReadInThePage)
 {
-    const Response gone = errorPage(Refusal(Error::gone), {});
-    EXPECT_EQ(gone.status, 410);
-    EXPECT_THAT(gone.body, HasSubstr("No longer available"));
-    const Response unknown = errorPage(Refusal(Error::notFound), {});
-    EXPECT_EQ(unknown.status, 404);
-    EXPECT_THAT(unknown.body, HasSubstr("This link is not known"));
+    const LinkRecord record = link({{"memo.txt", "", 20, 20, "", "k"}});
+    const std::string body = landingPage(record, "TOKEN", {}, now, "<b>Hello</b>\nشكرا").body;
+    EXPECT_THAT(body, HasSubstr("<h1>Text from +4915112345678</h1>"));
+    EXPECT_THAT(body,
+                HasSubstr("<div class=\"text\" dir=\"auto\">&lt;b&gt;Hello&lt;/b&gt;\nشكرا</div>"));
+    EXPECT_THAT(body, HasSubstr("href=\"TOKEN/0\""));
+}
+
+TEST(LandingPage, WhatMessengersShowBesideALinkSaysNothingOfTheShare)
+{
+    const LinkRecord record = link({{"divorce.pdf", "", 20, 20, "", "k"}});
+    const std::string body = landingPage(record, "TOKEN", {}, now).body;
+    const std::string head = body.substr(0, body.find("</head>"));
+    EXPECT_THAT(head, HasSubstr("<title>Shared with you</title>"));
+    EXPECT_THAT(head, HasSubstr("property=\"og:title\" content=\"Shared with you\""));
+    EXPECT_THAT(head, HasSubstr("property=\"og:description\" content=\"Somebody shared"));
+    EXPECT_THAT(head, HasSubstr("name=\"robots\" content=\"noindex"));
+    for (const char *secret : {"divorce", "4915112345678", "TOKEN"})
+        EXPECT_THAT(head, Not(HasSubstr(secret)));
+}
+
+TEST(TextInPlace, IsOneTextOfALengthForAPage)
+{
+    const auto shown = [](std::vector<FileRecord> files) {
+        return textInPlace(link(std::move(files)).share) != nullptr;
+    };
+    EXPECT_TRUE(shown({{"memo.txt", "", 65536, 65536, "", "k"}}));
+    EXPECT_TRUE(shown({{"memo", "text/plain", 1, 1, "", "k"}}));
+    EXPECT_FALSE(shown({{"memo.txt", "", 65537, 65537, "", "k"}}));
+    EXPECT_FALSE(shown({{"memo.txt", "", 0, 0, "", "k"}}));
+    EXPECT_FALSE(shown({{"page.html", "text/plain", 5, 5, "", "k"}}));
+    EXPECT_FALSE(shown({{"a.txt", "", 1, 1, "", "k"}, {"b.txt", "", 1, 1, "", "k"}}));
+    EXPECT_FALSE(shown({}));
+}
+
+TEST(TextInPlace, KeepsWhatAPageMayShow)
+{
+    EXPECT_EQ(readableText("\xef\xbb\xbf"
+                           "a\r\nb\tc"),
+              "a\nb\tc");
+    EXPECT_EQ(readableText(std::string("a\0\x1b[31mb\x7f", 9)), "a[31mb");
+    EXPECT_EQ(readableText("\xff\xfe"
+                           "a"),
+              std::nullopt);
+}
+
+TEST(FileKind, GoesByWhatTheNameEndsWith)
+{
+    EXPECT_EQ(kindOf("a.JPEG", "application/pdf"), FileKind::picture);
+    EXPECT_EQ(kindOf("a.3gp", ""), FileKind::video);
+    EXPECT_EQ(kindOf("a.b.mp3", ""), FileKind::sound);
+    EXPECT_EQ(kindOf("Ann Example.vcf", ""), FileKind::contact);
+    EXPECT_EQ(kindOf("a.tar.gz", ""), FileKind::archive);
+    EXPECT_EQ(kindOf("a.hwp", ""), FileKind::document);
+    // Whatever the sender calls it: it is opened as what its name says.
+    EXPECT_EQ(kindOf("holiday.jpg.exe", "image/jpeg"), FileKind::other);
+    EXPECT_EQ(kindOf("holiday", "Image/JPEG"), FileKind::picture);
+    EXPECT_EQ(kindOf("Dr. Example", "text/vcard"), FileKind::contact);
+    EXPECT_EQ(kindOf("", ""), FileKind::other);
+    EXPECT_EQ(kindOf("a.", "audio/ogg"), FileKind::sound);
+}
+
+TEST(ErrorPage, ExpiredWithdrawnAndUnknownLinksSayWhatHappened)
+{
+    EXPECT_EQ(errorPage(Refusal(Error::expired), {}).status, 410);
+    EXPECT_EQ(errorPage(Refusal(Error::withdrawn), {}).status, 410);
+    EXPECT_EQ(errorPage(Refusal(Error::notFound), {}).status, 404);
+    EXPECT_THAT(errorBody(Error::expired), HasSubstr("<h1>The time is over</h1>"));
+    EXPECT_THAT(errorBody(Error::withdrawn), HasSubstr("The sender has taken this share back"));
+    EXPECT_THAT(errorBody(Error::notFound), HasSubstr("This link is not known"));
+}
+
+TEST(ErrorPage, WhoHasToWaitIsToldSoAndHowLong)
+{
+    const Response limited =
+        errorPage(Refusal(Error::tooManyAttempts, {}, {{"Retry-After", "90"}}), {});
+    EXPECT_EQ(limited.status, 429);
+    EXPECT_EQ(limited.headers.back().value, "90");
+    EXPECT_THAT(limited.body, HasSubstr("<h1>Too many requests</h1>"));
+    EXPECT_THAT(errorBody(Error::busy), HasSubstr("<h1>The server is busy</h1>"));
+}
+
+TEST(ErrorPage, FailuresOfTheServerAreNotBlamedOnTheReader)
+{
+    for (const Error error : {Error::internal, Error::noSpace}) {
+        EXPECT_THAT(errorBody(error), HasSubstr("The server could not answer"));
+        EXPECT_THAT(errorBody(error), HasSubstr(errorEntry(error).sentence));
+    }
+    EXPECT_THAT(errorBody(Error::methodNotAllowed), Not(HasSubstr("could not answer")));
+    EXPECT_THAT(errorBody(Error::rangeNotSatisfiable), HasSubstr("Open the link again"));
+}
+
+TEST(HomePage, SaysWhatThisIs)
+{
+    const Response page = homePage({});
+    EXPECT_EQ(page.status, 200);
+    EXPECT_THAT(page.body, HasSubstr("<h1>From person to person</h1>"));
+    EXPECT_THAT(page.body, Not(HasSubstr("<a ")));
 }
 
 TEST(PageLanguage, IsTheBestOfTheReadersWishes)
@@ -110,7 +238,7 @@ TEST(PageLanguage, EveryLanguageFillsEveryPlace)
         ASSERT_STREQ(language.tag(), catalogue.tag);
         for (const std::uint64_t count : {0U, 1U, 2U, 3U, 5U, 11U, 21U, 22U, 100U, 111U}) {
             LinkRecord record = link(std::vector<FileRecord>(count, {"a", "", 7, 7, "", "k"}));
-            const std::string body = landingPage(record, "TOKEN", language).body;
+            const std::string body = landingPage(record, "TOKEN", language, now).body;
             const std::string text = body.substr(body.find("<body>"));
             EXPECT_THAT(text, Not(HasSubstr("%"))) << catalogue.tag << count;
             EXPECT_THAT(text, HasSubstr("+4915112345678")) << catalogue.tag << count;
@@ -124,29 +252,30 @@ TEST(PageLanguage, NoPageMixesInEnglish)
     const std::vector<FileRecord> files(2, {"a", "", 7, 7, "", "k"});
     for (const PageCatalogue &catalogue : pageCatalogues()) {
         const PageLanguage language = PageLanguage::preferred(catalogue.tag);
-        const std::string page = landingPage(link(files), "TOKEN", language).body;
-        for (const char *words : {"files from", "in all", "Available", "Download all"})
+        const std::string page = pageOf(files, language);
+        for (const char *words : {"files from", "in all", "Available", "Download all", "hours left",
+                                  "Shared with", "Somebody"})
             EXPECT_THAT(page, Not(HasSubstr(words))) << catalogue.tag;
-        for (const std::string &own : {errorPage(Refusal(Error::gone), language).body,
-                                       errorPage(Refusal(Error::notFound), language).body}) {
-            for (const char *words : {"available", "the sender", "link is not", "Nothing here"})
+        EXPECT_THAT(homePage(language).body, Not(HasSubstr("erson to"))) << catalogue.tag;
+        for (const Error error : errorsOfPages) {
+            const std::string own = errorBody(error, language);
+            for (const char *words : {"the link", "The time", "No longer", "the sender", "Too many",
+                                      "is busy", "not work", "Nothing here", "could not answer"})
                 EXPECT_THAT(own, Not(HasSubstr(words))) << catalogue.tag;
         }
-        EXPECT_THAT(errorPage(Refusal(Error::noSpace), language).body,
-                    Not(HasSubstr("could not answer")))
-            << catalogue.tag;
     }
 }
 
 TEST(LandingPage, SpeaksTheReadersLanguage)
 {
     const PageLanguage german = PageLanguage::preferred("de");
-    const Response page = landingPage(
-        link({{"a.jpg", "", 1000, 1000, "", "k"}, {"b", "", 500, 500, "", "k"}}), "TOKEN", german);
-    EXPECT_THAT(page.body, HasSubstr("<html lang=\"de\" dir=\"ltr\">"));
-    EXPECT_THAT(page.body, HasSubstr("2 Dateien von +4915112345678"));
-    EXPECT_THAT(page.body, HasSubstr(">21.11.2025 14:05 UTC</time>"));
-    EXPECT_THAT(page.body, HasSubstr("Alles herunterladen (1,5\u00a0kB)"));
+    const std::string page =
+        pageOf({{"a.jpg", "", 1000, 1000, "", "k"}, {"b", "", 500, 500, "", "k"}}, german);
+    EXPECT_THAT(page, HasSubstr("<html lang=\"de\" dir=\"ltr\">"));
+    EXPECT_THAT(page, HasSubstr("2 Dateien von +4915112345678"));
+    EXPECT_THAT(page, HasSubstr(">21.11.2025 14:05 UTC</time>"));
+    EXPECT_THAT(page, HasSubstr("Noch 47 Stunden"));
+    EXPECT_THAT(page, HasSubstr("Alles herunterladen (<bdi>1,5\u00a0kB</bdi>)"));
     const Response refused = errorPage(Refusal(Error::noSpace), german);
     EXPECT_THAT(refused.body, HasSubstr("Das hat nicht geklappt"));
     EXPECT_THAT(refused.body, HasSubstr("<p class=\"soft\" lang=\"en\" dir=\"ltr\">"));
@@ -155,13 +284,12 @@ TEST(LandingPage, SpeaksTheReadersLanguage)
 TEST(LandingPage, RunsFromTheRightInArabicAndHebrew)
 {
     for (const char *tag : {"ar", "he"}) {
-        const std::string body = landingPage(link({{"a.jpg", "", 1500, 1500, "", "k"}}), "TOKEN",
-                                             PageLanguage::preferred(tag))
-                                     .body;
+        const std::string body =
+            pageOf({{"a.jpg", "", 1500, 1500, "", "k"}}, PageLanguage::preferred(tag));
         EXPECT_THAT(body, HasSubstr(std::string("<html lang=\"") + tag + "\" dir=\"rtl\">"));
         // A plus sign at the wrong end would make another number of it.
         EXPECT_THAT(body, HasSubstr("\u2066+4915112345678\u2069"));
-        EXPECT_THAT(body, HasSubstr("dir=\"auto\">a.jpg"));
+        EXPECT_THAT(body, HasSubstr("<bdi>a.jpg</bdi>"));
     }
 }
 

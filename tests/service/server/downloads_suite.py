@@ -15,12 +15,39 @@ class Downloads(ServerCase):
         for path in [link, "/s/unknown"]:
             headers = self.get(path).headers
             self.assertEqual(headers["Content-Type"], "text/html; charset=utf-8")
-            self.assertIn("default-src 'none'; style-src 'sha256-",
+            self.assertIn("default-src 'none'; img-src data:; style-src 'sha256-",
                           headers["Content-Security-Policy"])
             self.assertEqual(headers["X-Content-Type-Options"], "nosniff")
             self.assertEqual(headers["X-Frame-Options"], "DENY")
             self.assertEqual(headers["Referrer-Policy"], "no-referrer")
             self.assertIn("noindex", headers["X-Robots-Tag"])
+
+    def test_whoever_comes_without_a_link_is_told_what_this_is(self):
+        page = self.get("/", Accept_Language="he")
+        self.assertEqual((page.status, page.headers["Content-Language"]), (200, "he"))
+        self.assertIn("מאדם לאדם", page.body.decode())
+        self.assertEqual(self.request("HEAD", "/", token=False).body, b"")
+
+    def test_a_text_is_read_in_the_page_and_stays_a_text(self):
+        text = "\ufeffGrüße <script>alert(1)</script>\r\n\x1bשלום"
+        _, link = self.make_finished(text.encode(), names=["memo.txt"])
+        shown = 'dir="auto">Grüße &lt;script&gt;alert(1)&lt;/script&gt;\nשלום</div>'
+        self.assertIn(shown, self.get(link).body.decode())
+        self.assertEqual(self.get(link + "/0").body, text.encode())
+        long = self.make_finished(b"x" * 65537, names=["long.txt"])[1]
+        strange = self.make_finished(b"\xff\xfeA\0", names=["strange.txt"])[1]
+        for path in (long, strange):
+            page = self.get(path)
+            self.assertEqual(page.status, 200)
+            self.assertNotIn(b'class="text"', page.body)
+
+    def test_looking_at_a_page_changes_nothing(self):
+        """Messengers fetch every link that they see, with HEAD or GET, before its reader does."""
+        _, link = self.make_finished(b"12345")
+        for method in ("HEAD", "GET"):
+            for path in (link, link + "/0", link + "/all.zip"):
+                self.assertEqual(self.request(method, path, token=False).status, 200)
+        self.assertEqual(self.get(link + "/0").body, b"12345")
 
     def test_a_file_is_an_attachment_with_its_bytes(self):
         content = os.urandom(3000000)
@@ -86,7 +113,7 @@ class Downloads(ServerCase):
 
     def test_pages_speak_the_language_that_the_browser_asks_for(self):
         _, path = self.make_finished(b"12345")
-        for asked, tag, words in (("pl, en;q=0.5", "pl", "Pobierz (5 bajtów)"), ("sw", "en", "Download (5 bytes)"),
+        for asked, tag, words in (("pl, en;q=0.5", "pl", "Pobierz (<bdi>5 bajtów</bdi>)"), ("sw", "en", "Download (<bdi>5 bytes</bdi>)"),
                                   ("zh-HK", "zh-TW", "下載")):  # fmt: skip
             page = self.get(path, Accept_Language=asked)
             self.assertEqual(page.headers["Content-Language"], tag)
@@ -122,4 +149,6 @@ class Downloads(ServerCase):
     def test_lost_bytes_are_not_taken_for_the_whole(self):
         _, link = self.make_finished(b"12345")
         os.remove(self.blob_files()[0])
-        self.assertEqual(self.get(link + "/0").status, 500)
+        page = self.get(link + "/0")
+        self.assertEqual(page.status, 500)
+        self.assertIn(b"The server could not answer. Try again later.", page.body)

@@ -20,7 +20,7 @@ class Refusals(ServerCase):
         self.assert_refused(answer, 401, "unauthorized")
 
     def test_not_found_for_unknown_addresses_shares_and_uploads(self):
-        for path in ["/", "/nothing", "/api/v1", "/api/v2/shares", "/api/v1/shares/x",
+        for path in ["/nothing", "/api/v1", "/api/v2/shares", "/api/v1/shares/x",
                      "/api/v1/shares/x/y", "/api/v1/shares/../../etc", "/favicon.ico",
                      "/api/v1/account/x", "//", "/healthz/x"]:
             self.assert_refused(self.request("GET", path), 404, "not_found")
@@ -51,7 +51,10 @@ class Refusals(ServerCase):
             answer = self.request(method, path)
             self.assert_refused(answer, 405, "method_not_allowed")
             self.assertEqual(answer.headers["Allow"], allowed)
-        self.assertEqual(self.request("POST", "/s/" + "A" * 22).status, 405)
+        for path in ["/s/" + "A" * 22, "/"]:
+            answer = self.request("POST", path)
+            self.assertEqual((answer.status, answer.headers["Allow"]), (405, "GET, HEAD"))
+            self.assertIn(b"Open the link again as it stands in the message", answer.body)
 
     def test_bad_request_for_malformed_bodies_and_headers(self):
         for body in ["", "[]", "{", '{"files": 1}', {"files": [], "recipients": RECIPIENTS},
@@ -114,7 +117,7 @@ class Refusals(ServerCase):
         for address in [link, link + "/0", link + "/all.zip"]:
             answer = self.get(address)
             self.assertEqual(answer.status, 410)
-            self.assertIn(b"No longer available", answer.body)
+            self.assertIn(b"The sender has taken this share back", answer.body)
 
     def test_another_tus_version_is_refused(self):
         upload = self.make_share(5)["files"][0]["upload"]
