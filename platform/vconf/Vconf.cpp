@@ -3,14 +3,17 @@
 #include "KeyNode.h"
 #include "KeyWatch.h"
 #include "Readiness.h"
+#include "SessionLanguage.h"
 
 #include <cstring>
 
 using pelliko::vconf::followReadiness;
 using pelliko::vconf::followsModems;
 using pelliko::vconf::KeyWatch;
+using pelliko::vconf::namesLanguage;
 using pelliko::vconf::readKey;
 using pelliko::vconf::refreshReadiness;
+using pelliko::vconf::sessionLanguage;
 using pelliko::vconf::Value;
 using pelliko::vconf::writeKey;
 
@@ -75,7 +78,11 @@ int vconf_set_int(const char *in_key, const int intval)
 
 char *vconf_get_str(const char *in_key)
 {
-    const std::optional<Value> value = in_key ? readKey(in_key) : std::nullopt;
+    if (!in_key)
+        return nullptr;
+    std::optional<Value> value = readKey(in_key);
+    if (!value && namesLanguage(in_key))
+        value = sessionLanguage();
     const auto *text = value ? std::get_if<std::string>(&*value) : nullptr;
     return text ? strdup(text->c_str()) : nullptr;
 }

@@ -3,5 +3,5 @@
 
 /// bool: the modem can be asked.
 #define VCONFKEY_TELEPHONY_READY "memory/telephony/telephony_ready"
-/// text such as "en_GB.UTF-8": the device language.
+/// text such as "en_GB.UTF-8": the device language; the session's while nobody has set one.
 #define VCONFKEY_LANGSET "db/menu_widget/language"

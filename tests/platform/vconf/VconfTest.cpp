@@ -7,8 +7,11 @@
 #include <fstream>
 #include <functional>
 #include <gio/gio.h>
+#include <memory>
+#include <optional>
 #include <string>
 #include <thread>
+#include <utility>
 #include <vector>
 
 #include <gmock/gmock.h>
@@ -91,6 +94,36 @@ protected:
 
 std::string Vconf::folder;
 
+/// A session that says nothing of languages at first; the test's own comes back at the end.
+class SessionLocale
+{
+public:
+    SessionLocale()
+    {
+        for (const char *name : {"LC_ALL", "LC_MESSAGES", "LANG", "LANGUAGE"}) {
+            const char *value = getenv(name);
+            before_.emplace_back(name, value ? std::optional<std::string>(value) : std::nullopt);
+            unsetenv(name);
+        }
+    }
+    ~SessionLocale()
+    {
+        for (const auto &[name, value] : before_) {
+            if (value)
+                setenv(name.c_str(), value->c_str(), 1);
+            else
+                unsetenv(name.c_str());
+        }
+    }
+    SessionLocale(const SessionLocale &) = delete;
+    SessionLocale &operator=(const SessionLocale &) = delete;
+
+    void say(const char *name, const char *value) const { setenv(name, value, 1); }
+
+private:
+    std::vector<std::pair<std::string, std::optional<std::string>>> before_;
+};
+
 } // namespace
 
 TEST_F(Vconf, ValuesComeBackByTheirType)
@@ -120,7 +153,6 @@ TEST_F(Vconf, AnAbsentKeyAndAnotherTypeAreErrorsThatWriteNothing)
     EXPECT_EQ(7, number);
     vconf_set_int(kNumber, 1);
     EXPECT_EQ(nullptr, vconf_get_str(kNumber));
-    EXPECT_EQ(nullptr, vconf_get_str("db/menu_widget/language"));
     EXPECT_EQ(nullptr, vconf_get_str(nullptr));
     EXPECT_EQ(-1, vconf_get_int(nullptr, &number));
     EXPECT_EQ(-1, vconf_get_int(kNumber, nullptr));
@@ -190,6 +222,50 @@ TEST_F(Vconf, AFileWrittenByHandIsHeard)
     vconf_ignore_key_changed(VCONFKEY_LANGSET, listen);
     EXPECT_THAT(heard, ElementsAre("db/menu_widget/language -1 -1 de_DE.UTF-8"));
     std::filesystem::remove(file(VCONFKEY_LANGSET));
+}
+
+TEST_F(Vconf, TheLanguageIsTheSessionsWhileNobodyHasSetOne)
+{
+    const SessionLocale locale;
+    const auto language = [] {
+        const std::unique_ptr<char, decltype(&free)> read(vconf_get_str(VCONFKEY_LANGSET), free);
+        return std::string(read ? read.get() : "absent");
+    };
+    EXPECT_EQ("absent", language());
+    locale.say("LANG", "fr_FR.UTF-8");
+    EXPECT_EQ("fr_FR.UTF-8", language());
+    locale.say("LC_MESSAGES", "pt_BR.utf8");
+    EXPECT_EQ("pt_BR.UTF-8", language());
+    locale.say("LC_ALL", "de_AT@euro");
+    EXPECT_EQ("de_AT.UTF-8", language());
+    for (const char *none : {"C", "POSIX", "C.UTF-8", "C.utf8"}) {
+        locale.say("LC_ALL", none);
+        EXPECT_EQ("absent", language()) << none;
+    }
+    locale.say("LC_ALL", "");
+    EXPECT_EQ("pt_BR.UTF-8", language());
+    ASSERT_EQ(0, vconf_set_str(VCONFKEY_LANGSET, "ja_JP.UTF-8"));
+    EXPECT_EQ("ja_JP.UTF-8", language());
+    std::filesystem::remove(file(VCONFKEY_LANGSET));
+    EXPECT_EQ("pt_BR.UTF-8", language());
+}
+
+TEST_F(Vconf, TheFirstWishOfTheSessionGoesBeforeItsLocale)
+{
+    const SessionLocale locale;
+    const auto language = [&](const char *wishes) {
+        locale.say("LANGUAGE", wishes);
+        const std::unique_ptr<char, decltype(&free)> read(vconf_get_str(VCONFKEY_LANGSET), free);
+        return std::string(read ? read.get() : "absent");
+    };
+    // As for all texts of a session, the wish counts only beside a locale that is a language.
+    EXPECT_EQ("absent", language("nl"));
+    locale.say("LANG", "de_AT.UTF-8");
+    EXPECT_EQ("nl.UTF-8", language("nl:de"));
+    EXPECT_EQ("fr_CA.UTF-8", language("fr_CA.UTF-8:fr"));
+    EXPECT_EQ("de_AT.UTF-8", language("de:en"));
+    EXPECT_EQ("de_AT.UTF-8", language(""));
+    EXPECT_EQ("de_AT.UTF-8", language(":en"));
 }
 
 TEST_F(Vconf, SeveralCallbacksOfAKeyAreAllCalledAndMayRemoveThemselves)

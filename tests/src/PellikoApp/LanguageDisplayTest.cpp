@@ -21,10 +21,14 @@ protected:
     Language() { log.restart(); }
     ~Language() override { setenv("LOCPATH", locales.c_str(), 1); }
 
-    void forgetTheKey()
+    /// As on a desktop where nobody has chosen a language for the device.
+    static void leaveItToTheSession(const char *locale)
     {
         const std::string state = getenv("XDG_DATA_HOME");
         std::filesystem::remove_all(state + "/pelliko-platform/vconf");
+        unsetenv("LC_MESSAGES");
+        unsetenv("LANGUAGE");
+        setenv("LANG", locale, 1);
     }
 
     /// As on a machine that has no locale but C.UTF-8.
@@ -49,9 +53,18 @@ TEST_F(Language, DevicesLanguageIsApplied)
                             "_initI18n textdomain domain = pelliko"));
 }
 
-TEST_F(Language, WithoutAKeyItIsBritishEnglishUnderTwoSpellings)
+TEST_F(Language, WithoutAKeyItIsTheSessions)
 {
-    forgetTheKey();
+    leaveItToTheSession("de_DE.UTF-8");
+    _langChanged(nullptr, ad);
+    EXPECT_STREQ(getenv("LC_MESSAGES"), "de_DE.UTF-8");
+    EXPECT_EQ(log.messages().front(), "Current Lang : de_DE.UTF-8");
+    EXPECT_STREQ(translated("IDS_RSH_BUTTON_SHARE_ABB5"), "Teilen");
+}
+
+TEST_F(Language, WithoutAnyItIsBritishEnglishUnderTwoSpellings)
+{
+    leaveItToTheSession("C.UTF-8");
     _langChanged(nullptr, ad);
     EXPECT_STREQ(getenv("LANG"), "en_GB.utf8");
     EXPECT_STREQ(getenv("LC_MESSAGES"), "en_GB.utf8");
