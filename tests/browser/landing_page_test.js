@@ -138,7 +138,7 @@ const cases = {
       await page.goto(link.url);
       const paper = (colorScheme) => page.emulateMedia({ colorScheme })
         .then(() => style(page.locator('body'), 'backgroundColor'));
-      assert.equal(await paper('dark'), 'rgb(16, 19, 27)');
+      assert.equal(await paper('dark'), 'rgb(18, 22, 31)');
       assert.equal(await paper('light'), 'rgb(243, 245, 250)');
       for (const width of [320, 412, 640, 1280]) {
         await page.setViewportSize({ width, height: 640 });

@@ -5,14 +5,14 @@ namespace pelliko::server
 
 /// What is behind the card, which browsers also paint their own bars with.
 inline constexpr const char *paperInLight = "#f3f5fa";
-inline constexpr const char *paperInDark = "#10131b";
+inline constexpr const char *paperInDark = "#12161f";
 
 /// The one style sheet of all pages; it is inlined, and allowed by its hash. Colours and forms are
 /// those of the application. Sizes go by the reader's own size of text, but for the discs of the
 /// icons. The see-through borders show where the reader's colours replace all of ours.
 inline constexpr const char *pageStyle = R"css(
 :root{color-scheme:light dark;--paper:#f3f5fa;--card:#fff;--ink:#1b1f2a;--soft:#545c6b;--line:#e3e7ef;--accent:#2f5bea;--pressed:#2245bb;--on-accent:#fff;--tint:#e6ebf7;--on-tint:#1f2f66}
-@media (prefers-color-scheme:dark){:root{--paper:#10131b;--card:#1b202c;--ink:#eceff6;--soft:#a7b0c2;--line:#323a4b;--accent:#9db5ff;--pressed:#c1d0ff;--on-accent:#0e1a45;--tint:#2a3247;--on-tint:#c9d6ff}}
+@media (prefers-color-scheme:dark){:root{--paper:#12161f;--card:#1d2230;--ink:#eef1f8;--soft:#b3bccd;--line:#3a4254;--accent:#94abff;--pressed:#7f98f2;--on-accent:#0d1a44;--tint:#363f56;--on-tint:#e1e8ff}}
 *{box-sizing:border-box}
 html{-webkit-text-size-adjust:100%;text-size-adjust:100%}
 body{margin:0;background:var(--paper);color:var(--ink);font:106.25%/1.5 "Noto Sans",system-ui,-apple-system,"Segoe UI",Roboto,sans-serif;overflow-wrap:anywhere}
