@@ -14,6 +14,7 @@ pkg_check_modules(curl REQUIRED IMPORTED_TARGET libcurl)
 pkg_check_modules(archive REQUIRED IMPORTED_TARGET libarchive)
 pkg_check_modules(ebook_contacts REQUIRED IMPORTED_TARGET libebook-contacts-1.2)
 pkg_check_modules(systemd REQUIRED IMPORTED_TARGET libsystemd)
+pkg_check_modules(postgres REQUIRED IMPORTED_TARGET libpq)
 pkg_check_modules(openssl REQUIRED IMPORTED_TARGET openssl)
 find_package(SQLiteCpp REQUIRED)
 # scripts/setup installs the library without its development package, so without the plain name.

@@ -77,6 +77,13 @@ function(pelliko_script_test name)
   pelliko_test_properties(${name} "${arg_TIMEOUT}")
 endfunction()
 
+# pelliko_engines_test(NAME COMMAND words... [TIMEOUT seconds]): a script that starts the engines which only a share
+# server of many machines needs; run by ./test --engines alone.
+function(pelliko_engines_test name)
+  pelliko_script_test(${name} ${ARGN})
+  set_tests_properties(${name} PROPERTIES LABELS engines)
+endfunction()
+
 function(pelliko_session_command out kind)
   set(${out} "${PROJECT_SOURCE_DIR}/scripts/session" --build "${CMAKE_BINARY_DIR}"
       ${pelliko_session_${kind}} -- ${ARGN} PARENT_SCOPE)

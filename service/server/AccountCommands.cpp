@@ -1,12 +1,9 @@
 #include "AccountCommands.h"
 
-#include "DataDirectory.h"
 #include "PhoneNumbers.h"
 #include "accounts/Accounts.h"
 #include "accounts/E164.h"
 #include "accounts/Invitations.h"
-#include "store/DirectoryBlobs.h"
-#include "store/SqliteMetadata.h"
 #include "text/Escape.h"
 
 #include <cstdio>
@@ -51,8 +48,7 @@ int failWithoutAccount(const std::string &number)
 
 } // namespace
 
-int addAccountCommand(const std::filesystem::path &data, const std::string &number,
-                      const std::string &name)
+int addAccountCommand(const StoreUrls &stores, const std::string &number, const std::string &name)
 {
     const numbers::NumberForm form = formOf(number);
     if (!form.fault.empty()) {
@@ -62,9 +58,8 @@ int addAccountCommand(const std::filesystem::path &data, const std::string &numb
                      number.c_str(), numbers::faultSentence(form.fault));
         return EXIT_FAILURE;
     }
-    makeDataDirectory(data);
-    SqliteMetadata metadata(metadataFile(data));
-    const auto token = makeAccount(metadata, form.e164, name, std::time(nullptr));
+    const auto metadata = openMetadata(stores.metadata, Absent::isMade);
+    const auto token = makeAccount(*metadata, form.e164, name, std::time(nullptr));
     if (!token) {
         std::fprintf(stderr, "pelliko-server: %s has an account already.\n", form.e164.c_str());
         return EXIT_FAILURE;
@@ -73,71 +68,72 @@ int addAccountCommand(const std::filesystem::path &data, const std::string &numb
     return EXIT_SUCCESS;
 }
 
-int listAccountsCommand(const std::filesystem::path &data)
+int listAccountsCommand(const StoreUrls &stores)
 {
-    SqliteMetadata metadata(metadataFile(data));
-    for (const Account &account : metadata.listAccounts())
+    const auto metadata = openMetadata(stores.metadata, Absent::fails);
+    for (const Account &account : metadata->listAccounts())
         std::printf("%s\t%s\t%s\n", account.number.c_str(), isoDate(account.created).c_str(),
                     account.name.c_str());
     return EXIT_SUCCESS;
 }
 
-int removeAccountCommand(const std::filesystem::path &data, const std::string &number)
+int removeAccountCommand(const StoreUrls &stores, const std::string &number)
 {
-    SqliteMetadata metadata(metadataFile(data));
-    const auto kept = keptNumber(metadata, number);
-    if (!kept || !metadata.removeAccount(*kept))
+    const auto metadata = openMetadata(stores.metadata, Absent::fails);
+    const auto kept = keptNumber(*metadata, number);
+    if (!kept || !metadata->removeAccount(*kept))
         return failWithoutAccount(number);
-    DirectoryBlobs blobs(blobsDirectory(data));
-    for (auto keys = metadata.doomedBlobs(); !keys.empty(); keys = metadata.doomedBlobs()) {
+    // Without their address the bytes are left to the servers that run.
+    if (stores.blobs.empty())
+        return EXIT_SUCCESS;
+    const auto blobs = openBlobs(stores.blobs);
+    for (auto keys = metadata->doomedBlobs(); !keys.empty(); keys = metadata->doomedBlobs()) {
         for (const std::string &key : keys) {
-            blobs.remove(key);
-            metadata.forgetBlob(key);
+            blobs->remove(key);
+            metadata->forgetBlob(key);
         }
     }
     return EXIT_SUCCESS;
 }
 
-int inviteCommand(const std::filesystem::path &data, const InvitationOptions &options)
+int inviteCommand(const StoreUrls &stores, const InvitationOptions &options)
 {
-    makeDataDirectory(data);
-    SqliteMetadata metadata(metadataFile(data));
+    const auto metadata = openMetadata(stores.metadata, Absent::isMade);
     const Seconds now = std::time(nullptr);
     const std::string code =
-        makeInvitation(metadata, {}, options.uses, now, now + options.lifetime);
+        makeInvitation(*metadata, {}, options.uses, now, now + options.lifetime);
     std::printf("%s\n", code.c_str());
     return EXIT_SUCCESS;
 }
 
-int listInvitationsCommand(const std::filesystem::path &data)
+int listInvitationsCommand(const StoreUrls &stores)
 {
-    SqliteMetadata metadata(metadataFile(data));
-    for (const Invitation &invitation : metadata.listInvitations())
+    const auto metadata = openMetadata(stores.metadata, Absent::fails);
+    for (const Invitation &invitation : metadata->listInvitations())
         std::printf("%lld\t%s\t%s\t%d/%d\t%s\n", static_cast<long long>(invitation.id),
                     isoDate(invitation.created).c_str(), isoDate(invitation.expires).c_str(),
                     invitation.used, invitation.uses, invitation.number.c_str());
     return EXIT_SUCCESS;
 }
 
-int revokeInvitationCommand(const std::filesystem::path &data, std::int64_t id)
+int revokeInvitationCommand(const StoreUrls &stores, std::int64_t id)
 {
-    SqliteMetadata metadata(metadataFile(data));
-    if (metadata.removeInvitation(id))
+    const auto metadata = openMetadata(stores.metadata, Absent::fails);
+    if (metadata->removeInvitation(id))
         return EXIT_SUCCESS;
     std::fprintf(stderr, "pelliko-server: there is no invitation %lld.\n",
                  static_cast<long long>(id));
     return EXIT_FAILURE;
 }
 
-int renewAccountCommand(const std::filesystem::path &data, const std::string &number,
-                        std::int64_t lifetime)
+int renewAccountCommand(const StoreUrls &stores, const std::string &number, std::int64_t lifetime)
 {
-    SqliteMetadata metadata(metadataFile(data));
-    const auto kept = keptNumber(metadata, number);
+    const auto metadata = openMetadata(stores.metadata, Absent::fails);
+    const auto kept = keptNumber(*metadata, number);
     if (!kept)
         return failWithoutAccount(number);
     const Seconds now = std::time(nullptr);
-    const std::string code = makeInvitation(metadata, *kept, 1, now, now + lifetime);
+    const std::string code = makeInvitation(*metadata, *kept, 1, now, now + lifetime);
     std::printf("%s\n", code.c_str());
     return EXIT_SUCCESS;
 }

@@ -2,9 +2,9 @@
 
 #include "http/Connection.h"
 #include "shares/Limits.h"
+#include "store/OpenStores.h"
 
 #include <cstdint>
-#include <filesystem>
 #include <string>
 
 namespace pelliko::server
@@ -14,7 +14,7 @@ namespace pelliko::server
 struct Config {
     /// An IPv4 address, or an IPv6 one in brackets, a colon and a port; port 0 picks a free one.
     std::string listen = "127.0.0.1:8080";
-    std::filesystem::path data;
+    StoreUrls stores;
     /// What links start with; empty for the address that is listened on.
     std::string publicUrl;
     Limits limits;

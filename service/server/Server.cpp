@@ -8,6 +8,7 @@
 #include <boost/asio/as_tuple.hpp>
 #include <boost/asio/co_spawn.hpp>
 #include <boost/asio/detached.hpp>
+#include <boost/asio/dispatch.hpp>
 #include <boost/asio/io_context.hpp>
 #include <boost/asio/ip/tcp.hpp>
 #include <boost/asio/post.hpp>
@@ -32,8 +33,6 @@ namespace asio = boost::asio;
 using asio::ip::tcp;
 constexpr auto asTuple = asio::as_tuple(asio::use_awaitable);
 
-/// Threads that wait for the disk; more than cores, since they wait.
-constexpr std::size_t poolThreads = 8;
 /// How long a stop waits for requests in hand.
 constexpr std::chrono::seconds stopPatience{10};
 /// When the system refuses a connection for want of descriptors or memory.
@@ -49,18 +48,18 @@ Limits limitsOf(const Config &config, const Capacity &capacity)
 } // namespace
 
 struct Server::State {
-    State(const Config &config, Metadata &metadata, Blobs &blobs, std::function<Seconds()> now)
-        : timeouts(config.timeouts), pool(poolThreads),
+    State(const Config &config, Metadata &metadata, Blobs &blobs, std::function<Seconds()> now,
+          std::unique_ptr<Peers> others)
+        : timeouts(config.timeouts), peers(std::move(others)), pool(storageThreads), writes(*peers),
           pushes(io.get_executor(), limitsOf(config, capacity)),
-          context{metadata,         blobs, pool, writes, pushes, config.limits, std::move(now),
-                  config.publicUrl, {},    {}},
+          context{metadata,      blobs,          *peers,          pool, writes, pushes,
+                  config.limits, std::move(now), config.publicUrl},
           sweeper(io.get_executor(), context), acceptor(io), signals(io, SIGTERM, SIGINT),
           stopTimer(io), room(io, asio::steady_timer::time_point::max())
     {
-        context.wakeSweeper = [this] { sweeper.wake(); };
-        context.announcePushes = [this](const auto &accounts) { pushes.announce(accounts); };
     }
 
+    [[nodiscard]] Peers::Ears ears();
     void listen(const ListenAddress &address);
     Task<void> acceptAll();
     Task<void> serve(std::shared_ptr<Connection> connection);
@@ -71,6 +70,7 @@ struct Server::State {
     const Capacity capacity = claimCapacity();
     Timeouts timeouts;
     asio::io_context io{1};
+    std::unique_ptr<Peers> peers;
     StoragePool pool;
     ActiveWrites writes;
     PushHub pushes;
@@ -87,6 +87,22 @@ struct Server::State {
     /// Nothing is waited for any more.
     bool ended = false;
 };
+
+/// What other servers tell, brought to the network thread.
+Peers::Ears Server::State::ears()
+{
+    Peers::Ears ears;
+    ears.pushes = [this](const std::vector<std::int64_t> &accounts) {
+        asio::dispatch(io, [this, accounts] { pushes.announce(accounts); });
+    };
+    ears.missed = [this] { asio::dispatch(io, [this] { pushes.announceAll(); }); };
+    ears.stopWriting = [this](const std::string &blob) {
+        asio::dispatch(io, [this, blob] { writes.stop(blob); });
+    };
+    ears.stopAllWriting = [this] { asio::dispatch(io, [this] { writes.stopAll(); }); };
+    ears.sweep = [this] { asio::dispatch(io, [this] { sweeper.wake(); }); };
+    return ears;
+}
 
 void Server::State::listen(const ListenAddress &address)
 {
@@ -182,14 +198,17 @@ Task<void> Server::State::cutAfterPatience()
     signals.cancel();
 }
 
-Server::Server(const Config &config, Metadata &metadata, Blobs &blobs, std::function<Seconds()> now)
-    : m_state(std::make_unique<State>(config, metadata, blobs, std::move(now)))
+Server::Server(const Config &config, Metadata &metadata, Blobs &blobs, std::function<Seconds()> now,
+               std::unique_ptr<Peers> peers)
+    : m_state(std::make_unique<State>(config, metadata, blobs, std::move(now),
+                                      peers ? std::move(peers) : std::make_unique<NoPeers>()))
 {
     m_state->listen(parseListenAddress(config.listen));
 }
 
 Server::~Server()
 {
+    m_state->peers->close();
     m_state->pool.join();
 }
 
@@ -200,6 +219,7 @@ std::string Server::url() const
 
 void Server::run()
 {
+    m_state->peers->listen(m_state->ears());
     asio::co_spawn(m_state->io, m_state->acceptAll(), asio::detached);
     asio::co_spawn(m_state->io, m_state->waitForSignals(), asio::detached);
     asio::co_spawn(m_state->io, m_state->sweeper.run(), asio::detached);

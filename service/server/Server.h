@@ -3,6 +3,7 @@
 #include "Config.h"
 #include "store/Blobs.h"
 #include "store/Metadata.h"
+#include "store/Peers.h"
 
 #include <functional>
 #include <memory>
@@ -15,9 +16,14 @@ namespace pelliko::server
 class Server
 {
 public:
+    /// How many calls of the stores it makes at once.
+    static constexpr std::size_t storageThreads = 8;
+
     /// Starts to listen; throws std::exception with a sentence when that fails. The stores outlive
-    /// the server. `now` gives seconds since the epoch.
-    Server(const Config &config, Metadata &metadata, Blobs &blobs, std::function<Seconds()> now);
+    /// the server. `now` gives seconds since the epoch; without `peers` it has the stores for
+    /// itself.
+    Server(const Config &config, Metadata &metadata, Blobs &blobs, std::function<Seconds()> now,
+           std::unique_ptr<Peers> peers = nullptr);
     ~Server();
 
     /// "http://host:port", with the port that was picked.

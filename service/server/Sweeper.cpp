@@ -6,6 +6,7 @@
 #include <algorithm>
 #include <chrono>
 #include <cstdio>
+#include <utility>
 #include <vector>
 
 namespace pelliko::server
@@ -37,17 +38,11 @@ void Sweeper::stop()
 
 Task<void> Sweeper::run()
 {
-    try {
-        co_await removeStrays();
-    } catch (const std::exception &error) {
-        std::fprintf(stderr, "pelliko-server: looking for strays: %s\n", error.what());
-    }
     while (!m_stopped) {
         m_woken = false;
         bool failed = false;
         try {
-            co_await sweep();
-            co_await sleep();
+            co_await round();
         } catch (const std::exception &error) {
             std::fprintf(stderr, "pelliko-server: sweeping: %s\n", error.what());
             failed = true;
@@ -57,6 +52,25 @@ Task<void> Sweeper::run()
             co_await m_timer.async_wait(boost::asio::as_tuple(boost::asio::use_awaitable));
         }
     }
+}
+
+Task<void> Sweeper::round()
+{
+    if (!m_context.peers.sweeps()) {
+        m_timer.expires_at(std::chrono::system_clock::time_point::max());
+        if (!m_woken && !m_stopped)
+            co_await m_timer.async_wait(boost::asio::as_tuple(boost::asio::use_awaitable));
+        co_return;
+    }
+    if (!std::exchange(m_lookedForStrays, true)) {
+        try {
+            co_await removeStrays();
+        } catch (const std::exception &error) {
+            std::fprintf(stderr, "pelliko-server: looking for strays: %s\n", error.what());
+        }
+    }
+    co_await sweep();
+    co_await sleep();
 }
 
 /// Bytes that the database does not know are needed by nobody: a copy of it that was put back may

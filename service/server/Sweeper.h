@@ -8,7 +8,8 @@ namespace pelliko::server
 {
 
 /// Deletes what has expired, at the second when it does: sleeps until the next deadline that the
-/// store knows, or until it is woken. Network thread only.
+/// store knows, or until it is woken. Of several servers one sweeps; the others' sweepers sleep
+/// until it is theirs to do. Network thread only.
 class Sweeper
 {
 public:
@@ -22,6 +23,7 @@ public:
     void stop();
 
 private:
+    Task<void> round();
     Task<void> removeStrays();
     Task<void> sweep();
     Task<void> removeDoomed();
@@ -29,6 +31,7 @@ private:
 
     Context &m_context;
     boost::asio::system_timer m_timer;
+    bool m_lookedForStrays = false;
     bool m_woken = false;
     bool m_stopped = false;
 };

@@ -1,9 +1,7 @@
 #include "AccountCommands.h"
 #include "Config.h"
-#include "DataDirectory.h"
 #include "Server.h"
-#include "store/DirectoryBlobs.h"
-#include "store/SqliteMetadata.h"
+#include "store/OpenStores.h"
 
 #include <CLI/CLI.hpp>
 #include <systemd/sd-daemon.h>
@@ -15,17 +13,25 @@
 #include <csignal>
 #include <cstdio>
 #include <cstdlib>
-#include <ctime>
 #include <map>
 #include <string>
+#include <utility>
 
 namespace
 {
 
 namespace server = pelliko::server;
 
-struct AccountOptions {
+/// Where the data are, as it was asked for.
+struct StoreOptions {
     std::string data;
+    server::StoreUrls urls;
+
+    [[nodiscard]] server::StoreUrls stores() const { return server::storeUrls(data, urls); }
+};
+
+struct AccountOptions {
+    StoreOptions stores;
     std::string number;
     std::string name;
     server::InvitationOptions invitation;
@@ -35,7 +41,7 @@ struct AccountOptions {
 
 struct ServeOptions {
     server::Config config;
-    std::string data;
+    StoreOptions stores;
     long headTimeout = server::Timeouts{}.head.count();
     long idleTimeout = server::Timeouts{}.idle.count();
     long progressTimeout = server::Timeouts{}.progress.count();
@@ -54,28 +60,33 @@ void announce(const server::Server &server, int readyFd)
 int serve(const ServeOptions &options)
 {
     server::Config config = options.config;
-    config.data = options.data;
+    config.stores = options.stores.stores();
     config.publicUrl = server::normalPublicUrl(config.publicUrl);
     config.timeouts.head = std::chrono::seconds(options.headTimeout);
     config.timeouts.idle = std::chrono::seconds(options.idleTimeout);
     config.timeouts.progress = std::chrono::seconds(options.progressTimeout);
-    server::makeDataDirectory(config.data);
-    const server::DataLock lock(config.data);
-    server::SqliteMetadata metadata(server::metadataFile(config.data));
-    metadata.verify();
-    server::DirectoryBlobs blobs(server::blobsDirectory(config.data));
-    server::Server running(config, metadata, blobs, [] { return std::time(nullptr); });
+    server::Stores stores = server::openStores(config.stores, server::Server::storageThreads);
+    server::Server running(config, *stores.metadata, *stores.blobs, stores.now,
+                           std::move(stores.peers));
     announce(running, config.readyFd);
     running.run();
     return EXIT_SUCCESS;
+}
+
+void addStores(CLI::App &command, StoreOptions &options)
+{
+    command.add_option("--data", options.data,
+                       "Directory of everything the server keeps, as far as nothing else is given");
+    command.add_option("--metadata", options.urls.metadata,
+                       "What is known about shares: sqlite:PATH or postgresql://HOST/DATABASE");
+    command.add_option("--blobs", options.urls.blobs, "The bytes of files: dir:PATH");
 }
 
 void addServe(CLI::App &app, ServeOptions &options)
 {
     CLI::App *command = app.add_subcommand("serve", "Serve uploads, links and downloads");
     server::Limits &limits = options.config.limits;
-    command->add_option("--data", options.data, "Directory of everything the server keeps")
-        ->required();
+    addStores(*command, options.stores);
     command->add_option("--listen", options.config.listen, "Address and port; port 0 picks one")
         ->capture_default_str();
     command->add_option("--public-url", options.config.publicUrl,
@@ -157,16 +168,16 @@ void addInvite(CLI::App &account, AccountOptions &options)
     renew->add_option("--number", options.number, "Phone number of the account")->required();
     addLifetime(*renew, options.invitation);
     for (CLI::App *command : {invite, renew})
-        command->add_option("--data", options.data, "The server's directory")->required();
+        addStores(*command, options.stores);
 }
 
 int runInvite(const AccountOptions &options)
 {
     if (options.list)
-        return server::listInvitationsCommand(options.data);
+        return server::listInvitationsCommand(options.stores.stores());
     if (options.revoke != 0)
-        return server::revokeInvitationCommand(options.data, options.revoke);
-    return server::inviteCommand(options.data, options.invitation);
+        return server::revokeInvitationCommand(options.stores.stores(), options.revoke);
+    return server::inviteCommand(options.stores.stores(), options.invitation);
 }
 
 void addAccount(CLI::App &app, AccountOptions &options)
@@ -177,7 +188,7 @@ void addAccount(CLI::App &app, AccountOptions &options)
     CLI::App *list = account->add_subcommand("list", "Print number, creation time and name");
     CLI::App *remove = account->add_subcommand("remove", "Remove an account with all its shares");
     for (CLI::App *command : {add, list, remove})
-        command->add_option("--data", options.data, "The server's directory")->required();
+        addStores(*command, options.stores);
     for (CLI::App *command : {add, remove})
         command->add_option("--number", options.number, "Phone number, like +4915112345678")
             ->required();
@@ -192,16 +203,16 @@ int runCommand(const CLI::App &app, const ServeOptions &serveOptions,
         return serve(serveOptions);
     const CLI::App *account = app.get_subcommand("account");
     if (account->got_subcommand("add"))
-        return server::addAccountCommand(accountOptions.data, accountOptions.number,
+        return server::addAccountCommand(accountOptions.stores.stores(), accountOptions.number,
                                          accountOptions.name);
     if (account->got_subcommand("invite"))
         return runInvite(accountOptions);
     if (account->got_subcommand("renew"))
-        return server::renewAccountCommand(accountOptions.data, accountOptions.number,
+        return server::renewAccountCommand(accountOptions.stores.stores(), accountOptions.number,
                                            accountOptions.invitation.lifetime);
     if (account->got_subcommand("remove"))
-        return server::removeAccountCommand(accountOptions.data, accountOptions.number);
-    return server::listAccountsCommand(accountOptions.data);
+        return server::removeAccountCommand(accountOptions.stores.stores(), accountOptions.number);
+    return server::listAccountsCommand(accountOptions.stores.stores());
 }
 
 int runProgram(int argc, char **argv)

@@ -70,7 +70,7 @@ Task<void> endFormerStreams(Context &context, const std::string &tokenHash)
     if (!account)
         co_return;
     const std::vector<std::int64_t> accounts{account->id};
-    context.announcePushes(accounts);
+    context.peers.announcePushes(accounts);
 }
 
 } // namespace

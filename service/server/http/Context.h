@@ -6,11 +6,11 @@
 #include "shares/Limits.h"
 #include "store/Blobs.h"
 #include "store/Metadata.h"
+#include "store/Peers.h"
 #include "tus/ActiveWrites.h"
 
 #include <functional>
 #include <string>
-#include <vector>
 
 namespace pelliko::server
 {
@@ -19,6 +19,7 @@ namespace pelliko::server
 struct Context {
     Metadata &metadata;
     Blobs &blobs;
+    Peers &peers;
     StoragePool &pool;
     ActiveWrites &writes;
     PushHub &pushes;
@@ -27,11 +28,6 @@ struct Context {
     std::function<Seconds()> now;
     /// What links start with: scheme, host, no slash at the end.
     std::string publicUrl;
-    /// Called when bytes became unneeded or a deadline was set.
-    std::function<void()> wakeSweeper;
-    /// Called when these accounts have new pushes, or another token than before. With several
-    /// servers on one store this is where each tells the others.
-    std::function<void(const std::vector<std::int64_t> &)> announcePushes;
     AttemptLimiter registrations{limits.registrations, limits.registrationWindow};
 };
 

@@ -36,6 +36,7 @@ constexpr ErrorEntry table[] = {
     {Error::internal, "internal", 500, "The server failed."},
     {Error::noSpace, "no_space", 507, "The store is full."},
     {Error::busy, "busy", 503, "The server has as many push streams as it can carry."},
+    {Error::unavailable, "unavailable", 503, "The server's store cannot be reached at the moment."},
     {Error::numberInvalid, "number_invalid", 400,
      "The number has to be in international form, like +4915112345678."},
     {Error::numberTaken, "number_taken", 409, "The number has an account already."},

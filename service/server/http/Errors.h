@@ -33,6 +33,7 @@ enum class Error {
     internal,
     noSpace,
     busy,
+    unavailable,
     numberInvalid,
     numberTaken,
     codeUnknown,

@@ -28,6 +28,9 @@ namespace
 
 using Parts = std::vector<std::string>;
 
+/// A database that is restarted is there again by then.
+constexpr const char *secondsUntilRetry = "5";
+
 Parts splitPath(std::string_view path)
 {
     Parts parts;
@@ -194,6 +197,19 @@ Task<void> route(Exchange &exchange, Context &context)
         throw Refusal(Error::notFound);
 }
 
+Refusal refusalOf(StorageFailure::Kind kind)
+{
+    switch (kind) {
+    case StorageFailure::Kind::full:
+        return Refusal(Error::noSpace);
+    case StorageFailure::Kind::unavailable:
+        return Refusal(Error::unavailable, {}, {{"Retry-After", secondsUntilRetry}});
+    case StorageFailure::Kind::broken:
+        break;
+    }
+    return Refusal(Error::internal);
+}
+
 Refusal refusalOf(const std::exception_ptr &failure)
 {
     try {
@@ -204,8 +220,7 @@ Refusal refusalOf(const std::exception_ptr &failure)
         throw;
     } catch (const StorageFailure &error) {
         std::fprintf(stderr, "pelliko-server: %s\n", error.what());
-        return Refusal(error.kind() == StorageFailure::Kind::full ? Error::noSpace
-                                                                  : Error::internal);
+        return refusalOf(error.kind());
     } catch (const std::exception &error) {
         std::fprintf(stderr, "pelliko-server: %s\n", error.what());
         return Refusal(Error::internal);

@@ -95,6 +95,14 @@ void PushHub::announce(const std::vector<std::int64_t> &accounts)
     }
 }
 
+void PushHub::announceAll()
+{
+    for (const auto &[account, seats] : m_seats) {
+        for (Seat *seat : seats)
+            seat->look();
+    }
+}
+
 void PushHub::beatAll(bool look)
 {
     for (const auto &[account, seats] : m_seats) {

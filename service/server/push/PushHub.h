@@ -64,6 +64,8 @@ public:
 
     /// These accounts' streams have to look.
     void announce(const std::vector<std::int64_t> &accounts);
+    /// All streams have to look.
+    void announceAll();
 
     /// Beats until stopped.
     Task<void> run();

@@ -53,7 +53,7 @@ Task<void> createShare(Exchange &exchange, Context &context)
     const CreateResult result =
         co_await context.pool.run([&] { return context.metadata.createShare(share); });
     checkCreated(result);
-    context.wakeSweeper();
+    context.peers.wakeSweeper();
     const bool known = result.outcome == CreateResult::Outcome::known;
     co_await exchange.respond(
         jsonResponse(known ? Status::ok : Status::created, shareJson(result.share)));
@@ -98,8 +98,8 @@ Task<void> finishShare(Exchange &exchange, Context &context, std::string key)
     case FinishResult::Outcome::finished:
         break;
     }
-    context.wakeSweeper();
-    context.announcePushes(result.pushed);
+    context.peers.wakeSweeper();
+    context.peers.announcePushes(result.pushed);
     co_await exchange.respond(
         jsonResponse(Status::ok, finishedJson(result, context.publicUrl + "/s/" + token)));
 }
@@ -114,7 +114,7 @@ Task<void> withdrawShare(Exchange &exchange, Context &context, std::string key)
         throw Refusal(Error::notFound);
     for (const std::string &blob : *blobs)
         context.writes.stop(blob);
-    context.wakeSweeper();
+    context.peers.wakeSweeper();
     co_await exchange.respond(makeResponse(Status::noContent));
 }
 

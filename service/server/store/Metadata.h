@@ -255,8 +255,14 @@ public:
     virtual std::optional<UploadRecord> findUpload(std::int64_t account, const std::string &upload,
                                                    Seconds now) = 0;
     /// Notes that `offset` bytes of the blob are on stable storage; never goes back. False when the
-    /// blob is no longer wanted.
-    virtual bool recordOffset(const std::string &blob, std::uint64_t offset) = 0;
+    /// blob is no longer wanted, or `right`, which Peers gave for writing it, is no longer the last
+    /// one that was given; 0 asks for no right.
+    virtual bool recordOffset(const std::string &blob, std::uint64_t offset,
+                              std::int64_t right) = 0;
+    bool recordOffset(const std::string &blob, std::uint64_t offset)
+    {
+        return recordOffset(blob, offset, 0);
+    }
     /// Gives the file a new, empty blob; the former one's bytes stay in the account's use. False
     /// when the upload does not exist or its share is not uploading.
     virtual bool resetUpload(std::int64_t account, const std::string &upload, Seconds now) = 0;

@@ -1,5 +1,6 @@
 #pragma once
 
+#include "store/Bytes.h"
 #include "store/SqliteMetadata.h"
 #include "store/StorageFailure.h"
 
@@ -13,11 +14,6 @@
 
 namespace pelliko::server
 {
-
-/// Raw bytes as a parameter: a hash is a BLOB, which a text never equals.
-struct Bytes {
-    const std::string &value;
-};
 
 /// One run of a prepared statement, reset at its end: a statement left in mid-step would keep its
 /// view of the database open and the write-ahead log growing.

@@ -50,7 +50,9 @@ public:
 
     std::optional<UploadRecord> findUpload(std::int64_t account, const std::string &upload,
                                            Seconds now) override;
-    bool recordOffset(const std::string &blob, std::uint64_t offset) override;
+    /// One server at a time has the file: its right to write is not looked at.
+    bool recordOffset(const std::string &blob, std::uint64_t offset, std::int64_t right) override;
+    using Metadata::recordOffset;
     bool resetUpload(std::int64_t account, const std::string &upload, Seconds now) override;
 
     std::vector<std::string> expireShares(Seconds now) override;

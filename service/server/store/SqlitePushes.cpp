@@ -10,16 +10,6 @@ namespace pelliko::server
 namespace
 {
 
-enum class PushState {
-    /// Has its plain token and is sent to every stream that opens.
-    waiting = 0,
-    acknowledged = 1,
-    /// The share ended while it waited. A stream may have sent it just before.
-    dropped = 2,
-    /// Stays as a mark, so that finishing again makes no second one.
-    forgotten = 3,
-};
-
 // The statements below name the states by number.
 static_assert(static_cast<int>(PushState::waiting) == 0);
 static_assert(static_cast<int>(PushState::acknowledged) == 1);

@@ -5,12 +5,6 @@
 namespace pelliko::server
 {
 
-ShareState stateAt(ShareState stored, Seconds deadline, Seconds now)
-{
-    const bool live = stored == ShareState::uploading || stored == ShareState::finished;
-    return live && deadline <= now ? ShareState::expired : stored;
-}
-
 ShareRow shareRowOf(const Query &row, Seconds now)
 {
     ShareRow share;

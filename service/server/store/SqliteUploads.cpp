@@ -36,7 +36,8 @@ std::optional<UploadRecord> SqliteMetadata::findUpload(std::int64_t account,
     });
 }
 
-bool SqliteMetadata::recordOffset(const std::string &blob, std::uint64_t offset)
+bool SqliteMetadata::recordOffset(const std::string &blob, std::uint64_t offset,
+                                  std::int64_t /*right*/)
 {
     auto &db = *m_connection;
     return db.write([&] {

@@ -10,7 +10,12 @@ namespace pelliko::server
 class StorageFailure : public std::runtime_error
 {
 public:
-    enum class Kind { broken, full };
+    enum class Kind {
+        broken,
+        full,
+        /// Not to be reached, or too busy: the same call may succeed a little later.
+        unavailable
+    };
 
     StorageFailure(Kind kind, const std::string &what) : std::runtime_error(what), m_kind(kind) {}
 

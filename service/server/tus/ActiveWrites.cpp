@@ -1,10 +1,13 @@
 #include "tus/ActiveWrites.h"
 
 #include <boost/asio/as_tuple.hpp>
+#include <boost/asio/dispatch.hpp>
 #include <boost/asio/this_coro.hpp>
 #include <boost/asio/use_awaitable.hpp>
 #include <boost/system/system_error.hpp>
 
+#include <exception>
+#include <optional>
 #include <utility>
 #include <vector>
 
@@ -31,6 +34,7 @@ ActiveWrites::Lease::~Lease()
 {
     if (!m_entry)
         return;
+    m_entry->owner.m_peers.release(m_entry->write->key);
     m_entry->owner.m_entries.erase(m_entry->write->key);
     try {
         m_entry->released.cancel();
@@ -58,8 +62,37 @@ Task<ActiveWrites::Lease> ActiveWrites::take(std::string key, std::function<void
     }
     auto entry = std::make_shared<Lease::Entry>(*this, executor, std::move(stop));
     entry->write->key = key;
-    m_entries.emplace(std::move(key), entry);
-    co_return Lease(std::move(entry));
+    m_entries.emplace(key, entry);
+    // From here on the place is given back however this ends.
+    Lease lease(entry);
+    entry->write->right = co_await claim(std::move(key));
+    co_return lease;
+}
+
+Task<std::int64_t> ActiveWrites::claim(std::string key)
+{
+    struct Answer {
+        explicit Answer(const asio::any_io_executor &executor)
+            : came(executor, asio::steady_timer::time_point::max())
+        {
+        }
+        /// Never expires: cancelled when the answer has come.
+        asio::steady_timer came;
+        std::optional<Peers::Claimed> claimed;
+    };
+    const auto executor = co_await asio::this_coro::executor;
+    const auto answer = std::make_shared<Answer>(executor);
+    m_peers.claim(key, [answer, executor](const Peers::Claimed &claimed) {
+        asio::dispatch(executor, [answer, claimed] {
+            answer->claimed = claimed;
+            answer->came.cancel();
+        });
+    });
+    while (!answer->claimed)
+        co_await answer->came.async_wait(asio::as_tuple(asio::use_awaitable));
+    if (answer->claimed->error)
+        std::rethrow_exception(answer->claimed->error);
+    co_return answer->claimed->right;
 }
 
 std::shared_ptr<ActiveWrite> ActiveWrites::find(const std::string &key) const

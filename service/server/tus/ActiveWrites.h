@@ -2,6 +2,7 @@
 
 #include "http/Exchange.h"
 #include "store/Blobs.h"
+#include "store/Peers.h"
 
 #include <boost/asio/steady_timer.hpp>
 
@@ -23,12 +24,17 @@ struct ActiveWrite {
     std::uint64_t written = 0;
     /// The end of what may have been noted as durable; nothing before it is dropped.
     std::uint64_t kept = 0;
+    /// What Peers gave for it, to be shown with every offset.
+    std::int64_t right = 0;
 };
 
-/// Who writes which blob right now. Network thread only.
+/// Who writes which blob right now: of this server's requests one, and of all servers one. Network
+/// thread only.
 class ActiveWrites
 {
 public:
+    explicit ActiveWrites(Peers &peers) : m_peers(peers) {}
+
     /// The right to write one blob, until destroyed.
     class Lease
     {
@@ -49,7 +55,8 @@ public:
     };
 
     /// Ends whoever has the blob now, waits until that one let go, and takes its place. `stop` is
-    /// called when the next one wants it.
+    /// called when the next one wants it. Throws StorageFailure when the servers' common store does
+    /// not give the right.
     Task<Lease> take(std::string key, std::function<void()> stop);
 
     /// What is being written under this key, or null.
@@ -60,6 +67,9 @@ public:
     void stopAll();
 
 private:
+    [[nodiscard]] Task<std::int64_t> claim(std::string key);
+
+    Peers &m_peers;
     std::unordered_map<std::string, std::shared_ptr<Lease::Entry>> m_entries;
 };
 

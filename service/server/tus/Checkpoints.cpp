@@ -43,11 +43,16 @@ Task<void> checkpoint(Context &context, std::shared_ptr<ActiveWrite> write)
     if (!write->writer)
         co_return;
     const std::uint64_t upTo = write->kept = write->written;
-    const bool wanted = co_await context.pool.run([&] {
+    bool wanted = true;
+    const bool noted = co_await context.pool.run([&] {
         write->writer->sync();
-        return context.metadata.recordOffset(write->key, upTo);
+        const bool done = context.metadata.recordOffset(write->key, upTo, write->right);
+        wanted = done || context.metadata.recordOffset(write->key, 0);
+        return done;
     });
-    if (!wanted)
+    if (!noted && wanted)
+        throw Refusal(Error::conflict, "Another request has taken over this upload.");
+    if (!noted)
         throw Refusal(Error::gone);
 }
 

@@ -7,8 +7,8 @@
 namespace pelliko::server
 {
 
-/// Makes what was written so far durable and then notes the new offset. Refuses (gone) when the
-/// share ended meanwhile.
+/// Makes what was written so far durable and then notes the new offset. Refuses when the share
+/// ended meanwhile (gone), or another server has the upload now (conflict).
 Task<void> checkpoint(Context &context, std::shared_ptr<ActiveWrite> write);
 
 /// The checkpoints of one append, made while more of its body arrives, one at a time. Network

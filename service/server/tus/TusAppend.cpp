@@ -78,8 +78,13 @@ bool isFull(const std::exception_ptr &ending)
 Task<void> dropUnnoted(Context &context, std::shared_ptr<ActiveWrite> write)
 {
     write->written = write->kept;
-    if (write->writer)
-        co_await context.pool.run([&] { write->writer->truncate(write->kept); });
+    if (!write->writer)
+        co_return;
+    co_await context.pool.run([&] {
+        // What another server has stored since is not this one's to drop.
+        if (write->right == 0 || context.metadata.recordOffset(write->key, 0, write->right))
+            write->writer->truncate(write->kept);
+    });
 }
 
 void checkAppend(const Request &request, const UploadRecord &upload, std::uint64_t offset)

@@ -95,7 +95,7 @@ Task<void> makeOwnShare(Exchange &exchange, Context &context, Account account, M
     const CreateResult result =
         co_await context.pool.run([&] { return context.metadata.createShare(share); });
     checkCreated(result);
-    context.wakeSweeper();
+    context.peers.wakeSweeper();
     co_await answerCreated(exchange, result.share, 0, true);
 }
 
@@ -155,7 +155,7 @@ Task<void> drop(Exchange &exchange, Context &context, Account account, std::stri
         if (!dropped)
             throw Refusal(Error::gone);
     }
-    context.wakeSweeper();
+    context.peers.wakeSweeper();
     Response response = makeResponse(Status::noContent, {resumable()});
     co_await exchange.respond(std::move(response));
 }

@@ -152,12 +152,15 @@ std::string answersTo(std::string_view bytes)
             "there are sockets");
     Client client(ends[1]);
     asio::io_context io{1};
-    ActiveWrites writes;
+    NoPeers peers;
+    ActiveWrites writes(peers);
     PushHub pushes(io.get_executor(), world().limits);
-    Context context{world().metadata, world().blobs,      world().pool,   writes, pushes,
-                    world().limits,   [] { return now; }, "https://host", {},     {}};
-    context.wakeSweeper = [] {};
-    context.announcePushes = [&](const auto &accounts) { pushes.announce(accounts); };
+    Context context{world().metadata, world().blobs, peers,          world().pool,
+                    writes,           pushes,        world().limits, [] { return now; },
+                    "https://host"};
+    Peers::Ears ears;
+    ears.pushes = [&](const auto &accounts) { pushes.announce(accounts); };
+    peers.listen(ears);
     asio::ip::tcp::socket socket(io);
     socket.assign(asio::ip::tcp::v4(), ends[0]);
     const auto connection = Connection::make(

@@ -1,0 +1,232 @@
+#include "store/PostgresConnection.h"
+
+#include <libpq-fe.h>
+
+#include <algorithm>
+#include <array>
+#include <charconv>
+#include <cstring>
+#include <string_view>
+#include <utility>
+
+namespace pelliko::server
+{
+namespace
+{
+
+using Kind = StorageFailure::Kind;
+using Remedy = PostgresFailure::Remedy;
+
+// PostgreSQL's numbers of its types.
+constexpr std::uint32_t typeBytea = 17;
+constexpr std::uint32_t typeBigint = 20;
+constexpr std::uint32_t typeText = 25;
+constexpr std::uint32_t typeTextArray = 1009;
+constexpr std::uint32_t typeBigintArray = 1016;
+
+/// A statement that takes longer waits for something that will not come; its request is told to
+/// come again. A peer that is silent for the connection's own limits is taken for dead.
+constexpr const char *sessionSettings = "SET client_min_messages = warning;"
+                                        "SET client_encoding = 'UTF8';"
+                                        "SET statement_timeout = '15s';"
+                                        "SET lock_timeout = '10s';"
+                                        "SET idle_in_transaction_session_timeout = '20s';"
+                                        "SET standard_conforming_strings = on";
+
+std::string firstLineOf(const char *message)
+{
+    const std::string_view text = message == nullptr ? "" : message;
+    return std::string(text.substr(0, text.find('\n')));
+}
+
+/// What a five-character SQLSTATE means to who asked.
+std::pair<Kind, Remedy> meaningOf(std::string_view state)
+{
+    const auto isOf = [&](std::string_view group) { return state.substr(0, 2) == group; };
+    if (state == "40001" || state == "40P01")
+        return {Kind::unavailable, Remedy::repeat};
+    if (state == "53100")
+        return {Kind::full, Remedy::none};
+    // A server that became a standby takes no writes: another one does, or will.
+    if (isOf("08") || isOf("57") || state == "25006")
+        return {Kind::unavailable, state == "57014" ? Remedy::none : Remedy::reconnect};
+    if (isOf("53") || state == "55P03" || state == "25P03")
+        return {Kind::unavailable, Remedy::none};
+    return {Kind::broken, Remedy::none};
+}
+
+std::string elementOf(const std::string &value)
+{
+    if (value.find('\0') != std::string::npos)
+        throw StorageFailure(Kind::broken, "metadata: a text has a zero in it");
+    std::string element = "\"";
+    for (const char c : value) {
+        if (c == '"' || c == '\\')
+            element += '\\';
+        element += c;
+    }
+    return element + "\"";
+}
+
+template <class Values, class Form> std::string arrayOf(const Values &values, Form form)
+{
+    std::string array = "{";
+    for (const auto &value : values) {
+        if (array.size() > 1)
+            array += ',';
+        array += form(value);
+    }
+    return array + "}";
+}
+
+} // namespace
+
+void PostgresValues::add(std::int64_t value)
+{
+    m_values.push_back({typeBigint, false, false, std::to_string(value)});
+}
+
+void PostgresValues::add(const std::string &value)
+{
+    m_values.push_back({typeText, false, true, value});
+}
+
+void PostgresValues::add(const Bytes &bytes)
+{
+    m_values.push_back({typeBytea, false, true, bytes.value});
+}
+
+void PostgresValues::add(const std::optional<std::string> &value)
+{
+    m_values.push_back({typeText, !value, true, value.value_or("")});
+}
+
+void PostgresValues::add(const std::vector<std::string> &values)
+{
+    m_values.push_back({typeTextArray, false, false, arrayOf(values, elementOf)});
+}
+
+void PostgresValues::add(const std::vector<std::int64_t> &values)
+{
+    m_values.push_back({typeBigintArray, false, false,
+                        arrayOf(values, [](std::int64_t value) { return std::to_string(value); })});
+}
+
+void PostgresRows::Clear::operator()(pg_result *result) const
+{
+    PQclear(result);
+}
+
+bool PostgresRows::next()
+{
+    return ++m_row < PQntuples(m_result.get());
+}
+
+int PostgresRows::changed() const
+{
+    const std::string_view count = PQcmdTuples(m_result.get());
+    int value = 0;
+    std::from_chars(count.data(), count.data() + count.size(), value);
+    return value;
+}
+
+std::string PostgresRows::text(int column) const
+{
+    return {PQgetvalue(m_result.get(), m_row, column),
+            static_cast<std::size_t>(PQgetlength(m_result.get(), m_row, column))};
+}
+
+std::int64_t PostgresRows::integer(int column) const
+{
+    const std::string value = text(column);
+    if (value == "t" || value == "f")
+        return value == "t" ? 1 : 0;
+    std::int64_t number = 0;
+    std::from_chars(value.data(), value.data() + value.size(), number);
+    return number;
+}
+
+bool PostgresRows::isNull(int column) const
+{
+    return PQgetisnull(m_result.get(), m_row, column) != 0;
+}
+
+void PostgresConnection::Finish::operator()(pg_conn *connection) const
+{
+    PQfinish(connection);
+}
+
+PostgresConnection::PostgresConnection(const std::string &url)
+{
+    // What stands before the address are defaults, which it may override.
+    constexpr std::array<const char *, 10> names{
+        "fallback_application_name", "connect_timeout",  "keepalives_idle",
+        "keepalives_interval",       "keepalives_count", "tcp_user_timeout",
+        "target_session_attrs",      "dbname",           nullptr};
+    const std::array<const char *, 10> values{
+        "pelliko-server", "5", "2", "1", "3", "5000", "read-write", url.c_str(), nullptr};
+    m_connection.reset(PQconnectdbParams(names.data(), values.data(), 1));
+    if (!isAlive())
+        throw PostgresFailure(Kind::unavailable, Remedy::none,
+                              "metadata: " + firstLineOf(PQerrorMessage(get())));
+    PQsetNoticeProcessor(
+        get(), [](void *, const char *) {}, nullptr);
+    command(sessionSettings);
+}
+
+PostgresConnection::~PostgresConnection() = default;
+
+bool PostgresConnection::isAlive() const
+{
+    return PQstatus(get()) == CONNECTION_OK;
+}
+
+PostgresRows PostgresConnection::checked(pg_result *result)
+{
+    PostgresRows rows(result);
+    const ExecStatusType status = PQresultStatus(result);
+    if (status == PGRES_COMMAND_OK || status == PGRES_TUPLES_OK)
+        return rows;
+    const char *state = PQresultErrorField(result, PG_DIAG_SQLSTATE);
+    auto [kind, remedy] = meaningOf(state == nullptr ? "" : state);
+    if (!isAlive() || state == nullptr) {
+        kind = kind == Kind::full ? kind : Kind::unavailable;
+        remedy = Remedy::reconnect;
+    }
+    throw PostgresFailure(kind, remedy, "metadata: " + firstLineOf(PQerrorMessage(get())));
+}
+
+PostgresRows PostgresConnection::command(const std::string &sql)
+{
+    return checked(PQexec(get(), sql.c_str()));
+}
+
+const std::string &PostgresConnection::prepared(const char *sql, const PostgresValues &values)
+{
+    const auto found = m_statements.find(sql);
+    if (found != m_statements.end())
+        return found->second;
+    std::vector<Oid> types;
+    for (const PostgresValues::Value &value : values.m_values)
+        types.push_back(value.type);
+    std::string name = "s" + std::to_string(m_statements.size());
+    checked(PQprepare(get(), name.c_str(), sql, static_cast<int>(types.size()), types.data()));
+    return m_statements.emplace(sql, std::move(name)).first->second;
+}
+
+PostgresRows PostgresConnection::run(const char *sql, const PostgresValues &values)
+{
+    const std::string &name = prepared(sql, values);
+    std::vector<const char *> data;
+    std::vector<int> lengths;
+    std::vector<int> formats;
+    for (const PostgresValues::Value &value : values.m_values) {
+        data.push_back(value.isNull ? nullptr : value.data.c_str());
+        lengths.push_back(static_cast<int>(value.data.size()));
+        formats.push_back(value.isBinary ? 1 : 0);
+    }
+    return checked(PQexecPrepared(get(), name.c_str(), static_cast<int>(data.size()), data.data(),
+                                  lengths.data(), formats.data(), 0));
+}
+
+} // namespace pelliko::server

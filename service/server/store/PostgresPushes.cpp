@@ -1,0 +1,210 @@
+// Finishing shares, pushes and what accounts see of the shares that they received
+#include "store/PostgresMetadata.h"
+#include "store/PostgresRows.h"
+#include "text/Secrets.h"
+
+#include <algorithm>
+#include <map>
+#include <set>
+#include <utility>
+
+namespace pelliko::server
+{
+namespace
+{
+
+using Outcome = FinishResult::Outcome;
+
+// The statements below name the states by number.
+static_assert(static_cast<int>(PushState::waiting) == 0);
+static_assert(static_cast<int>(PushState::acknowledged) == 1);
+static_assert(static_cast<int>(PushState::forgotten) == 3);
+
+/// Bounds what a stream holds in memory; it asks again for the rest.
+constexpr int pushesAtOnce = 64;
+
+#define PELLIKO_RECEIVED_COLUMNS PELLIKO_SHARE_COLUMNS ", a.number, p.id"
+#define PELLIKO_RECEIVED_TABLES                                                                    \
+    " FROM pushes p JOIN shares s ON s.id = p.share JOIN accounts a ON a.id = s.account"
+
+/// The accounts among the recipients by number, locked in the order of their ids: two shares that
+/// go to the same people take them one after the other.
+std::map<std::string, std::int64_t> lockRecipients(PostgresConnection &db, const ShareRecord &share)
+{
+    std::vector<std::string> numbers;
+    for (const Recipient &recipient : share.recipients)
+        numbers.push_back(recipient.number);
+    PostgresRows rows = db.query("SELECT id, number FROM accounts WHERE number = ANY ($1)"
+                                 " ORDER BY id FOR NO KEY UPDATE",
+                                 numbers);
+    std::map<std::string, std::int64_t> accounts;
+    while (rows.next())
+        accounts[rows.text(1)] = rows.integer(0);
+    return accounts;
+}
+
+std::set<std::int64_t> toldBefore(PostgresConnection &db, std::int64_t share)
+{
+    PostgresRows rows = db.query("SELECT account FROM pushes WHERE share = $1", share);
+    std::set<std::int64_t> accounts;
+    while (rows.next())
+        accounts.insert(rows.integer(0));
+    return accounts;
+}
+
+void addPushes(PostgresConnection &db, std::int64_t share,
+               const std::vector<std::int64_t> &accounts)
+{
+    if (accounts.empty())
+        return;
+    std::vector<std::string> tokens;
+    for (std::size_t count = accounts.size(); count > 0; --count)
+        tokens.push_back(randomToken());
+    db.query("WITH next AS (UPDATE accounts SET last_push = last_push + 1 WHERE id = ANY ($2)"
+             " RETURNING id, last_push)"
+             " INSERT INTO pushes (account, id, share, state, token, token_hash)"
+             " SELECT next.id, next.last_push, $1, 0, t.token,"
+             " sha256(convert_to(t.token, 'UTF8'))"
+             " FROM next JOIN unnest($2, $3) AS t (account, token) ON t.account = next.id",
+             share, accounts, tokens);
+    tellServers(db, "push", accounts);
+}
+
+/// Sorts the share's recipients into those that get a push, which is made, and those of an SMS.
+void tellRecipients(PostgresConnection &db, const ShareRow &share, FinishResult &result)
+{
+    const auto accounts = lockRecipients(db, share.record);
+    std::set<std::int64_t> told = toldBefore(db, share.id);
+    for (const Recipient &recipient : share.record.recipients) {
+        const auto account = accounts.find(recipient.number);
+        std::vector<std::string> &sms = result.sms;
+        if (account != accounts.end()) {
+            if (told.insert(account->second).second)
+                result.pushed.push_back(account->second);
+        } else if (std::find(sms.begin(), sms.end(), recipient.number) == sms.end()) {
+            sms.push_back(recipient.number);
+        }
+    }
+    addPushes(db, share.id, result.pushed);
+}
+
+FinishResult finish(PostgresConnection &db, ShareRow &share, const std::string &linkHash,
+                    Seconds deadline)
+{
+    ShareRecord &record = share.record;
+    const bool first = record.state == ShareState::uploading;
+    if (!first && record.state != ShareState::finished)
+        return {Outcome::gone, std::move(record), {}, {}};
+    for (const FileRecord &file : record.files) {
+        if (!file.complete())
+            return {Outcome::incomplete, std::move(record), {}, {}};
+    }
+    if (first)
+        record.deadline = deadline;
+    record.state = ShareState::finished;
+    db.query("UPDATE shares SET state = $2, deadline = $3, link_hash = $4 WHERE id = $1", share.id,
+             static_cast<int>(record.state), record.deadline, Bytes{linkHash});
+    FinishResult result{Outcome::finished, {}, {}, {}};
+    tellRecipients(db, share, result);
+    result.share = std::move(record);
+    return result;
+}
+
+} // namespace
+
+FinishResult PostgresMetadata::finishShare(std::int64_t account, const std::string &key,
+                                           const std::string &linkHash, Seconds now,
+                                           Seconds deadline)
+{
+    return m_pool->write([&](PostgresConnection &db) -> FinishResult {
+        auto share = findShareRow(db, account, key, now, true);
+        if (!share)
+            return {};
+        addParts(db, *share);
+        return finish(db, *share, linkHash, deadline);
+    });
+}
+
+std::optional<std::vector<Push>> PostgresMetadata::waitingPushes(const std::string &tokenHash,
+                                                                 std::int64_t after, Seconds now)
+{
+    return m_pool->single([&](PostgresConnection &db) -> std::optional<std::vector<Push>> {
+        // A share whose end has come is not waited for the sweeper to be noticed.
+        PostgresRows rows =
+            db.query("SELECT w.id, w.token FROM accounts a LEFT JOIN LATERAL"
+                     " (SELECT p.id, p.token FROM pushes p JOIN shares s ON s.id = p.share"
+                     " WHERE p.account = a.id AND p.state = 0 AND s.deadline > $3"
+                     " AND p.id > CASE WHEN $2 > a.last_push THEN 0 ELSE $2 END"
+                     " ORDER BY p.id LIMIT $4) w ON true WHERE a.token_hash = $1 ORDER BY w.id",
+                     Bytes{tokenHash}, after, now, pushesAtOnce);
+        bool known = false;
+        std::vector<Push> pushes;
+        while (rows.next()) {
+            known = true;
+            if (!rows.isNull(0))
+                pushes.push_back({rows.integer(0), rows.text(1)});
+        }
+        return known ? std::optional(std::move(pushes)) : std::nullopt;
+    });
+}
+
+bool PostgresMetadata::acknowledgePushes(std::int64_t account, std::int64_t upTo)
+{
+    return m_pool->single([&](PostgresConnection &db) {
+        return db
+            .query("WITH known AS (SELECT 1 FROM accounts WHERE id = $1 AND last_push >= $2),"
+                   " done AS (UPDATE pushes SET state = 1, token = NULL WHERE account = $1"
+                   " AND state = 0 AND id <= $2 AND EXISTS (SELECT 1 FROM known))"
+                   " SELECT 1 FROM known",
+                   account, upTo)
+            .next();
+    });
+}
+
+std::optional<ReceivedRecord> PostgresMetadata::findReceived(std::int64_t account,
+                                                             const ReceivedKey &key, Seconds now)
+{
+    return m_pool->read([&](PostgresConnection &db) -> std::optional<ReceivedRecord> {
+        PostgresRows row = db.query("SELECT " PELLIKO_RECEIVED_COLUMNS PELLIKO_RECEIVED_TABLES
+                                    " WHERE p.account = $1 AND (p.id = $2 OR p.token_hash = $3)"
+                                    " AND p.state <> 3",
+                                    account, key.push, Bytes{key.tokenHash});
+        if (!row.next())
+            return std::nullopt;
+        ShareRow share = shareRowOf(row, now);
+        addParts(db, share);
+        return ReceivedRecord{row.integer(6), row.text(5), std::move(share.record)};
+    });
+}
+
+std::vector<ReceivedRecord> PostgresMetadata::listReceived(std::int64_t account, Seconds now)
+{
+    return m_pool->read([&](PostgresConnection &db) {
+        PostgresRows rows = db.query("SELECT " PELLIKO_RECEIVED_COLUMNS PELLIKO_RECEIVED_TABLES
+                                     " WHERE p.account = $1 AND (p.state = 1 OR"
+                                     " (p.state = 0 AND s.deadline > $2)) ORDER BY p.id DESC",
+                                     account, now);
+        std::vector<ReceivedRecord> list;
+        std::vector<ShareRow> shares;
+        while (rows.next()) {
+            shares.push_back(shareRowOf(rows, now));
+            list.push_back({rows.integer(6), rows.text(5), {}});
+        }
+        addParts(db, shares);
+        for (std::size_t index = 0; index < list.size(); ++index)
+            list[index].share = std::move(shares[index].record);
+        return list;
+    });
+}
+
+bool PostgresMetadata::forgetReceived(std::int64_t account, const ReceivedKey &key)
+{
+    return m_pool->single([&](PostgresConnection &db) {
+        return db.query("UPDATE pushes SET state = 3, token = NULL"
+                        " WHERE account = $1 AND (id = $2 OR token_hash = $3)",
+                        account, key.push, Bytes{key.tokenHash})
+                   .changed() == 1;
+    });
+}
+
+} // namespace pelliko::server

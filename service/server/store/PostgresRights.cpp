@@ -1,0 +1,143 @@
+#include "store/PostgresRights.h"
+
+#include "store/PostgresLayout.h"
+
+#include <algorithm>
+#include <utility>
+
+namespace pelliko::server
+{
+namespace
+{
+
+using namespace std::chrono_literals;
+
+/// A holder that was asked lets go as soon as what it has is on the disk. One that does not in this
+/// time is stuck, or died without its machine telling; with what a claim needs beside it a new
+/// writer is at work within five seconds.
+constexpr auto holdersPatience = 3s;
+
+} // namespace
+
+PostgresRights::PostgresRights(PostgresConnection &db) : m_db(db)
+{
+    PostgresRows row = m_db.query("SELECT nextval('writers')");
+    m_number = row.next() ? row.integer(0) : 0;
+}
+
+void PostgresRights::tell(const char *word, std::int64_t id)
+{
+    m_db.query("SELECT pg_notify('" PELLIKO_CHANNEL "', $1)",
+               std::string(word) + " " + std::to_string(id));
+}
+
+bool PostgresRights::tryLock(const std::string &blob, std::int64_t &id)
+{
+    PostgresRows row =
+        m_db.query("SELECT id, pg_try_advisory_lock(id) FROM blobs WHERE key = $1", blob);
+    if (!row.next())
+        return true;
+    id = row.integer(0);
+    return row.integer(1) != 0;
+}
+
+/// The number in the row is what counts: whoever wrote the blob before notes no offset any more.
+void PostgresRights::take(const std::string &blob, std::int64_t id, const Peers::ClaimDone &done)
+{
+    m_db.query("UPDATE blobs SET writer = $2 WHERE id = $1", id, m_number);
+    m_held[blob] = id;
+    m_keys[id] = blob;
+    done({m_number, nullptr});
+}
+
+void PostgresRights::claim(const std::string &blob, Peers::ClaimDone done)
+{
+    std::int64_t id = 0;
+    try {
+        if (tryLock(blob, id)) {
+            take(blob, id, done);
+            return;
+        }
+        tell("stop", id);
+    } catch (const StorageFailure &) {
+        done({0, std::current_exception()});
+        throw;
+    }
+    m_waiting.push_back({blob, id, Clock::now() + holdersPatience, std::move(done)});
+}
+
+void PostgresRights::release(const std::string &blob)
+{
+    const auto held = m_held.find(blob);
+    if (held == m_held.end())
+        return;
+    const std::int64_t id = held->second;
+    m_held.erase(held);
+    m_keys.erase(id);
+    // False for one that was taken from a stuck holder, whose lock it still is.
+    m_db.query("SELECT pg_advisory_unlock($1)", id);
+    if (m_wanted.erase(id) != 0)
+        tell("free", id);
+}
+
+void PostgresRights::freed(std::int64_t id)
+{
+    for (auto at = m_waiting.begin(); at != m_waiting.end();) {
+        const auto each = at++;
+        if (each->id != id)
+            continue;
+        std::int64_t found = id;
+        if (!tryLock(each->blob, found)) {
+            // Somebody else was faster and knows nothing of this one yet.
+            tell("stop", id);
+            each->until = Clock::now() + holdersPatience;
+            m_waiting.splice(m_waiting.end(), m_waiting, each);
+            return;
+        }
+        const Waiting waiting = std::move(*each);
+        m_waiting.erase(each);
+        take(waiting.blob, id, waiting.done);
+    }
+}
+
+std::optional<std::string> PostgresRights::wanted(std::int64_t id)
+{
+    const auto key = m_keys.find(id);
+    if (key == m_keys.end())
+        return std::nullopt;
+    m_wanted.insert(id);
+    return key->second;
+}
+
+std::optional<PostgresRights::Clock::time_point> PostgresRights::nextTakeOver() const
+{
+    if (m_waiting.empty())
+        return std::nullopt;
+    return m_waiting.front().until;
+}
+
+void PostgresRights::takeOver()
+{
+    while (!m_waiting.empty() && m_waiting.front().until <= Clock::now()) {
+        const Waiting waiting = std::move(m_waiting.front());
+        m_waiting.pop_front();
+        try {
+            // Gets the lock of a holder that has died meanwhile; from one that is stuck only the
+            // blob itself.
+            std::int64_t id = waiting.id;
+            tryLock(waiting.blob, id);
+            take(waiting.blob, id, waiting.done);
+        } catch (const StorageFailure &) {
+            waiting.done({0, std::current_exception()});
+            throw;
+        }
+    }
+}
+
+void PostgresRights::fail(const std::exception_ptr &error)
+{
+    for (const Waiting &waiting : std::exchange(m_waiting, {}))
+        waiting.done({0, error});
+}
+
+} // namespace pelliko::server

@@ -1,0 +1,207 @@
+#include "store/PostgresLayout.h"
+#include "store/PostgresMetadata.h"
+#include "store/PostgresRows.h"
+#include "text/Secrets.h"
+
+#include <map>
+#include <utility>
+
+namespace pelliko::server
+{
+namespace
+{
+
+/// What one notification carries at most is 8000 bytes: so many numbers always fit.
+constexpr std::size_t numbersAtOnce = 300;
+
+std::vector<std::int64_t> idsOf(const std::vector<ShareRow> &shares)
+{
+    std::vector<std::int64_t> ids;
+    for (const ShareRow &share : shares)
+        ids.push_back(share.id);
+    return ids;
+}
+
+} // namespace
+
+ShareRow shareRowOf(const PostgresRows &row, Seconds now)
+{
+    ShareRow share;
+    share.id = row.integer(0);
+    share.record.key = row.text(1);
+    share.record.created = row.integer(3);
+    share.record.deadline = row.integer(4);
+    share.stored = static_cast<ShareState>(row.integer(2));
+    share.record.state = stateAt(share.stored, share.record.deadline, now);
+    return share;
+}
+
+void addParts(PostgresConnection &db, std::vector<ShareRow> &shares)
+{
+    if (shares.empty())
+        return;
+    std::map<std::int64_t, ShareRecord *> byId;
+    for (ShareRow &share : shares)
+        byId[share.id] = &share.record;
+    const std::vector<std::int64_t> ids = idsOf(shares);
+    PostgresRows files = db.query("SELECT f.share, f.name, f.type, f.size, coalesce(b.received, 0),"
+                                  " f.upload, coalesce(b.key, '') FROM files f"
+                                  " LEFT JOIN blobs b ON b.id = f.blob"
+                                  " WHERE f.share = ANY ($1) ORDER BY f.share, f.position",
+                                  ids);
+    while (files.next()) {
+        byId.at(files.integer(0))
+            ->files.push_back({files.text(1), files.text(2), files.size(3), files.size(4),
+                               files.text(5), files.text(6)});
+    }
+    PostgresRows recipients = db.query("SELECT share, number, ccc FROM recipients"
+                                       " WHERE share = ANY ($1) ORDER BY share, position",
+                                       ids);
+    while (recipients.next()) {
+        byId.at(recipients.integer(0))
+            ->recipients.push_back({recipients.text(1), recipients.text(2)});
+    }
+}
+
+void addParts(PostgresConnection &db, ShareRow &share)
+{
+    std::vector<ShareRow> one{std::move(share)};
+    addParts(db, one);
+    share = std::move(one.front());
+}
+
+std::optional<ShareRow> findShareRow(PostgresConnection &db, std::int64_t account,
+                                     const std::string &key, Seconds now, bool lock)
+{
+    // Also spares the database what is no text.
+    if (!looksLikeToken(key))
+        return std::nullopt;
+    PostgresRows row = lock ? db.query("SELECT " PELLIKO_SHARE_COLUMNS " FROM shares s"
+                                       " WHERE s.account = $1 AND s.key = $2 FOR NO KEY UPDATE",
+                                       account, key)
+                            : db.query("SELECT " PELLIKO_SHARE_COLUMNS " FROM shares s"
+                                       " WHERE s.account = $1 AND s.key = $2",
+                                       account, key);
+    if (!row.next())
+        return std::nullopt;
+    return shareRowOf(row, now);
+}
+
+ShareRow shareById(PostgresConnection &db, std::int64_t id, Seconds now)
+{
+    PostgresRows row =
+        db.query("SELECT " PELLIKO_SHARE_COLUMNS " FROM shares s WHERE s.id = $1", id);
+    if (!row.next())
+        throw StorageFailure(StorageFailure::Kind::broken, "a share that was made is absent");
+    ShareRow share = shareRowOf(row, now);
+    addParts(db, share);
+    return share;
+}
+
+void tellServers(PostgresConnection &db, const std::string &word,
+                 const std::vector<std::int64_t> &numbers)
+{
+    std::string text = word;
+    std::size_t count = 0;
+    for (const std::int64_t number : numbers) {
+        text += " " + std::to_string(number);
+        if (++count % numbersAtOnce == 0)
+            db.query("SELECT pg_notify('" PELLIKO_CHANNEL "', $1)", std::exchange(text, word));
+    }
+    if (text != word || numbers.empty())
+        db.query("SELECT pg_notify('" PELLIKO_CHANNEL "', $1)", text);
+}
+
+std::vector<std::string> endShare(PostgresConnection &db, ShareRow &share, ShareState state,
+                                  Seconds now)
+{
+    // Of two shares that end at once, each with the other's last file, one has to see the other's
+    // end, and no offset grows while the bytes that came are counted.
+    PostgresRows locked = db.query("SELECT id, key FROM blobs WHERE id IN"
+                                   " (SELECT blob FROM files WHERE share = $1)"
+                                   " ORDER BY id FOR UPDATE",
+                                   share.id);
+    std::vector<std::int64_t> ids;
+    std::vector<std::string> keys;
+    while (locked.next()) {
+        ids.push_back(locked.integer(0));
+        keys.push_back(locked.text(1));
+    }
+    // Bytes that were announced and never came do not count against the account.
+    if (share.stored == ShareState::uploading) {
+        db.query("UPDATE usage SET bytes = (SELECT coalesce(sum(b.received), 0) FROM files f"
+                 " JOIN blobs b ON b.id = f.blob WHERE f.share = $1) WHERE share = $1",
+                 share.id);
+        if (!ids.empty())
+            tellServers(db, "stop", ids);
+    }
+    db.query("UPDATE blobs SET doomed = true WHERE id = ANY ($2)"
+             " AND NOT EXISTS (SELECT 1 FROM files f WHERE f.blob = blobs.id AND f.share <> $1)",
+             share.id, ids);
+    db.query("UPDATE files SET blob = NULL WHERE share = $1", share.id);
+    db.query("UPDATE pushes SET state = $2, token = NULL WHERE share = $1 AND state = 0", share.id,
+             static_cast<int>(PushState::dropped));
+    db.query("UPDATE shares SET state = $2, ended = $3 WHERE id = $1", share.id,
+             static_cast<int>(state), now);
+    return keys;
+}
+
+std::optional<ShareRecord> PostgresMetadata::findShare(std::int64_t account, const std::string &key,
+                                                       Seconds now)
+{
+    return m_pool->read([&](PostgresConnection &db) -> std::optional<ShareRecord> {
+        auto share = findShareRow(db, account, key, now, false);
+        if (!share)
+            return std::nullopt;
+        addParts(db, *share);
+        return std::move(share->record);
+    });
+}
+
+std::vector<ShareRecord> PostgresMetadata::listShares(std::int64_t account, Seconds now)
+{
+    return m_pool->read([&](PostgresConnection &db) {
+        PostgresRows rows = db.query("SELECT " PELLIKO_SHARE_COLUMNS
+                                     " FROM shares s WHERE s.account = $1 ORDER BY s.id DESC",
+                                     account);
+        std::vector<ShareRow> shares;
+        while (rows.next())
+            shares.push_back(shareRowOf(rows, now));
+        addParts(db, shares);
+        std::vector<ShareRecord> records;
+        for (ShareRow &share : shares)
+            records.push_back(std::move(share.record));
+        return records;
+    });
+}
+
+std::optional<std::vector<std::string>>
+PostgresMetadata::withdrawShare(std::int64_t account, const std::string &key, Seconds now)
+{
+    return m_pool->write([&](PostgresConnection &db) -> std::optional<std::vector<std::string>> {
+        auto share = findShareRow(db, account, key, now, true);
+        if (!share)
+            return std::nullopt;
+        const ShareState state = share->record.state;
+        if (state != ShareState::uploading && state != ShareState::finished)
+            return std::vector<std::string>{};
+        return endShare(db, *share, ShareState::withdrawn, now);
+    });
+}
+
+std::optional<LinkRecord> PostgresMetadata::findLink(const std::string &linkHash, Seconds now)
+{
+    return m_pool->read([&](PostgresConnection &db) -> std::optional<LinkRecord> {
+        PostgresRows row = db.query("SELECT " PELLIKO_SHARE_COLUMNS ", a.number FROM shares s"
+                                    " JOIN accounts a ON a.id = s.account WHERE s.link_hash = $1",
+                                    Bytes{linkHash});
+        if (!row.next())
+            return std::nullopt;
+        ShareRow share = shareRowOf(row, now);
+        std::string sender = row.text(5);
+        addParts(db, share);
+        return LinkRecord{std::move(sender), std::move(share.record)};
+    });
+}
+
+} // namespace pelliko::server

@@ -1,0 +1,164 @@
+#include "store/PostgresMetadata.h"
+#include "store/PostgresRows.h"
+#include "text/Secrets.h"
+
+#include <iterator>
+#include <utility>
+
+namespace pelliko::server
+{
+namespace
+{
+
+// The statements below name the live states by number.
+static_assert(static_cast<int>(ShareState::uploading) == 0);
+static_assert(static_cast<int>(ShareState::finished) == 1);
+
+/// Enough for one round of sweeping; the next round takes the rest.
+constexpr int doomedAtOnce = 256;
+constexpr int endedAtOnce = 64;
+
+std::optional<Seconds> secondsOf(PostgresRows row)
+{
+    if (!row.next() || row.isNull(0))
+        return std::nullopt;
+    return row.integer(0);
+}
+
+/// Ends some shares whose deadline has come; their blobs' keys, or nothing when there were none.
+std::optional<std::vector<std::string>> expireSome(PostgresConnection &db, Seconds now)
+{
+    PostgresRows rows = db.query("SELECT " PELLIKO_SHARE_COLUMNS " FROM shares s"
+                                 " WHERE s.state IN (0, 1) AND s.deadline <= $1"
+                                 " ORDER BY s.deadline, s.id LIMIT $2 FOR NO KEY UPDATE",
+                                 now, endedAtOnce);
+    std::optional<std::vector<std::string>> blobs;
+    while (rows.next()) {
+        ShareRow share = shareRowOf(rows, now);
+        if (!blobs)
+            blobs.emplace();
+        for (std::string &blob : endShare(db, share, ShareState::expired, now))
+            blobs->push_back(std::move(blob));
+    }
+    return blobs;
+}
+
+} // namespace
+
+std::optional<UploadRecord> PostgresMetadata::findUpload(std::int64_t account,
+                                                         const std::string &upload, Seconds now)
+{
+    // Also spares the database what is no text.
+    if (!looksLikeToken(upload))
+        return std::nullopt;
+    return m_pool->single([&](PostgresConnection &db) -> std::optional<UploadRecord> {
+        PostgresRows row = db.query(
+            "SELECT " PELLIKO_SHARE_COLUMNS ", f.name, f.type, f.size, coalesce(b.received, 0),"
+            " f.upload, coalesce(b.key, '') FROM files f JOIN shares s ON s.id = f.share"
+            " LEFT JOIN blobs b ON b.id = f.blob WHERE f.upload = $1 AND s.account = $2",
+            upload, account);
+        if (!row.next())
+            return std::nullopt;
+        const ShareRecord share = shareRowOf(row, now).record;
+        return UploadRecord{share.key, share.state, share.deadline,
+                            FileRecord{row.text(5), row.text(6), row.size(7), row.size(8),
+                                       row.text(9), row.text(10)}};
+    });
+}
+
+bool PostgresMetadata::recordOffset(const std::string &blob, std::uint64_t offset,
+                                    std::int64_t right)
+{
+    return m_pool->single([&](PostgresConnection &db) {
+        return db.query("UPDATE blobs SET received = greatest(received, $2)"
+                        " WHERE key = $1 AND NOT doomed AND ($3 = 0 OR writer = $3)",
+                        blob, offset, right)
+                   .changed() == 1;
+    });
+}
+
+bool PostgresMetadata::resetUpload(std::int64_t account, const std::string &upload, Seconds now)
+{
+    return m_pool->write([&](PostgresConnection &db) {
+        PostgresRows row = db.query("SELECT b.id, b.received FROM files f"
+                                    " JOIN shares s ON s.id = f.share JOIN blobs b ON b.id = f.blob"
+                                    " WHERE f.upload = $1 AND s.account = $2 AND s.state = 0"
+                                    " AND s.deadline > $3 FOR NO KEY UPDATE OF s, f, b",
+                                    upload, account, now);
+        if (!row.next())
+            return false;
+        const std::int64_t former = row.integer(0);
+        db.query("WITH made AS (INSERT INTO blobs (key) VALUES ($1) RETURNING id)"
+                 " UPDATE files SET blob = made.id FROM made WHERE upload = $2",
+                 randomToken(), upload);
+        db.query("UPDATE blobs SET doomed = true WHERE id = $1"
+                 " AND NOT EXISTS (SELECT 1 FROM files f WHERE f.blob = blobs.id)",
+                 former);
+        // Dropped bytes were sent all the same: without this, dropping would lift the daily limit.
+        db.query("INSERT INTO usage (account, at, bytes) VALUES ($1, $2, $3)", account, now,
+                 row.size(1));
+        return true;
+    });
+}
+
+std::vector<std::string> PostgresMetadata::expireShares(Seconds now)
+{
+    std::vector<std::string> all;
+    while (true) {
+        auto some = m_pool->write([&](PostgresConnection &db) { return expireSome(db, now); });
+        if (!some)
+            return all;
+        std::move(some->begin(), some->end(), std::back_inserter(all));
+    }
+}
+
+std::optional<Seconds> PostgresMetadata::nextDeadline()
+{
+    return m_pool->single([](PostgresConnection &db) {
+        return secondsOf(db.query("SELECT min(deadline) FROM shares WHERE state IN (0, 1)"));
+    });
+}
+
+void PostgresMetadata::forgetEnded(Seconds ended, Seconds used)
+{
+    m_pool->single([&](PostgresConnection &db) {
+        db.query("DELETE FROM shares WHERE ended <= $1", ended);
+        db.query("DELETE FROM usage WHERE at <= $1", used);
+        db.query("DELETE FROM questions WHERE at <= $1", used);
+    });
+}
+
+std::optional<Seconds> PostgresMetadata::earliestEnd()
+{
+    return m_pool->single([](PostgresConnection &db) {
+        return secondsOf(db.query("SELECT min(ended) FROM shares WHERE ended IS NOT NULL"));
+    });
+}
+
+bool PostgresMetadata::knowsBlob(const std::string &blob)
+{
+    return m_pool->single([&](PostgresConnection &db) {
+        return db.query("SELECT 1 FROM blobs WHERE key = $1", blob).next();
+    });
+}
+
+std::vector<std::string> PostgresMetadata::doomedBlobs()
+{
+    return m_pool->single([](PostgresConnection &db) {
+        std::vector<std::string> keys;
+        PostgresRows rows =
+            db.query("SELECT key FROM blobs WHERE doomed ORDER BY id LIMIT $1", doomedAtOnce);
+        while (rows.next())
+            keys.push_back(rows.text(0));
+        return keys;
+    });
+}
+
+void PostgresMetadata::forgetBlob(const std::string &blob)
+{
+    m_pool->single([&](PostgresConnection &db) {
+        db.query("DELETE FROM blobs WHERE key = $1 AND doomed", blob);
+    });
+}
+
+} // namespace pelliko::server
