@@ -7,8 +7,10 @@ APPLICATION = "com.velmora.pelliko"
 
 def label():
     """The words stand in the application's menu entry, in the user's language."""
-    entry = Gio.DesktopAppInfo.new(APPLICATION + ".desktop")
-    return (entry and entry.get_locale_string("X-Pelliko-Send-Label")) or "Send with Pelliko"
+    try:
+        return Gio.DesktopAppInfo.new(APPLICATION + ".desktop").get_locale_string("X-Pelliko-Send-Label")
+    except TypeError:  # there is no entry
+        return "Send with Pelliko"
 
 
 def open_with_pelliko(_item, addresses):
