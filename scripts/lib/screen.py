@@ -118,7 +118,7 @@ class Drawing:
 
 
 @contextlib.contextmanager
-def _awake():
+def awake():
     """Wakes the loop at the events of programs, and when something is drawn."""
     _listen()
     drawing = Drawing()
@@ -133,15 +133,20 @@ def wait_for_control(label, role=None, limit=LIMIT):
 
     A program may announce a control a moment before it answers for it; what it draws then is looked at too.
     """
-    with _awake():
+    with awake():
         return wait_for(lambda: find(label, role), f"the control “{label}”", limit)
 
 
 def _window_with_keyboard(display):
-    """The class names of the window that gets the keys; none while there is no such one."""
+    """The class names of the window that gets the keys; none while there is no such one. Some toolkits give them to a
+    window of their own inside of it."""
     window = display.get_input_focus().focus
     try:
-        return window.get_wm_class() or () if hasattr(window, "get_wm_class") else ()
+        while hasattr(window, "get_wm_class"):
+            if names := window.get_wm_class():
+                return names
+            window = window.query_tree().parent
+        return ()
     except Xlib.error.BadWindow:  # it went away while it was looked at
         return ()
 
@@ -200,7 +205,7 @@ def text_of(label):
 
 def type_into(label, text):
     """Replaces the text of an entry as a person does: a press into it, all letters removed, others typed."""
-    with _awake():
+    with awake():
         press(label, "entry")
         wait_for(lambda: (_entry(label) or [False])[0], f"the focus of “{label}”")
         run("xdotool", "key", "End", *["BackSpace"] * len(text_of(label)),
