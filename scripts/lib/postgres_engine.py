@@ -87,6 +87,12 @@ class PostgresEngine:
         return ["bwrap", "--dev-bind", "/", "/", "--perms", "0777", "--size", str(self.room), "--tmpfs", small,
                 "--die-with-parent"]
 
+    def small_place(self):
+        """A folder for a tablespace in `small`, made by the server itself since nobody else sees it."""
+        place = self.directory + "/small/place"
+        self.sql(f"COPY (SELECT 1) TO PROGRAM 'mkdir {place}'")
+        return place
+
     def stop(self, how=signal.SIGINT):
         """Ends the server: SIGINT cuts off sessions, SIGQUIT ends it as a crash does."""
         if self.process is None:

@@ -4,6 +4,7 @@
 #include "http/Errors.h"
 #include "push/PushHub.h"
 #include "push/PushJson.h"
+#include "store/StorageFailure.h"
 
 #include <cstdint>
 #include <optional>
@@ -64,17 +65,35 @@ Task<bool> sendWaiting(Exchange &exchange, Context &context, const std::string &
     }
 }
 
+enum class Look { done, tokenEnded, storeAway };
+
+/// A store that cannot be reached for a moment ends no stream: what waits is in it all the same.
+Task<Look> look(Exchange &exchange, Context &context, const std::string &tokenHash,
+                std::int64_t &last)
+{
+    try {
+        const bool valid = co_await sendWaiting(exchange, context, tokenHash, last);
+        co_return valid ? Look::done : Look::tokenEnded;
+    } catch (const StorageFailure &failure) {
+        if (failure.kind() != StorageFailure::Kind::unavailable)
+            throw;
+    }
+    co_return Look::storeAway;
+}
+
 Task<void> serveSeat(Exchange &exchange, Context &context, PushHub::Seat &seat,
                      std::string tokenHash, std::int64_t last)
 {
+    bool lookAgain = false;
     while (true) {
         const PushHub::Wake wake = co_await seat.wait();
         if (wake.ended)
             co_return;
-        if (wake.look) {
-            const bool valid = co_await sendWaiting(exchange, context, tokenHash, last);
-            if (!valid)
+        if (wake.look || lookAgain) {
+            const Look result = co_await look(exchange, context, tokenHash, last);
+            if (result == Look::tokenEnded)
                 co_return;
+            lookAgain = result == Look::storeAway;
         }
         if (wake.beat)
             co_await exchange.write(signOfLife);

@@ -17,6 +17,7 @@
 #include <cstdio>
 #include <deque>
 #include <mutex>
+#include <optional>
 #include <string_view>
 #include <thread>
 #include <utility>
@@ -109,7 +110,9 @@ private:
     void connect();
     void lose(const std::exception_ptr &error);
     void follow(Order &order);
+    std::optional<Order> nextOrder();
     void followOrders();
+    void refuseOrders(const std::exception_ptr &error);
     void hearAll();
     void hear(std::string_view message);
     void lookAtElection();
@@ -132,7 +135,6 @@ private:
     std::unique_ptr<PostgresConnection> m_session;
     std::unique_ptr<PostgresRights> m_rights;
     std::unique_ptr<PostgresConnection> m_election;
-    std::exception_ptr m_failure;
     Clock::time_point m_notBefore{};
     Clock::duration m_backOff{};
     Clock::time_point m_nextClock{};
@@ -159,17 +161,26 @@ void PostgresPeers::Thread::run()
         }
         await();
     }
-    lose(std::make_exception_ptr(
-        PostgresFailure(Kind::unavailable, Remedy::none, "the server is stopping")));
+    const auto stopping = std::make_exception_ptr(
+        PostgresFailure(Kind::unavailable, Remedy::none, "the server is stopping"));
+    refuseOrders(stopping);
+    lose(stopping);
 }
 
 void PostgresPeers::Thread::work()
 {
-    if (!m_session && Clock::now() >= m_notBefore)
-        connect();
+    if (!m_session) {
+        // Whoever claims meanwhile waits for the next attempt.
+        if (Clock::now() < m_notBefore)
+            return;
+        try {
+            connect();
+        } catch (const StorageFailure &) {
+            refuseOrders(std::current_exception());
+            throw;
+        }
+    }
     followOrders();
-    if (!m_session)
-        return;
     if (Clock::now() >= m_nextClock) {
         m_nextClock = Clock::now() + clockRound;
         m_clock->set(*m_session);
@@ -195,7 +206,6 @@ void PostgresPeers::Thread::connect()
     m_election = std::move(election);
     m_nextClock = {};
     m_backOff = {};
-    m_failure = nullptr;
     // What was told meanwhile was told to nobody here.
     m_ears.missed();
 }
@@ -203,7 +213,6 @@ void PostgresPeers::Thread::connect()
 void PostgresPeers::Thread::lose(const std::exception_ptr &error)
 {
     m_sweeps = false;
-    m_failure = error;
     m_backOff = std::clamp<Clock::duration>(2 * m_backOff, firstBackOff, longestBackOff);
     m_notBefore = Clock::now() + m_backOff;
     if (m_rights) {
@@ -215,28 +224,32 @@ void PostgresPeers::Thread::lose(const std::exception_ptr &error)
     m_session.reset();
 }
 
+std::optional<Order> PostgresPeers::Thread::nextOrder()
+{
+    const std::lock_guard lock(m_mutex);
+    if (m_orders.empty())
+        return std::nullopt;
+    std::optional<Order> order(std::move(m_orders.front()));
+    m_orders.pop_front();
+    return order;
+}
+
 void PostgresPeers::Thread::followOrders()
 {
-    while (true) {
-        Order order;
-        {
-            const std::lock_guard lock(m_mutex);
-            if (m_orders.empty())
-                return;
-            order = std::move(m_orders.front());
-            m_orders.pop_front();
-        }
-        follow(order);
+    while (auto order = nextOrder())
+        follow(*order);
+}
+
+void PostgresPeers::Thread::refuseOrders(const std::exception_ptr &error)
+{
+    while (const auto order = nextOrder()) {
+        if (order->kind == Order::Kind::claim)
+            order->done({0, error});
     }
 }
 
 void PostgresPeers::Thread::follow(Order &order)
 {
-    if (!m_rights) {
-        if (order.kind == Order::Kind::claim)
-            order.done({0, m_failure});
-        return;
-    }
     switch (order.kind) {
     case Order::Kind::claim:
         m_rights->claim(order.blob, std::move(order.done));

@@ -34,13 +34,18 @@ class ServerCase(unittest.TestCase):
         self.directory = tempfile.mkdtemp(prefix="pelliko-server-")
         self.addCleanup(shutil.rmtree, self.directory)
         self.data = os.path.join(self.directory, "data")
+        self.stores = ["--data", self.data, *self.other_stores()]
         self.token = self.run_account("add", "--number", NUMBER, "--name", "Anna").strip()
         self.process = None
         self.addCleanup(self.kill)
         self.start()
 
+    def other_stores(self):
+        """Options that say where the server's data are when not all of them in its directory; begins anew."""
+        return []
+
     def run_account(self, command, *arguments, ok=True):
-        done = subprocess.run([PROGRAM, "account", command, "--data", self.data, *arguments],
+        done = subprocess.run([PROGRAM, "account", command, *self.stores, *arguments],
                               capture_output=True, text=True)
         self.assertEqual(done.returncode == 0, ok, done.stderr)
         return done.stdout if ok else done.stderr
@@ -48,7 +53,7 @@ class ServerCase(unittest.TestCase):
     def start(self, *more):
         reading, writing = os.pipe()
         self.process = subprocess.Popen(
-            [*self.wrapper, PROGRAM, "serve", "--data", self.data, "--listen", "127.0.0.1:0", "--ready-fd",
+            [*self.wrapper, PROGRAM, "serve", *self.stores, "--listen", "127.0.0.1:0", "--ready-fd",
              str(writing), *self.options, *more],
             pass_fds=[writing], stderr=subprocess.DEVNULL)
         os.close(writing)

@@ -1,0 +1,125 @@
+"""A database that restarts, refuses, is full, or has another time."""
+
+import json
+import os
+import signal
+import subprocess
+import threading
+import time
+
+from cluster_case import MIB, ClusterCase
+from harness import read_until_closed
+from postgres_engine import BIN
+from push_case import BERTA, Stream
+from watch import DELETED, Watch
+
+
+class Restarts(ClusterCase):
+    options = ["--push-keepalive", "1"]
+
+    def test_a_database_that_is_away_is_said_to_be_and_found_again(self):
+        share, link = self.make_finished(b"12345")
+        self.engine.stop()
+        for answer in [self.request("GET", "/api/v1/account"), self.post_share({}),
+                       self.request("GET", "/api/v1/shares/" + share["share"])]:
+            self.assert_refused(answer, 503, "unavailable")
+            self.assertEqual(answer.headers["Retry-After"], "5")
+        for path in [link, link + "/0", "/healthz"]:
+            self.assertEqual(self.get(path).status, 503)
+        self.engine.start()
+        self.assertEqual(self.when_back("GET", "/api/v1/account").json()["used_bytes"], 5)
+        self.assertEqual(self.get(link + "/0").body, b"12345")
+        self.make_finished(b"abc")
+
+    def test_an_upload_goes_on_after_a_crash_of_the_database(self):
+        content = os.urandom(4 * MIB)
+        share = self.make_share(len(content))
+        upload = share["files"][0]["upload"]
+        connection = self.begin_upload(upload, content, 2 * MIB)
+        told = self.offset(upload)
+        self.engine.restart(signal.SIGQUIT)
+        self.assertRegex(read_until_closed(connection), b"^(HTTP/1.1 (409|503) |$)")
+        self.assertEqual(self.when_back("GET", "/api/v1/account").status, 200)
+        self.assertGreaterEqual(self.offset(upload), told)
+        self.go_on(upload, content)
+        self.assert_content(share, content)
+
+    def test_pushes_reach_streams_that_were_open_before_a_restart(self):
+        berta = self.run_account("add", "--number", BERTA).strip()
+        stream = Stream(self.port, berta)
+        self.addCleanup(stream.close)
+        self.engine.restart()
+        body = json.dumps({"files": [{"name": "a", "size": 0}], "recipients": [{"number": BERTA}]})
+        share = self.when_back("POST", "/api/v1/shares", body, {"Idempotency-Key": "x"}).json()
+        self.finish(share)
+        self.assertEqual(stream.next()[0], 1)
+
+    def test_a_cancelled_statement_leaves_nothing_behind(self):
+        self.make_share(1)
+        with subprocess.Popen([BIN + "/psql", "-XqAt", "-d", self.engine.url()], stdin=subprocess.PIPE,
+                              stdout=subprocess.PIPE, text=True) as session:
+            session.stdin.write("BEGIN; LOCK TABLE usage IN ACCESS EXCLUSIVE MODE; SELECT 'locked';\n")
+            session.stdin.flush()
+            self.assertEqual(session.stdout.readline(), "locked\n")
+            answers = []
+            body = {"files": [{"name": "a", "size": 7}], "recipients": [{"number": BERTA}]}
+            thread = threading.Thread(target=lambda: answers.append(self.post_share(body)))
+            thread.start()
+            self.engine.sql("""DO $$ BEGIN LOOP PERFORM pg_cancel_backend(pid) FROM pg_stat_activity
+                WHERE wait_event_type = 'Lock' AND wait_event = 'relation'; EXIT WHEN FOUND;
+                PERFORM pg_stat_clear_snapshot(), pg_sleep(0.02); END LOOP; END $$""")
+            thread.join()
+        self.assert_refused(answers[0], 503, "unavailable")
+        self.assertEqual(self.engine.sql("SELECT count(*), max(bytes) FROM shares, usage"), "1|1")
+
+
+class FullDatabase(ClusterCase):
+    engine_options = {"room": 6 * MIB}
+
+    def test_a_full_disk_is_said_to_be_full_and_nothing_is_half_made(self):
+        place = self.engine.small_place()
+        self.engine.sql(f"CREATE TABLESPACE small LOCATION '{place}'")
+        self.engine.sql("ALTER TABLE recipients SET TABLESPACE small")
+        body = {"files": [{"name": "a", "size": 1}], "recipients": [{"number": BERTA}] * 100}
+        made, refused = 0, None
+        for size in (1_000_000, 100_000, 8_000):
+            self.fill(size)
+        for _ in range(60):
+            answer = self.post_share(body)
+            if answer.status != 201:
+                refused = answer
+                break
+            made += 1
+        self.assert_refused(refused, 507, "no_space")
+        self.assertEqual(self.engine.sql("SELECT count(*) FROM shares"), str(made))
+        self.assertEqual(self.request("GET", "/api/v1/account").json()["used_bytes"], made)
+        self.engine.sql("DROP TABLE filler; CHECKPOINT")
+        self.assertEqual(self.post_share(body).status, 201)
+
+    def fill(self, size):
+        self.engine.sql("CREATE TABLE IF NOT EXISTS filler (bytes text) TABLESPACE small;"
+                        "ALTER TABLE filler ALTER bytes SET STORAGE PLAIN")
+        statement = f"INSERT INTO filler SELECT repeat('x', 7900) FROM generate_series(1, {max(1, size // 8000)})"
+        while True:
+            try:
+                self.engine.sql(statement)
+            except RuntimeError as error:
+                self.assertIn("No space left", str(error))
+                return
+
+
+class OtherClock(ClusterCase):
+    engine_options = {"clock": 3600}
+    options = ["--share-lifetime", "4"]
+
+    def test_a_share_ends_by_the_databases_clock(self):
+        share, link = self.make_finished(b"12345")
+        (path,) = self.blob_files()
+        self.assertAlmostEqual(share["created"], time.time() + 3600, delta=60)
+        with Watch(os.path.dirname(path), DELETED) as deletion:
+            self.assertEqual(self.get(link + "/0").status, 200)
+            expires = self.request("GET", "/api/v1/shares/" + share["share"]).json()["expires"]
+            deletion.wait()
+        now = float(self.engine.sql("SELECT extract(epoch FROM clock_timestamp())"))
+        self.assertGreaterEqual(now, expires)
+        self.assertEqual(self.get(link + "/0").status, 410)
