@@ -27,6 +27,7 @@ target_link_libraries(PhoneNumber::PhoneNumber INTERFACE "${PHONENUMBER_LIBRARY}
 find_package(nlohmann_json REQUIRED)
 find_package(CLI11 REQUIRED)
 find_package(Boost 1.81 REQUIRED)
+find_package(prometheus-cpp REQUIRED)
 find_program(GDBUS_CODEGEN gdbus-codegen REQUIRED)
 if(PELLIKO_TESTS)
   find_package(GTest REQUIRED)

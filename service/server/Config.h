@@ -4,6 +4,7 @@
 #include "shares/Limits.h"
 #include "store/OpenStores.h"
 
+#include <chrono>
 #include <cstdint>
 #include <string>
 
@@ -17,8 +18,12 @@ struct Config {
     StoreUrls stores;
     /// What links start with; empty for the address that is listened on.
     std::string publicUrl;
+    /// Where monitors ask, in the form of `listen`; empty for nowhere.
+    std::string monitoring;
     Limits limits;
     Timeouts timeouts;
+    /// How long requests in hand may take to end once the server was asked to.
+    std::chrono::seconds drain{10};
     /// Where the line with the server's address goes once it accepts connections; -1 for nowhere.
     int readyFd = -1;
 };

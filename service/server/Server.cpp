@@ -4,6 +4,7 @@
 #include "http/Capacity.h"
 #include "http/Connection.h"
 #include "http/Router.h"
+#include "monitoring/Monitoring.h"
 
 #include <boost/asio/as_tuple.hpp>
 #include <boost/asio/co_spawn.hpp>
@@ -33,8 +34,8 @@ namespace asio = boost::asio;
 using asio::ip::tcp;
 constexpr auto asTuple = asio::as_tuple(asio::use_awaitable);
 
-/// How long a stop waits for requests in hand.
-constexpr std::chrono::seconds stopPatience{10};
+/// What an upload that was ended at a stop gets to note how far it came.
+constexpr std::chrono::seconds lastWords{5};
 /// When the system refuses a connection for want of descriptors or memory.
 constexpr std::chrono::seconds acceptPause{1};
 
@@ -50,25 +51,33 @@ Limits limitsOf(const Config &config, const Capacity &capacity)
 struct Server::State {
     State(const Config &config, Metadata &metadata, Blobs &blobs, std::function<Seconds()> now,
           std::unique_ptr<Peers> others)
-        : timeouts(config.timeouts), peers(std::move(others)), pool(storageThreads), writes(*peers),
+        : timeouts(config.timeouts), drain(config.drain), peers(std::move(others)),
+          pool(storageThreads), writes(*peers),
           pushes(io.get_executor(), limitsOf(config, capacity)),
           context{metadata,      blobs,          *peers,          pool, writes, pushes,
                   config.limits, std::move(now), config.publicUrl},
-          sweeper(io.get_executor(), context), acceptor(io), signals(io, SIGTERM, SIGINT),
-          stopTimer(io), room(io, asio::steady_timer::time_point::max())
+          sweeper(io.get_executor(), context), acceptor(io), monitorAcceptor(io),
+          signals(io, SIGTERM, SIGINT), stopTimer(io),
+          room(io, asio::steady_timer::time_point::max())
     {
+        context.levels = [this] { return levels(); };
     }
 
     [[nodiscard]] Peers::Ears ears();
-    void listen(const ListenAddress &address);
+    std::string listen(tcp::acceptor &on, const ListenAddress &address);
+    [[nodiscard]] Levels levels() const;
     Task<void> acceptAll();
     Task<void> serve(std::shared_ptr<Connection> connection);
+    Task<void> acceptMonitors();
+    Task<void> serveMonitor(std::shared_ptr<Connection> connection);
     Task<void> waitForSignals();
-    Task<void> cutAfterPatience();
+    Task<void> cutAfterDrain();
+    void cutAll();
     void stop();
 
     const Capacity capacity = claimCapacity();
     Timeouts timeouts;
+    std::chrono::seconds drain;
     asio::io_context io{1};
     std::unique_ptr<Peers> peers;
     StoragePool pool;
@@ -77,13 +86,19 @@ struct Server::State {
     Context context;
     Sweeper sweeper;
     tcp::acceptor acceptor;
+    tcp::acceptor monitorAcceptor;
     asio::signal_set signals;
     asio::steady_timer stopTimer;
     /// Cancelled when a connection leaves, for an acceptor that waits for room.
     asio::steady_timer room;
     std::set<std::shared_ptr<Connection>> connections;
+    /// Not waited for at a stop, and answered until it is over.
+    std::set<std::shared_ptr<Connection>> monitors;
     std::string url;
+    std::string monitoringUrl;
     bool stopping = false;
+    /// Somebody does not want to wait for requests in hand.
+    bool hurried = false;
     /// Nothing is waited for any more.
     bool ended = false;
 };
@@ -104,24 +119,28 @@ Peers::Ears Server::State::ears()
     return ears;
 }
 
-void Server::State::listen(const ListenAddress &address)
+/// Returns the address that is listened on.
+std::string Server::State::listen(tcp::acceptor &on, const ListenAddress &address)
 {
     boost::system::error_code error;
     const auto ip = asio::ip::make_address(address.host, error);
     if (error)
         throw std::runtime_error("\"" + address.host + "\" is not an IP address");
     const tcp::endpoint endpoint(ip, address.port);
-    acceptor.open(endpoint.protocol());
-    acceptor.set_option(tcp::acceptor::reuse_address(true));
-    acceptor.bind(endpoint, error);
+    on.open(endpoint.protocol());
+    on.set_option(tcp::acceptor::reuse_address(true));
+    on.bind(endpoint, error);
     if (error)
         throw std::runtime_error("cannot listen on " + address.host + ":" +
                                  std::to_string(address.port) + ": " + error.message());
-    acceptor.listen();
+    on.listen();
     const std::string host = ip.is_v6() ? "[" + address.host + "]" : address.host;
-    url = "http://" + host + ":" + std::to_string(acceptor.local_endpoint().port());
-    if (context.publicUrl.empty())
-        context.publicUrl = url;
+    return "http://" + host + ":" + std::to_string(on.local_endpoint().port());
+}
+
+Levels Server::State::levels() const
+{
+    return {connections.size(), pushes.count(), writes.count(), pool.inHand(), stopping};
 }
 
 Task<void> Server::State::serve(std::shared_ptr<Connection> connection)
@@ -157,6 +176,31 @@ Task<void> Server::State::acceptAll()
     }
 }
 
+Task<void> Server::State::serveMonitor(std::shared_ptr<Connection> connection)
+{
+    monitors.insert(connection);
+    co_await connection->run();
+    monitors.erase(connection);
+}
+
+Task<void> Server::State::acceptMonitors()
+{
+    while (monitorAcceptor.is_open()) {
+        auto [error, socket] = co_await monitorAcceptor.async_accept(asTuple);
+        if (error && monitorAcceptor.is_open()) {
+            asio::steady_timer pause(io, acceptPause);
+            co_await pause.async_wait(asTuple);
+            continue;
+        }
+        if (error)
+            co_return;
+        auto connection = Connection::make(
+            std::move(socket), timeouts, pool,
+            [this](Exchange &exchange) { return handleMonitoring(exchange, context); }, refuseHead);
+        asio::co_spawn(io, serveMonitor(std::move(connection)), asio::detached);
+    }
+}
+
 Task<void> Server::State::waitForSignals()
 {
     auto [error, number] = co_await signals.async_wait(asTuple);
@@ -167,11 +211,14 @@ Task<void> Server::State::waitForSignals()
         co_return;
     // A second signal is a person who does not want to wait.
     auto [again, second] = co_await signals.async_wait(asTuple);
-    if (!again)
-        stopTimer.cancel();
+    if (again)
+        co_return;
+    hurried = true;
+    stopTimer.cancel();
 }
 
-/// Uploads are ended at once, since what arrived is kept; downloads get some time.
+/// Nobody new is taken, and streams end, since they would never end by themselves: whoever had one
+/// comes back, to another server where there is one. Requests in hand go on for a while.
 void Server::State::stop()
 {
     if (std::exchange(stopping, true))
@@ -180,22 +227,35 @@ void Server::State::stop()
     acceptor.close(ignored);
     room.cancel();
     sweeper.stop();
-    writes.stopAll();
     pushes.stop();
     for (const auto &connection : std::set(connections))
         connection->finish();
-    asio::co_spawn(io, cutAfterPatience(), asio::detached);
+    asio::co_spawn(io, cutAfterDrain(), asio::detached);
 }
 
-Task<void> Server::State::cutAfterPatience()
+Task<void> Server::State::cutAfterDrain()
 {
-    stopTimer.expires_after(stopPatience);
-    if (!connections.empty())
+    stopTimer.expires_after(drain);
+    if (!connections.empty() && !hurried)
         co_await stopTimer.async_wait(asTuple);
-    for (const auto &connection : std::set(connections))
-        connection->cut();
+    // An upload that is ended keeps what arrived and goes on later.
+    writes.stopAll();
+    stopTimer.expires_after(lastWords);
+    if (!connections.empty() && !hurried)
+        co_await stopTimer.async_wait(asTuple);
+    cutAll();
     ended = true;
     signals.cancel();
+}
+
+void Server::State::cutAll()
+{
+    boost::system::error_code ignored;
+    monitorAcceptor.close(ignored);
+    for (const auto &connection : std::set(connections))
+        connection->cut();
+    for (const auto &connection : std::set(monitors))
+        connection->cut();
 }
 
 Server::Server(const Config &config, Metadata &metadata, Blobs &blobs, std::function<Seconds()> now,
@@ -203,7 +263,12 @@ Server::Server(const Config &config, Metadata &metadata, Blobs &blobs, std::func
     : m_state(std::make_unique<State>(config, metadata, blobs, std::move(now),
                                       peers ? std::move(peers) : std::make_unique<NoPeers>()))
 {
-    m_state->listen(parseListenAddress(config.listen));
+    m_state->url = m_state->listen(m_state->acceptor, parseListenAddress(config.listen));
+    if (m_state->context.publicUrl.empty())
+        m_state->context.publicUrl = m_state->url;
+    if (!config.monitoring.empty())
+        m_state->monitoringUrl =
+            m_state->listen(m_state->monitorAcceptor, parseListenAddress(config.monitoring));
 }
 
 Server::~Server()
@@ -217,10 +282,16 @@ std::string Server::url() const
     return m_state->url;
 }
 
+std::string Server::monitoringUrl() const
+{
+    return m_state->monitoringUrl;
+}
+
 void Server::run()
 {
     m_state->peers->listen(m_state->ears());
     asio::co_spawn(m_state->io, m_state->acceptAll(), asio::detached);
+    asio::co_spawn(m_state->io, m_state->acceptMonitors(), asio::detached);
     asio::co_spawn(m_state->io, m_state->waitForSignals(), asio::detached);
     asio::co_spawn(m_state->io, m_state->sweeper.run(), asio::detached);
     asio::co_spawn(m_state->io, m_state->pushes.run(), asio::detached);

@@ -29,6 +29,9 @@ public:
     /// "http://host:port", with the port that was picked.
     [[nodiscard]] std::string url() const;
 
+    /// Likewise for what monitors ask; empty when they may not.
+    [[nodiscard]] std::string monitoringUrl() const;
+
     /// Serves until stopped; then lets requests in hand end, for some seconds.
     void run();
 

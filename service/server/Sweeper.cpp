@@ -90,6 +90,7 @@ Task<void> Sweeper::removeStrays()
         }
         return count;
     });
+    m_context.metrics.blobsRemoved(removed);
     if (removed > 0)
         std::fprintf(stderr, "pelliko-server: removed %zu stray blobs\n", removed);
 }
@@ -123,6 +124,7 @@ Task<void> Sweeper::removeDoomed()
                 m_context.blobs.remove(key);
                 m_context.metadata.forgetBlob(key);
             });
+            m_context.metrics.blobsRemoved(1);
         }
     }
 }

@@ -45,13 +45,18 @@ struct ServeOptions {
     long headTimeout = server::Timeouts{}.head.count();
     long idleTimeout = server::Timeouts{}.idle.count();
     long progressTimeout = server::Timeouts{}.progress.count();
+    long drain = server::Config{}.drain.count();
 };
 
 void announce(const server::Server &server, int readyFd)
 {
     std::fprintf(stderr, "pelliko-server: serving at %s\n", server.url().c_str());
+    if (!server.monitoringUrl().empty())
+        std::fprintf(stderr, "pelliko-server: monitored at %s\n", server.monitoringUrl().c_str());
     if (readyFd >= 0) {
         dprintf(readyFd, "%s\n", server.url().c_str());
+        if (!server.monitoringUrl().empty())
+            dprintf(readyFd, "%s\n", server.monitoringUrl().c_str());
         close(readyFd);
     }
     sd_notify(0, "READY=1");
@@ -65,6 +70,7 @@ int serve(const ServeOptions &options)
     config.timeouts.head = std::chrono::seconds(options.headTimeout);
     config.timeouts.idle = std::chrono::seconds(options.idleTimeout);
     config.timeouts.progress = std::chrono::seconds(options.progressTimeout);
+    config.drain = std::chrono::seconds(options.drain);
     server::Stores stores = server::openStores(config.stores, server::Server::storageThreads);
     server::Server running(config, *stores.metadata, *stores.blobs, stores.now,
                            std::move(stores.peers));
@@ -133,8 +139,17 @@ void addServe(CLI::App &app, ServeOptions &options)
                      "Seconds in which a body has to get on")
         ->check(CLI::PositiveNumber)
         ->capture_default_str();
-    command->add_option("--ready-fd", options.config.readyFd,
-                        "Descriptor that gets the server's address once it accepts connections");
+    command
+        ->add_option("--drain", options.drain,
+                     "Seconds that requests in hand get to end once the server is asked to")
+        ->check(CLI::NonNegativeNumber)
+        ->capture_default_str();
+    command->add_option("--monitoring", options.config.monitoring,
+                        "Address and port for /metrics, /readyz and /healthz; nowhere when absent");
+    command->add_option(
+        "--ready-fd", options.config.readyFd,
+        "Descriptor that gets the server's address once it accepts connections, and a "
+        "second line with the monitoring address if there is one");
     // The library reads a file only for the whole program: its [serve] section holds these options.
     app.set_config("--config", "", "File with options of serve, name = value under [serve]");
     app.allow_config_extras(CLI::config_extras_mode::error);

@@ -65,7 +65,7 @@ public:
     Task<void> sendFile(int file, std::uint64_t offset, std::uint64_t length) override;
     Task<void> endStream() override;
     void watchPeer(std::function<void()> gone) override;
-    [[nodiscard]] bool answered() const override { return m_answered; }
+    [[nodiscard]] Traffic traffic() const override { return m_traffic; }
 
 private:
     Task<void> awaitPeer(std::shared_ptr<ConnectionImpl> self);
@@ -89,7 +89,7 @@ private:
     std::function<void()> m_peerGone;
     bool m_idle = false;
     bool m_finishing = false;
-    bool m_answered = false;
+    Traffic m_traffic;
     bool m_keepAlive = true;
     bool m_chunked = false;
 };
@@ -152,7 +152,7 @@ Task<bool> ConnectionImpl::serveOne()
     const bool arrived = co_await waitForRequest();
     if (!arrived || m_finishing)
         co_return false;
-    m_answered = false;
+    m_traffic = {};
     m_chunked = false;
     m_keepAlive = true;
     m_watchdog.arm(m_timeouts.head);
@@ -167,7 +167,7 @@ Task<bool> ConnectionImpl::serveOne()
         co_return false;
     }
     co_await m_handler(*this);
-    if (!m_answered)
+    if (!answered())
         co_return false;
     if (!m_keepAlive) {
         co_await linger();
@@ -203,7 +203,9 @@ Task<std::size_t> ConnectionImpl::readBody(std::span<char> into)
 {
     if (m_reader.peerAwaitsContinue())
         co_await sendAll("HTTP/1.1 100 Continue\r\n\r\n");
-    co_return co_await m_reader.readBody(into);
+    const std::size_t count = co_await m_reader.readBody(into);
+    m_traffic.received += count;
+    co_return count;
 }
 
 /// Where bytes come fast, receiving and storing them on one thread saves two changes of threads for
@@ -220,10 +222,12 @@ Task<std::size_t> ConnectionImpl::takeBody(std::span<char> buffer, std::size_t m
             break;
         auto step = [&] { return m_reader.takeNow(buffer, most, take); };
         taken = co_await m_pool.run(step);
+        m_traffic.received += taken;
     }
     if (taken > 0)
         co_return taken;
     taken = co_await m_reader.readBody(buffer);
+    m_traffic.received += taken;
     auto last = [&] { take({buffer.data(), taken}); };
     if (taken > 0)
         co_await m_pool.run(last);
@@ -239,17 +243,19 @@ bool ConnectionImpl::decideKeepAlive()
 
 Task<void> ConnectionImpl::respond(Response response)
 {
-    m_answered = true;
+    m_traffic.status = response.status;
     std::string bytes = responseHead(response, {decideKeepAlive(), response.body.size(), false},
                                      std::time(nullptr));
-    if (!isHead())
+    if (!isHead()) {
         bytes += response.body;
+        m_traffic.sent += response.body.size();
+    }
     co_await sendAll(bytes);
 }
 
 Task<void> ConnectionImpl::startStream(Response head, std::optional<std::uint64_t> length)
 {
-    m_answered = true;
+    m_traffic.status = head.status;
     m_chunked = !length && m_reader.peerTakesChunks();
     if (!length && !m_chunked)
         m_keepAlive = false;
@@ -261,6 +267,7 @@ Task<void> ConnectionImpl::write(std::string_view bytes)
 {
     if (isHead() || bytes.empty())
         co_return;
+    m_traffic.sent += bytes.size();
     if (!m_chunked) {
         co_await sendAll(bytes);
         co_return;
@@ -339,6 +346,7 @@ Task<void> ConnectionImpl::sendFile(int file, std::uint64_t offset, std::uint64_
         const ssize_t sent = co_await m_pool.run(step);
         if (sent > 0) {
             length -= static_cast<std::uint64_t>(sent);
+            m_traffic.sent += static_cast<std::uint64_t>(sent);
             continue;
         }
         if (sent == 0 || (failure != EAGAIN && failure != EINTR))

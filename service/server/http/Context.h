@@ -2,6 +2,7 @@
 
 #include "accounts/AttemptLimiter.h"
 #include "http/StoragePool.h"
+#include "monitoring/Metrics.h"
 #include "push/PushHub.h"
 #include "shares/Limits.h"
 #include "store/Blobs.h"
@@ -28,6 +29,9 @@ struct Context {
     std::function<Seconds()> now;
     /// What links start with: scheme, host, no slash at the end.
     std::string publicUrl;
+    /// What is true of the server now.
+    std::function<Levels()> levels{};
+    Metrics metrics{};
     AttemptLimiter registrations{limits.registrations, limits.registrationWindow};
 };
 

@@ -38,6 +38,15 @@ public:
 /// Takes a piece of a body, which is gone after the call.
 using BodyTaker = std::function<void(std::string_view piece)>;
 
+/// What went over the wire for one request so far.
+struct Traffic {
+    /// Of the answer; 0 as long as there is none.
+    int status = 0;
+    /// Bytes of the two bodies, without what frames them.
+    std::uint64_t received = 0;
+    std::uint64_t sent = 0;
+};
+
 /// One request and its answer. Used on the network thread only.
 class Exchange
 {
@@ -76,7 +85,8 @@ public:
     virtual void watchPeer(std::function<void()> gone) = 0;
 
     /// True once a head was sent: a refusal can no longer be told.
-    [[nodiscard]] virtual bool answered() const = 0;
+    [[nodiscard]] bool answered() const { return traffic().status != 0; }
+    [[nodiscard]] virtual Traffic traffic() const = 0;
 };
 
 /// Reads a whole body of at most `limit` bytes; more is refused as too large.

@@ -4,6 +4,7 @@
 #include "accounts/Invitations.h"
 #include "accounts/Joined.h"
 #include "http/Errors.h"
+#include "monitoring/Monitoring.h"
 #include "pages/Download.h"
 #include "pages/ErrorPage.h"
 #include "pages/HomePage.h"
@@ -15,6 +16,7 @@
 #include "tus/TusEndpoints.h"
 #include "tus/TusHeaders.h"
 
+#include <chrono>
 #include <cstdio>
 #include <optional>
 #include <string_view>
@@ -52,15 +54,6 @@ void requireGet(const Request &request)
 {
     if (request.method != "GET" && request.method != "HEAD")
         refuseMethod("GET, HEAD");
-}
-
-Task<void> showHealth(Exchange &exchange, Context &context)
-{
-    requireGet(exchange.request());
-    co_await context.pool.run([&] { context.metadata.ping(); });
-    Response response = makeResponse(
-        Status::ok, {{"Content-Type", "text/plain"}, {"Cache-Control", "no-store"}}, "ok\n");
-    co_await exchange.respond(std::move(response));
 }
 
 Task<void> routeShares(Exchange &exchange, Context &context, Parts parts)
@@ -191,6 +184,8 @@ Task<void> route(Exchange &exchange, Context &context)
         co_await routeLinks(exchange, context, Parts(parts.begin() + 1, parts.end()));
     else if (parts.size() == 1 && parts[0] == "healthz")
         co_await showHealth(exchange, context);
+    else if (parts.size() == 1 && parts[0] == "readyz")
+        co_await showReadiness(exchange, context);
     else if (exchange.request().path == "/")
         co_await showHome(exchange);
     else
@@ -210,7 +205,7 @@ Refusal refusalOf(StorageFailure::Kind kind)
     return Refusal(Error::internal);
 }
 
-Refusal refusalOf(const std::exception_ptr &failure)
+Refusal refusalOf(const std::exception_ptr &failure, Metrics &metrics)
 {
     try {
         std::rethrow_exception(failure);
@@ -220,6 +215,7 @@ Refusal refusalOf(const std::exception_ptr &failure)
         throw;
     } catch (const StorageFailure &error) {
         std::fprintf(stderr, "pelliko-server: %s\n", error.what());
+        metrics.storageFailed(error.kind());
         return refusalOf(error.kind());
     } catch (const std::exception &error) {
         std::fprintf(stderr, "pelliko-server: %s\n", error.what());
@@ -227,9 +223,7 @@ Refusal refusalOf(const std::exception_ptr &failure)
     }
 }
 
-} // namespace
-
-Task<void> handleRequest(Exchange &exchange, Context &context)
+Task<void> answer(Exchange &exchange, Context &context)
 {
     std::exception_ptr failure;
     try {
@@ -239,7 +233,7 @@ Task<void> handleRequest(Exchange &exchange, Context &context)
     }
     if (!failure)
         co_return;
-    const Refusal refusal = refusalOf(failure);
+    const Refusal refusal = refusalOf(failure, context.metrics);
     // Half of a body went out: only a cut tells the receiver that it is not whole.
     if (exchange.answered())
         throw Disconnected();
@@ -249,6 +243,39 @@ Task<void> handleRequest(Exchange &exchange, Context &context)
     if (exchange.request().path.rfind("/api/v1/uploads", 0) == 0)
         response.headers.push_back({"Tus-Resumable", tusVersion});
     co_await exchange.respond(std::move(response));
+}
+
+/// Counts a request however it ends.
+class Counted
+{
+public:
+    Counted(const Exchange &exchange, Metrics &metrics)
+        : m_exchange(exchange), m_metrics(metrics), m_endpoint(endpointOf(exchange.request().path))
+    {
+    }
+    ~Counted()
+    {
+        const Traffic traffic = m_exchange.traffic();
+        m_metrics.requestEnded(m_endpoint, traffic.status,
+                               std::chrono::steady_clock::now() - m_start);
+        m_metrics.transferred(traffic.received, traffic.sent);
+    }
+    Counted(const Counted &) = delete;
+    Counted &operator=(const Counted &) = delete;
+
+private:
+    const Exchange &m_exchange;
+    Metrics &m_metrics;
+    Endpoint m_endpoint;
+    std::chrono::steady_clock::time_point m_start = std::chrono::steady_clock::now();
+};
+
+} // namespace
+
+Task<void> handleRequest(Exchange &exchange, Context &context)
+{
+    const Counted counted(exchange, context.metrics);
+    co_await answer(exchange, context);
 }
 
 Response refuseHead(bool tooLarge)

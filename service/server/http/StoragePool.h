@@ -43,6 +43,7 @@ public:
                 error = std::current_exception();
             }
         };
+        const InHand counted(m_inHand);
         co_await onThread(home, task);
         if (error)
             std::rethrow_exception(error);
@@ -50,10 +51,25 @@ public:
             co_return std::move(*result);
     }
 
+    /// Calls that wait or run. Network thread only.
+    [[nodiscard]] std::size_t inHand() const { return m_inHand; }
+
     /// Waits for running work; nothing that was handed over is left half done.
     void join() { m_threads.join(); }
 
 private:
+    class InHand
+    {
+    public:
+        explicit InHand(std::size_t &count) : m_count(count) { ++m_count; }
+        ~InHand() { --m_count; }
+        InHand(const InHand &) = delete;
+        InHand &operator=(const InHand &) = delete;
+
+    private:
+        std::size_t &m_count;
+    };
+
     template <class Executor, class Work> auto onThread(const Executor &home, Work &work)
     {
         auto start = [this, home, &work](auto handler) {
@@ -69,6 +85,7 @@ private:
     }
 
     boost::asio::thread_pool m_threads;
+    std::size_t m_inHand = 0;
 };
 
 } // namespace pelliko::server

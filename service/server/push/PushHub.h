@@ -62,6 +62,8 @@ public:
     /// True when there is no room for another stream.
     [[nodiscard]] bool full() const { return m_count >= m_streams; }
 
+    [[nodiscard]] std::size_t count() const { return m_count; }
+
     /// These accounts' streams have to look.
     void announce(const std::vector<std::int64_t> &accounts);
     /// All streams have to look.

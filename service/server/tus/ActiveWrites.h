@@ -62,6 +62,8 @@ public:
     /// What is being written under this key, or null.
     [[nodiscard]] std::shared_ptr<ActiveWrite> find(const std::string &key) const;
 
+    [[nodiscard]] std::size_t count() const { return m_entries.size(); }
+
     /// Asks the blob's writer, if there is one, to end.
     void stop(const std::string &key);
     void stopAll();

@@ -58,9 +58,10 @@ class ServerCase(unittest.TestCase):
             pass_fds=[writing], stderr=subprocess.DEVNULL)
         os.close(writing)
         with os.fdopen(reading) as ready:
-            self.url = ready.readline().strip()
+            self.url, *monitoring = ready.read().splitlines()
         self.assertRegex(self.url, r"^http://127\.0\.0\.1:\d+$")
         self.port = int(self.url.rsplit(":", 1)[1])
+        self.monitoring_port = int(monitoring[0].rsplit(":", 1)[1]) if monitoring else None
 
     def stop(self):
         self.process.send_signal(signal.SIGTERM)

@@ -130,14 +130,6 @@ class Uploads(ServerCase):
         self.start()
         self.assertGreaterEqual(self.offset(upload), 16 * MIB)
 
-    def test_a_stopped_server_keeps_what_arrived(self):
-        upload = self.make_share(MIB)["files"][0]["upload"]
-        connection = self.begin_upload(upload, bytes(MIB), 1000)
-        self.assertEqual(self.stop(), 0)
-        self.assertIn(b" 409 ", read_until_closed(connection))
-        self.start()
-        self.assertEqual(self.offset(upload), 1000)
-
     def test_a_second_writer_ends_the_first(self):
         share = self.make_share(10)
         upload = share["files"][0]["upload"]
