@@ -1,8 +1,10 @@
 #include "ChangeableUi.h"
+#include "DesktopSettings.h"
 #include "TableReader.h"
 #include "uxt_theme.h"
 
-#include <cstdint>
+#include <array>
+#include <map>
 #include <string>
 #include <vector>
 
@@ -13,6 +15,10 @@ struct ColorClass {
     std::string name;
     int red = 0, green = 0, blue = 0, alpha = 255;
 };
+
+using Palette = std::vector<ColorClass>;
+
+constexpr std::array<const char *, 3> wishes{"", "light", "dark"};
 
 // "#rrggbb" or "#rrggbbaa".
 bool parseColor(const std::string &text, ColorClass &color)
@@ -29,31 +35,66 @@ bool parseColor(const std::string &text, ColorClass &color)
     return true;
 }
 
+// False when one entry has no name or no colour.
+bool readPalette(const std::vector<pelliko::ui::TableEntry> &entries, Palette &palette)
+{
+    for (const auto &entry : entries) {
+        ColorClass color;
+        color.name = entry.get("class");
+        if (color.name.empty() || !parseColor(entry.get("value"), color))
+            return false;
+        palette.push_back(std::move(color));
+    }
+    return true;
+}
+
 } // namespace
 
 struct _Uxt_Color_Table {
-    std::vector<ColorClass> classes;
+    std::map<std::string, Palette> palettes; ///< by what the user may wish for
+    Palette applied = {};                    ///< while in use
 };
 
 namespace
 {
+
 Uxt_Color_Table *inUse = nullptr;
+
+void apply(Uxt_Color_Table &table)
+{
+    const auto wished = table.palettes.find(pelliko::ui::wishedPalette());
+    table.applied = (wished == table.palettes.end() ? table.palettes.begin() : wished)->second;
+    for (const ColorClass &c : table.applied)
+        edje_color_class_set(c.name.c_str(), c.red, c.green, c.blue, c.alpha, 0, 0, 0, 0, 0, 0, 0,
+                             0);
 }
+
+// The one in use follows the user, also while its colours are on the screen.
+void followDesktop()
+{
+    static const bool following = [] {
+        pelliko::ui::watchDesktopSettings([] {
+            if (inUse)
+                apply(*inUse);
+        });
+        return true;
+    }();
+    (void)following;
+}
+
+} // namespace
 
 Uxt_Color_Table *uxt_theme_add_color_table(const char *xml_path)
 {
-    const auto entries = pelliko::ui::readTable(xml_path, "color-table", "color");
-    if (!entries)
+    const auto file = pelliko::ui::readTable(xml_path, "color-table", "color");
+    if (!file)
         return nullptr;
     Uxt_Color_Table table;
-    for (const auto &entry : *entries) {
-        ColorClass color;
-        color.name = entry.get("class");
-        if (color.name.empty() || !parseColor(entry.get("value"), color)) {
-            pelliko::ui::reportTable(xml_path, "a <color> needs class and value=\"#rrggbb[aa]\"");
-            return nullptr;
-        }
-        table.classes.push_back(std::move(color));
+    for (const char *wish : wishes) {
+        if (readPalette(file->of(wish), table.palettes[wish]))
+            continue;
+        pelliko::ui::reportTable(xml_path, "a <color> needs class and value=\"#rrggbb[aa]\"");
+        return nullptr;
     }
     return new Uxt_Color_Table(std::move(table));
 }
@@ -63,9 +104,8 @@ Eina_Bool uxt_theme_set_color_table(Uxt_Color_Table *table)
     if (!table || !pelliko::ui::changeableUiEnabled())
         return EINA_FALSE;
     inUse = table;
-    for (const ColorClass &c : table->classes)
-        edje_color_class_set(c.name.c_str(), c.red, c.green, c.blue, c.alpha, 0, 0, 0, 0, 0, 0, 0,
-                             0);
+    apply(*table);
+    followDesktop();
     return EINA_TRUE;
 }
 
@@ -73,7 +113,7 @@ void uxt_theme_release_color_table(Uxt_Color_Table *table)
 {
     if (table && table == inUse) {
         inUse = nullptr;
-        for (const ColorClass &c : table->classes)
+        for (const ColorClass &c : table->applied)
             edje_color_class_del(c.name.c_str());
     }
     delete table;
@@ -83,7 +123,7 @@ Eina_Bool uxt_theme_get_color(const char *color_class, int *r, int *g, int *b, i
 {
     if (!color_class || !inUse)
         return EINA_FALSE;
-    for (const ColorClass &c : inUse->classes) {
+    for (const ColorClass &c : inUse->applied) {
         if (c.name != color_class)
             continue;
         if (r)

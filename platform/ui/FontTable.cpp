@@ -1,7 +1,9 @@
 #include "ChangeableUi.h"
+#include "DesktopSettings.h"
 #include "TableReader.h"
 #include "uxt_theme.h"
 
+#include <cmath>
 #include <cstdlib>
 #include <string>
 #include <vector>
@@ -25,6 +27,28 @@ namespace
 {
 Uxt_Font_Table *inUse = nullptr;
 bool enabled = false;
+
+void apply(const Uxt_Font_Table &table)
+{
+    const double scale = pelliko::ui::wishedTextScale();
+    for (const FontClass &f : table.classes)
+        edje_text_class_set(f.name.c_str(), f.font.c_str(),
+                            static_cast<Evas_Font_Size>(std::lround(f.size * scale)));
+}
+
+// The one in use follows the user, also while its texts are on the screen.
+void followDesktop()
+{
+    static const bool following = [] {
+        pelliko::ui::watchDesktopSettings([] {
+            if (inUse)
+                apply(*inUse);
+        });
+        return true;
+    }();
+    (void)following;
+}
+
 } // namespace
 
 bool pelliko::ui::changeableUiEnabled()
@@ -39,11 +63,11 @@ void uxt_theme_set_changeable_ui_enabled(Eina_Bool enable)
 
 Uxt_Font_Table *uxt_theme_add_font_table(const char *xml_path)
 {
-    const auto entries = pelliko::ui::readTable(xml_path, "font-table", "font");
-    if (!entries)
+    const auto file = pelliko::ui::readTable(xml_path, "font-table", "font");
+    if (!file)
         return nullptr;
     Uxt_Font_Table table;
-    for (const auto &entry : *entries) {
+    for (const auto &entry : file->of()) {
         const FontClass font{entry.get("class"), entry.get("family"),
                              std::atoi(entry.get("size").c_str())};
         if (font.name.empty() || font.font.empty() || font.size <= 0) {
@@ -60,8 +84,8 @@ Eina_Bool uxt_theme_set_font_table(Uxt_Font_Table *table)
     if (!table || !enabled)
         return EINA_FALSE;
     inUse = table;
-    for (const FontClass &f : table->classes)
-        edje_text_class_set(f.name.c_str(), f.font.c_str(), f.size);
+    apply(*table);
+    followDesktop();
     return EINA_TRUE;
 }
 

@@ -3,6 +3,7 @@
 #include <Eina.h>
 #include <glib.h>
 
+#include <algorithm>
 #include <memory>
 
 namespace pelliko::ui
@@ -13,10 +14,9 @@ namespace
 
 struct Reading {
     std::string root, entry;
-    std::string chosen;  ///< palette that the outermost element asks for
     std::string palette; ///< palette around the current element
     int depth = 0;
-    std::vector<TableEntry> entries;
+    TableFile file;
 };
 
 TableEntry collect(const char **names, const char **values)
@@ -36,12 +36,11 @@ void startElement(GMarkupParseContext *, const char *name, const char **names, c
         if (reading.root != name)
             g_set_error(error, G_MARKUP_ERROR, G_MARKUP_ERROR_UNKNOWN_ELEMENT,
                         "begins with <%s>, not with <%s>", name, reading.root.c_str());
-        reading.chosen = element.get("palette");
+        reading.file.usual = element.get("palette");
     } else if (std::string("palette") == name) {
         reading.palette = element.get("name");
     } else if (reading.entry == name) {
-        if (reading.palette.empty() || reading.palette == reading.chosen)
-            reading.entries.push_back(element);
+        reading.file.entries.push_back({reading.palette, element});
     } else {
         g_set_error(error, G_MARKUP_ERROR, G_MARKUP_ERROR_UNKNOWN_ELEMENT, "has an unknown <%s>",
                     name);
@@ -74,15 +73,29 @@ void reportTable(const char *path, const std::string &reason)
     EINA_LOG_ERR("table %s: %s", path ? path : "(null)", reason.c_str());
 }
 
-std::optional<std::vector<TableEntry>> readTable(const char *path, const std::string &root,
-                                                 const std::string &entry)
+std::vector<TableEntry> TableFile::of(const std::string &palette) const
+{
+    const bool known = !palette.empty() &&
+                       std::any_of(entries.begin(), entries.end(), [&palette](const Entry &entry) {
+                           return entry.palette == palette;
+                       });
+    const std::string &chosen = known ? palette : usual;
+    std::vector<TableEntry> found;
+    for (const Entry &entry : entries)
+        if (entry.palette.empty() || entry.palette == chosen)
+            found.push_back(entry.attributes);
+    return found;
+}
+
+std::optional<TableFile> readTable(const char *path, const std::string &root,
+                                   const std::string &entry)
 {
     if (!path)
         return std::nullopt;
     GError *error = nullptr;
     char *raw = nullptr;
     gsize length = 0;
-    Reading reading{root, entry, {}, {}, 0, {}};
+    Reading reading{root, entry, {}, 0, {}};
     const Context context(
         g_markup_parse_context_new(&parser, GMarkupParseFlags{}, &reading, nullptr),
         g_markup_parse_context_unref);
@@ -91,7 +104,7 @@ std::optional<std::vector<TableEntry>> readTable(const char *path, const std::st
     if (read &&
         g_markup_parse_context_parse(context.get(), raw, static_cast<gssize>(length), &error) &&
         g_markup_parse_context_end_parse(context.get(), &error))
-        return std::move(reading.entries);
+        return std::move(reading.file);
     reportTable(path, error ? error->message : "cannot be read");
     g_clear_error(&error);
     return std::nullopt;

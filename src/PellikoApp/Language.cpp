@@ -6,12 +6,15 @@
 #include "PellikoUploadDataManager/PopupLanguage.h"
 
 #include <Elementary.h>
+#include <algorithm>
 #include <app_common.h>
+#include <array>
 #include <clocale>
 #include <cstdlib>
 #include <cstring>
 #include <libintl.h>
 #include <string>
+#include <string_view>
 #include <vconf-keys.h>
 #include <vconf.h>
 
@@ -72,6 +75,15 @@ void _translateWithoutLocale(const char *dir, const std::string &language)
     _bindCatalogue(domain, dir);
 }
 
+// Written from right to left, by the two letters that a locale begins with.
+bool _isRightToLeft(const std::string &language)
+{
+    constexpr std::array<std::string_view, 7> languages{"ar", "fa", "he", "iw", "ps", "ur", "yi"};
+    const std::string_view begin =
+        std::string_view(language).substr(0, language.find_first_of("_.@"));
+    return std::find(languages.begin(), languages.end(), begin) != languages.end();
+}
+
 } // namespace
 
 void _langChanged(app_event_info_h, void *data)
@@ -84,6 +96,8 @@ void _langChanged(app_event_info_h, void *data)
     _initI18n(domain, dir.c_str(), language.c_str());
     _translateWithoutLocale(dir.c_str(), language);
     elm_language_set(language.c_str());
+    // The toolkit would ask its own catalogue, which knows only installed locales.
+    elm_config_mirrored_set(_isRightToLeft(language));
     if (ad && ad->popup)
         updatePopupLanguage(ad);
 }

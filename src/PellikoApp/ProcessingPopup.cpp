@@ -1,6 +1,7 @@
 #include "PellikoApp/ProcessingPopup.h"
 
 #include "PellikoApp/AppData.h"
+#include "PellikoApp/PopupFrame.h"
 #include "PellikoApp/ThemeLayout.h"
 #include "PellikoApp/Window.h"
 
@@ -37,6 +38,7 @@ void openProcessingPopup(PellikoAppData *ad, Evas_Smart_Cb back)
     keepWhileAlive(&ad->processing_popup, popup);
     elm_object_theme_set(popup, ad->theme);
     elm_object_style_set(popup, style);
+    fitPopupScale(ad, popup);
     elm_popup_align_set(popup, ELM_NOTIFY_ALIGN_FILL, 1.0);
     evas_object_size_hint_weight_set(popup, EVAS_HINT_EXPAND, EVAS_HINT_EXPAND);
     ea_object_event_callback_add(popup, EA_CALLBACK_BACK, back, ad);

@@ -13,12 +13,6 @@ namespace pelliko
 namespace
 {
 
-std::string _themeFile()
-{
-    const CText resources(app_get_resource_path());
-    return std::string(resources ? resources.get() : "") + "/edje/pelliko.edj";
-}
-
 void _clearField(void *data, Evas *, Evas_Object *object, void *)
 {
     auto **field = static_cast<Evas_Object **>(data);
@@ -27,6 +21,12 @@ void _clearField(void *data, Evas *, Evas_Object *object, void *)
 }
 
 } // namespace
+
+std::string themeFile()
+{
+    const CText resources(app_get_resource_path());
+    return std::string(resources ? resources.get() : "") + "/edje/pelliko.edj";
+}
 
 Evas_Object *addThemeLayout(Evas_Object *parent, Elm_Theme *theme, const char *group)
 {
@@ -40,7 +40,7 @@ Evas_Object *addThemeLayout(Evas_Object *parent, Elm_Theme *theme, const char *g
 
 void setThemeGroup(Evas_Object *layout, const char *group)
 {
-    const std::string file = _themeFile();
+    const std::string file = themeFile();
     if (!elm_layout_file_set(layout, file.c_str(), group))
         LOG_ERROR("elm_layout_file_set failed for %s", group);
 }

@@ -3,11 +3,15 @@
 #pragma once
 
 #include <Evas.h>
+#include <string>
 
 typedef struct _Elm_Theme Elm_Theme;
 
 namespace pelliko
 {
+
+/// The path of "edje/pelliko.edj" in the application's resources.
+std::string themeFile();
 
 /// A new layout of a group of "edje/pelliko.edj" in the application's resources. A missing group or
 /// file is logged and leaves the layout empty.

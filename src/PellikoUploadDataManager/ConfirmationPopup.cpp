@@ -2,6 +2,7 @@
 
 #include "AppLog/AppLog.h"
 #include "PellikoApp/AppData.h"
+#include "PellikoApp/PopupFrame.h"
 #include "PellikoApp/TextFormat.h"
 #include "PellikoApp/ThemeLayout.h"
 #include "PellikoApp/Window.h"
@@ -172,6 +173,7 @@ Evas_Object *_addPopup(PellikoAppData *ad)
         return nullptr;
     elm_object_theme_set(popup, ad->theme);
     elm_object_style_set(popup, popupStyle);
+    fitPopupScale(ad, popup);
     ea_object_event_callback_add(popup, EA_CALLBACK_BACK, _uploadConfirmViewBackBtnCb, ad);
     elm_popup_align_set(popup, ELM_NOTIFY_ALIGN_FILL, 1.0);
     evas_object_size_hint_weight_set(popup, EVAS_HINT_EXPAND, EVAS_HINT_EXPAND);
@@ -271,7 +273,7 @@ void _createPopupView(PellikoAppData *ad)
     }
     _addLayout(ad);
     _addContentsToPopup(ad, ad->popup_layout);
-    elm_object_content_set(ad->popup, ad->popup_layout);
+    putPopupContent(ad, ad->popup, ad->popup_layout);
     if (!_needsNoConfirmation(ad)) {
         _showPopup(ad);
         return;

@@ -3,6 +3,7 @@
 #include "AppLog/AppLog.h"
 #include "PellikoApp/AppData.h"
 #include "PellikoApp/ThemeLayout.h"
+#include "PellikoUploadDataManager/Initials.h"
 
 #include <Elementary.h>
 #include <cmath>
@@ -33,14 +34,40 @@ void _tint(Evas_Object *image, const char *color_class)
     evas_object_color_set(image, r, g, b, a);
 }
 
+// A damaged file may begin well: only its pixels tell.
+bool _hasPixels(const Evas_Object *image)
+{
+    Evas_Object *shown = elm_image_object_get(image);
+    void *pixels = shown ? evas_object_image_data_get(shown, EINA_FALSE) : nullptr;
+    if (!pixels)
+        return false;
+    evas_object_image_data_set(shown, pixels);
+    return evas_object_image_load_error_get(shown) == EVAS_LOAD_ERROR_NONE;
+}
+
+// The toolkit would take what it could read of the file for all of it when it is asked the next
+// time.
+void _forget(Evas_Object *image)
+{
+    if (Evas_Object *shown = elm_image_object_get(image))
+        evas_object_image_file_set(shown, nullptr, nullptr);
+    evas_image_cache_flush(evas_object_evas_get(image));
+    evas_object_del(image);
+}
+
+// Null when the file cannot be shown: the theme has its own drawing for its place.
+Evas_Object *_withFile(Evas_Object *image, const char *file)
+{
+    if (elm_image_file_set(image, file, nullptr) && _hasPixels(image))
+        return image;
+    LOG_ERROR("the picture %s cannot be shown", file);
+    _forget(image);
+    return nullptr;
+}
+
 Evas_Object *_addImage(Evas_Object *parent, const char *file)
 {
-    Evas_Object *image = elm_image_add(parent);
-    if (!elm_image_file_set(image, file, nullptr)) {
-        evas_object_del(image);
-        return nullptr;
-    }
-    return image;
+    return _withFile(elm_image_add(parent), file);
 }
 
 // The person's picture, or null when there is none that can be read.
@@ -64,30 +91,50 @@ Evas_Object *_addDefaultImage(Evas_Object *item)
     return image;
 }
 
+void _tell(Evas_Object *item, const std::string &signal)
+{
+    elm_object_signal_emit(item, ("pelliko," + signal).c_str(), "pelliko");
+}
+
+// The theme lays them over the default picture.
+void _showInitials(Evas_Object *item, const char *name)
+{
+    const std::string initials = initialsOf(name);
+    if (initials.empty())
+        return;
+    edje_object_part_text_set(elm_layout_edje_get(item), "initials", initials.c_str());
+    _tell(item, "initials," + std::to_string(initialsGround(name)));
+}
+
 void _setPicture(Evas_Object *item, const RowPerson &person)
 {
     Evas_Object *image = _addPersonImage(item, person.image_path);
-    if (!image)
+    if (!image) {
         image = _addDefaultImage(item);
+        _showInitials(item, person.name);
+    }
     if (image)
         elm_object_part_content_set(item, "elm.swallow.icon", image);
+    else
+        _tell(item, "picture,missing");
 }
 
 void _setBadge(Evas_Object *item)
 {
     LOG_DEBUG("Setting SMS badge.");
-    Evas_Object *badge = elm_icon_add(item);
-    if (!elm_image_file_set(badge, smsBadge, nullptr)) {
-        evas_object_del(badge);
+    Evas_Object *badge = _withFile(elm_icon_add(item), smsBadge);
+    if (!badge) {
+        _tell(item, "badge,missing");
         return;
     }
     _tint(badge, "AO004");
-    const double scale = elm_config_scale_get() / elm_app_base_scale_get();
+    const double scale =
+        edje_object_scale_get(elm_layout_edje_get(item)) / elm_app_base_scale_get();
     const int size = static_cast<int>(std::lround(badgeSize * scale));
     evas_object_size_hint_min_set(badge, size, size);
     evas_object_size_hint_max_set(badge, size, size);
     elm_object_part_content_set(item, "sms.badge", badge);
-    elm_object_signal_emit(item, "pelliko,badge,shown", "pelliko");
+    _tell(item, "badge,shown");
 }
 
 Evas_Object *_addPerson(Evas_Object *box, PellikoAppData *ad, const RowPerson &person)

@@ -2,6 +2,7 @@
 
 #include "AppLog/AppLog.h"
 #include "PellikoApp/AppData.h"
+#include "PellikoApp/PopupFrame.h"
 #include "PellikoApp/Window.h"
 #include "PellikoUploadManager/ExitPolicy.h"
 
@@ -59,6 +60,7 @@ void createShareFailPopup(PellikoAppData *ad)
     elm_object_theme_set(popup, ad->theme);
     evas_object_name_set(popup, objectName);
     elm_object_style_set(popup, style);
+    fitPopupScale(ad, popup);
     elm_popup_align_set(popup, ELM_NOTIFY_ALIGN_FILL, 1.0);
     elm_object_domain_translatable_part_text_set(popup, "title,text", domain,
                                                  "IDS_RSH_HEADER_SHARING_FAILED_ABB");

@@ -1,7 +1,10 @@
 #include "uxt_button.h"
 #include "uxt_theme.h"
 
+#include <cstdlib>
 #include <fstream>
+#include <functional>
+#include <gio/gio.h>
 #include <gtest/gtest.h>
 #include <string>
 
@@ -11,7 +14,11 @@ namespace
 class Tables : public ::testing::Test
 {
 protected:
-    static void SetUpTestSuite() { elm_init(0, nullptr); }
+    static void SetUpTestSuite()
+    {
+        setenv("GSETTINGS_BACKEND", "keyfile", 1); // once for the process
+        elm_init(0, nullptr);
+    }
     Tables() { uxt_theme_set_changeable_ui_enabled(EINA_TRUE); }
 
     static std::string file(const std::string &text)
@@ -66,6 +73,71 @@ TEST_F(Tables, SetColorsDriveTheLayouts)
     uxt_theme_release_color_table(table);
     EXPECT_EQ(colorOf("X"), "unknown");
     EXPECT_NE(drawnColor("X"), "16,32,48,255");
+}
+
+// Another program changes what the user wants, as a desktop's settings do.
+class Wishes : public Tables
+{
+protected:
+    static void set(const std::string &key, const std::string &value)
+    {
+        EXPECT_EQ(
+            system(("gsettings set org.gnome.desktop.interface " + key + " " + value).c_str()), 0);
+    }
+
+    static bool waitUntil(const std::function<bool()> &condition)
+    {
+        bool late = false;
+        const guint limit = g_timeout_add_seconds(
+            20,
+            [](void *data) -> gboolean {
+                *static_cast<bool *>(data) = true;
+                return G_SOURCE_CONTINUE;
+            },
+            &late);
+        while (!condition() && !late)
+            g_main_context_iteration(nullptr, TRUE);
+        g_source_remove(limit);
+        return !late;
+    }
+};
+
+TEST_F(Wishes, ForDarkOrLightChooseThePalette)
+{
+    Uxt_Color_Table *table = colors(
+        "<color-table palette='light'><palette name='light'><color class='X' value='#ffffff'/>"
+        "</palette><palette name='dark'><color class='X' "
+        "value='#102030'/></palette></color-table>");
+    EXPECT_TRUE(uxt_theme_set_color_table(table));
+    EXPECT_EQ(colorOf("X"), "255,255,255,255");
+    set("color-scheme", "prefer-dark");
+    EXPECT_TRUE(waitUntil([] { return colorOf("X") == "16,32,48,255"; }));
+    EXPECT_EQ(drawnColor("X"), "16,32,48,255");
+    setenv("PELLIKO_COLOR_SCHEME", "light", 1);
+    EXPECT_TRUE(uxt_theme_set_color_table(table));
+    unsetenv("PELLIKO_COLOR_SCHEME");
+    EXPECT_EQ(colorOf("X"), "255,255,255,255");
+    set("color-scheme", "default");
+    uxt_theme_release_color_table(table);
+}
+
+TEST_F(Wishes, ForLargerTextsEnlargeTheFonts)
+{
+    Uxt_Font_Table *table =
+        fonts("<font-table><font class='F' family='Sans' size='20'/></font-table>");
+    EXPECT_TRUE(uxt_theme_set_font_table(table));
+    const auto sizeOf = [] {
+        const char *font = nullptr;
+        Evas_Font_Size size = 0;
+        edje_text_class_get("F", &font, &size);
+        return size;
+    };
+    EXPECT_EQ(sizeOf(), 20);
+    set("text-scaling-factor", "1.25");
+    EXPECT_TRUE(waitUntil([&] { return sizeOf() == 25; }));
+    set("text-scaling-factor", "1.0");
+    EXPECT_TRUE(waitUntil([&] { return sizeOf() == 20; }));
+    uxt_theme_release_font_table(table);
 }
 
 TEST_F(Tables, SetFontsDriveTheLayouts)

@@ -68,7 +68,7 @@ TEST_F(ConfirmationPopup, NoRecipientGetsTheLayoutForSeveral)
     share(1, 1500, {});
     openPopup();
     EXPECT_THAT(log.messages(), Contains("Setting confirmation_popup_share_view_multiple"));
-    EXPECT_EQ(layoutText("elm.swallow.label.text"), "(null)");
+    EXPECT_EQ(layoutText("elm.swallow.label.text"), "");
 }
 
 TEST_F(ConfirmationPopup, ReshareAsksTheServiceForTheFilesAndShowsWhateverTheirSize)

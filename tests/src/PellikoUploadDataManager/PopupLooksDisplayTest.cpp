@@ -1,315 +1,148 @@
-// How the popup looks on the screen that it gets: run on several sizes of screens.
-#include "PellikoUploadDataManager/ConfirmationPopup.h"
-
-#include "PellikoApp/ContactVcard.h"
-#include "PellikoUploadingDataManager/PressedNotification.h"
-#include "support/PopupScene.h"
+// How the popups look on the screen that they get: run on several sizes of screens.
+#include "PellikoUploadDataManager/PopupLooksScene.h"
 
 #include <algorithm>
-#include <cstdlib>
-#include <cstring>
-#include <vector>
+#include <sstream>
 
-namespace pelliko
+namespace pelliko::test
 {
 namespace
 {
 
-constexpr const char *longName = "Maximiliana von Hohenstein-Wernigerode";
-
-// One with long words; scripts/look-at-languages asks for each of the others.
-const char *anotherLanguage()
+// What a person wants to look at, from the environment; without a wish the hardest of each.
+std::vector<std::string> wished(const char *variable, const char *otherwise)
 {
-    const char *asked = getenv("PELLIKO_LOOKS_LANGUAGE");
-    return asked ? asked : "de_DE.UTF-8";
+    const char *asked = getenv(variable);
+    std::istringstream words(asked ? asked : otherwise);
+    std::vector<std::string> found;
+    for (std::string word; words >> word;)
+        found.push_back(word);
+    return found;
 }
 
-// "de_DE" as a part of a picture's name.
-std::string languageMark()
-{
-    const std::string language = anotherLanguage();
-    return language.substr(0, language.find('.'));
-}
-
-// Twice: once in the usual size of texts, once in the largest.
-class PopupLooks : public test::PopupScene, public ::testing::WithParamInterface<double>
+class EveryPopup : public PopupLooks
 {
 protected:
-    PopupLooks()
+    void lookAtAll(const std::string &language, double scale, double letters)
     {
-        elm_config_scale_set(usualScale() * GetParam());
-        const Box window = boxOf(ad->win);
-        size = std::to_string(window.width) + "x" + std::to_string(window.height) +
-               (GetParam() > 1 ? "-large" : "");
-    }
-    // The highest card in the largest texts needs this much.
-    void SetUp() override
-    {
-        if (GetParam() > 1 && boxOf(ad->win).height < 640)
-            GTEST_SKIP() << "a screen this low has the usual size of texts";
-    }
-
-    ~PopupLooks() override
-    {
-        elm_config_scale_set(firstScale);
-        if (ad->popup)
-            evas_object_del(ad->popup);
+        elm_config_scale_set(scale);
+        speak((language + ".UTF-8").c_str());
+        for (const Variant &variant : variants()) {
+            variant.open();
+            layOut();
+            std::ostringstream what;
+            what << size << " scale " << scale << " letters " << letters << " " << language << " "
+                 << variant.name;
+            expectNothingCut(what.str());
+            keepPictureOf(variant, language, scale, letters);
+            closePopups();
+        }
     }
 
-    // Screens of more pixels have smaller ones.
-    double usualScale() const
+    void keepPictureOf(const Variant &variant, const std::string &language, double scale,
+                       double letters)
     {
-        const Box window = boxOf(ad->win);
-        return window.width == 720 ? firstScale * 1.5 : firstScale;
+        if (!getenv("PELLIKO_KEEP_PICTURES"))
+            return;
+        settle(ad->popup ? button("button1") : ad->win);
+        std::ostringstream name;
+        name << "looks-" << size << "-" << scale << "-" << letters << "-" << language << "-"
+             << variant.name;
+        photograph(name.str());
     }
-
-    void open(const std::string &name)
-    {
-        _createPopupView(ad);
-        picture = "looks-" + name + "-" + size;
-        ASSERT_TRUE(settle({button("button2"), ad->popup_layout}));
-    }
-
-    static const Evas_Object *part(const Evas_Object *widget, const char *name)
-    {
-        return edje_object_part_object_get(elm_layout_edje_get(widget), name);
-    }
-
-    // The toolkit keeps the popup's title in a layout that it does not hand out.
-    static const Evas_Object *titleIn(const Evas_Object *object)
-    {
-        const Evas_Object *found = nullptr;
-        if (!strcmp(evas_object_type_get(object), "edje"))
-            found = edje_object_part_object_get(object, "elm.text.title");
-        if (found && strcmp(evas_object_type_get(found), "textblock") != 0)
-            found = nullptr; // that of the window's frame
-        Eina_List *members = evas_object_smart_members_get(object);
-        for (const Eina_List *node = members; node && !found; node = eina_list_next(node))
-            found = titleIn(static_cast<const Evas_Object *>(eina_list_data_get(node)));
-        eina_list_free(members);
-        return found;
-    }
-
-    const Evas_Object *title() const
-    {
-        const Evas_Object *found = nullptr;
-        for (const Evas_Object *object = evas_object_bottom_get(evas_object_evas_get(ad->win));
-             object && !found; object = evas_object_above_get(object))
-            found = titleIn(object);
-        return found;
-    }
-
-    // Width of a line of text in the font that the part has, were it not cut.
-    static int naturalWidth(const Evas_Object *text)
-    {
-        const char *font = nullptr;
-        Evas_Font_Size points = 0;
-        evas_object_text_font_get(text, &font, &points);
-        Evas_Object *probe = evas_object_text_add(evas_object_evas_get(text));
-        evas_object_scale_set(probe, evas_object_scale_get(text));
-        evas_object_text_font_set(probe, font, points);
-        evas_object_text_text_set(probe, evas_object_text_text_get(text));
-        const int width = boxOf(probe).width;
-        evas_object_del(probe);
-        return width;
-    }
-
-    void expectWholeLine(const Evas_Object *widget, const char *name) const
-    {
-        const Evas_Object *text = part(widget, name);
-        ASSERT_NE(text, nullptr) << name;
-        EXPECT_GT(naturalWidth(text), 0) << name;
-        EXPECT_LE(naturalWidth(text), roomFor(widget)) << evas_object_text_text_get(text);
-        expectInside(text, name);
-    }
-
-    static int roomFor(const Evas_Object *widget) { return boxOf(widget).width; }
-
-    void expectWholeBlock(const Evas_Object *text, const char *name) const
-    {
-        ASSERT_NE(text, nullptr) << name;
-        int height = 0;
-        evas_object_textblock_size_formatted_get(text, nullptr, &height);
-        EXPECT_GT(height, 0) << name;
-        EXPECT_LE(height, boxOf(text).height + 1) << name;
-        expectInside(text, name);
-    }
-
-    // One line that is cut where it has no room.
-    void expectWholeTitle() const
-    {
-        expectWholeBlock(title(), "title");
-        int width = 0;
-        evas_object_textblock_size_native_get(title(), &width, nullptr);
-        EXPECT_LE(width, boxOf(title()).width) << "title";
-    }
-
-    void expectInside(const Evas_Object *object, const std::string &name) const
-    {
-        const Box card = boxOf(ad->win), box = boxOf(object);
-        EXPECT_GE(box.x, card.x) << name;
-        EXPECT_GE(box.y, card.y) << name;
-        EXPECT_LE(box.x + box.width, card.width) << name;
-        EXPECT_LE(box.y + box.height, card.height) << name;
-    }
-
-    void expectNothingClipped() const
-    {
-        expectWholeTitle();
-        expectWholeBlock(
-            part(elm_object_part_content_get(ad->popup_layout, "elm.swallow.box"), "elm.text"),
-            "body");
-        expectWholeLine(ad->popup_layout, "elm.text");
-        expectWholeLine(button("button1"), "elm.text");
-        expectWholeLine(button("button2"), "elm.text");
-        if (eina_list_count(ad->upload_item->recipient_list) == 1)
-            expectWholeBlock(part(ad->popup_layout, "elm.text.info"), "summary");
-        else
-            expectWholeLine(ad->popup_layout, "elm.swallow.label.text");
-    }
-
-    // The items in the row of recipients.
-    std::vector<Evas_Object *> items() const
-    {
-        Evas_Object *row = elm_object_part_content_get(ad->popup_layout, "elm.swallow.scroller");
-        Evas_Object *scroller = elm_object_part_content_get(row, "elm.swallow.content");
-        Eina_List *children = elm_box_children_get(elm_object_content_get(scroller));
-        std::vector<Evas_Object *> found;
-        for (const Eina_List *node = children; node; node = eina_list_next(node))
-            found.push_back(static_cast<Evas_Object *>(eina_list_data_get(node)));
-        eina_list_free(children);
-        return found;
-    }
-
-    std::string size;
-    static inline const double firstScale = 1.0;
 };
 
-TEST_P(PopupLooks, CardIsAsWideAsAPhoneButNotAsADesk)
+TEST_F(EveryPopup, IsWholeInEveryLanguageAndSize)
+{
+    if (!getenv("PELLIKO_KEEP_PICTURES"))
+        ecore_evas_manual_render_set(ecore_evas_ecore_evas_get(evas_object_evas_get(ad->win)),
+                                     EINA_TRUE);
+    DesktopWish wish;
+    for (const std::string &letters : wished("PELLIKO_LOOKS_LETTERS", "1.3")) {
+        enlargeTexts(wish, std::stod(letters));
+        for (const std::string &scale : wished("PELLIKO_LOOKS_SCALES", "2.5"))
+            for (const std::string &language : wished("PELLIKO_LOOKS_LANGUAGES", "de ar hi"))
+                lookAtAll(language, std::stod(scale), std::stod(letters));
+    }
+}
+
+TEST_F(PopupLooks, CardIsAsWideAsAPhoneButNotAsADesk)
 {
     share(1, 1500, {{"Anna Müller", true}});
-    open("single");
-    const double pixel = elm_config_scale_get() / firstScale;
+    _createPopupView(ad);
+    layOut();
     const Box window = boxOf(ad->win), left = boxOf(button("button1")),
               right = boxOf(button("button2"));
-    const int margins = static_cast<int>(2 * 24 * pixel), widest = static_cast<int>(560 * pixel);
-    const int buttons = right.x + right.width - left.x;
-    EXPECT_NEAR(buttons, std::min(window.width, widest) - margins, 4);
+    EXPECT_NEAR(right.x + right.width - left.x, std::min(window.width, 560) - 2 * 24, 4);
     EXPECT_NEAR(left.x, window.width - right.x - right.width, 4);
-    expectNothingClipped();
+    expectNothingCut("single");
 }
 
-TEST_P(PopupLooks, TwoNamesAreShownWhole)
+TEST_F(PopupLooks, NoScreenIsNarrowerThanASmallPhone)
+{
+    elm_config_scale_set(5);
+    openShare(ACTION_UPLOAD, 1);
+    const Box window = boxOf(ad->win);
+    const double least = std::min(window.width, window.height) / 320.0;
+    EXPECT_NEAR(elm_object_scale_get(ad->popup) * 5, std::min(least, 5.0), 0.01);
+    layOut();
+    expectNothingCut("huge");
+}
+
+TEST_F(PopupLooks, WhatIsTooHighScrollsBetweenTitleAndButtons)
+{
+    elm_config_scale_set(2.5);
+    openShare(ACTION_UPLOAD, 10, 12);
+    layOut();
+    Evas_Object *scroller = ad->popup_layout;
+    while (strcmp(elm_object_widget_type_get(scroller), "Elm_Scroller") != 0)
+        scroller = elm_object_parent_widget_get(scroller);
+    const Box room = boxOf(scroller), content = boxOf(ad->popup_layout);
+    expectInside(scroller, "middle");
+    EXPECT_LE(room.y + room.height, boxOf(button("button1")).y);
+    EXPECT_GE(content.height, room.height);
+    // The keyboard brings into view what it acts on.
+    elm_object_focus_set(ad->wifi_check_box, EINA_TRUE);
+    EXPECT_TRUE(waitUntil([&] {
+        const Box box = boxOf(ad->wifi_check_box);
+        return box.y >= room.y - 1 && box.y + box.height <= room.y + room.height + 1;
+    }));
+}
+
+TEST_F(PopupLooks, TwoNamesAreShownWhole)
 {
     share(3, 5 << 20, {{"Mara Lindqvist", true}, {"Jonas Okonkwo"}});
-    open("two");
-    for (const Evas_Object *item : items())
-        expectWholeLine(item, "elm.text");
-    expectNothingClipped();
+    _createPopupView(ad);
+    layOut();
+    EXPECT_EQ(cutTexts(evas_object_evas_get(ad->win), {}), std::vector<std::string>());
 }
 
-TEST_P(PopupLooks, LongNameOfOneRecipientUsesTheWholeRow)
+TEST_F(PopupLooks, LongNamesAreShortenedAndTheRowScrolls)
 {
-    share(1, 1500, {{longName, true}});
-    open("long-name");
-    ASSERT_EQ(items().size(), 1U);
-    if (GetParam() == 1)
-        expectWholeLine(items().front(), "elm.text");
-    expectInside(items().front(), longName);
-    expectNothingClipped();
+    openShare(ACTION_UPLOAD, 10);
+    layOut();
+    ASSERT_EQ(items().size(), 10U);
+    const int width = boxOf(items().front()).width;
+    EXPECT_NEAR(width, 108, 2);
+    EXPECT_FALSE(cutTexts(evas_object_evas_get(ad->win), {}).empty());
+    expectNothingCut("ten");
 }
 
-TEST_P(PopupLooks, TenRecipientsScrollAndUnsupportedFilesAreTold)
+TEST_F(PopupLooks, ProgressLeavesRoomForTheCancelButton)
 {
-    unsupported_file_count = 12;
-    share(100, 512 << 20, std::vector<test::Person>(10, {longName, true}));
-    open("ten");
-    EXPECT_EQ(items().size(), 10U);
-    expectNothingClipped();
-}
-
-TEST_P(PopupLooks, AnotherLanguageHasRoomForItsWords)
-{
-    unsupported_file_count = 12;
-    speak(anotherLanguage());
-    share(100, 512 << 20, std::vector<test::Person>(10, {longName, true}));
-    open("words-" + languageMark());
-    expectNothingClipped();
-}
-
-TEST_P(PopupLooks, ReshareInAnotherLanguageToOne)
-{
-    speak(anotherLanguage());
-    ad->action_type = ACTION_RESHARE_UPLOAD;
-    share(100, 512 << 20, {{"Mara Lindqvist", true}});
-    open("reshare-" + languageMark());
-    expectNothingClipped();
-}
-
-TEST_P(PopupLooks, ProcessingContacts)
-{
-    _showProcessingPopup(ad);
-    Evas_Object *layout = elm_object_content_get(ad->processing_popup);
-    ASSERT_TRUE(settle(layout));
-    picture = "looks-processing-" + size;
-    expectWholeLine(layout, "elm.text");
-    const Box ring = boxOf(elm_object_part_content_get(layout, "processing"));
-    EXPECT_EQ(ring.width, ring.height);
-    EXPECT_GT(ring.width, 0);
-    const Box words = boxOf(part(layout, "elm.text"));
-    EXPECT_LE(ring.x + ring.width, words.x);
-    keepPicture();
-    evas_object_del(ad->processing_popup);
-}
-
-class StatusLooks : public PopupLooks
-{
-protected:
-    ~StatusLooks() override { g_noti_press_data = {}; }
-
-    void openStatus(const std::string &name, int state, std::vector<std::string> recipients)
-    {
-        g_noti_press_data = {};
-        g_noti_press_data.recipient_count = std::to_string(recipients.size());
-        g_noti_press_data.upload_status = state;
-        g_noti_press_data.total_files = 100;
-        g_noti_press_data.total_size = 1000 << 20;
-        g_noti_press_data.recipients = std::move(recipients);
-        ad->operation_type = OPERATION_UPLOADING_NOTI_PRESSED;
-        _createPopupView(ad);
-        const Evas_Object *ok = elm_object_part_content_get(button("button1"), "ok_button");
-        ASSERT_TRUE(settle(ok));
-        picture = "looks-status-" + name + "-" + size;
-        expectWholeTitle();
-        expectWholeLine(ok, "elm.text");
-        expectWholeBlock(part(ad->popup_layout, "elm.swallow.text"), "status line");
+    for (const char *language : {"de_DE.UTF-8", "ar.UTF-8"}) {
+        speak(language);
+        openStatus(3, 1);
+        layOut();
+        const bool mirrored = elm_config_mirrored_get();
+        EXPECT_EQ(mirrored, language == std::string("ar.UTF-8"));
+        const Box bar = boxOf(ad->progressbar), cancel = boxOf(ad->cancel_button);
+        const Box &first = mirrored ? cancel : bar, &second = mirrored ? bar : cancel;
+        EXPECT_LE(first.x + first.width, second.x) << language;
+        EXPECT_GT(bar.width, 96);
+        closePopups();
     }
-};
-
-TEST_P(StatusLooks, SendingInAnotherLanguageToOne)
-{
-    speak(anotherLanguage());
-    openStatus("sending-" + languageMark(), 3, {std::string(longName) + "+SMS"});
-    expectWholeLine(ad->popup_layout, "elm.swallow.text.bottom.left");
-    const Evas_Object *label = part(ad->cancel_button, "elm.text");
-    EXPECT_LE(naturalWidth(label), boxOf(label).width);
-    const Box bar = boxOf(ad->progressbar), cancel = boxOf(ad->cancel_button);
-    EXPECT_LE(bar.x + bar.width, cancel.x);
-    EXPECT_GT(bar.width, 2 * cancel.width / 3);
-    expectInside(ad->cancel_button, "cancel");
 }
-
-TEST_P(StatusLooks, LongestEndInAnotherLanguageToTen)
-{
-    speak(anotherLanguage());
-    openStatus("failed-" + languageMark(), 9,
-               std::vector<std::string>(10, std::string(longName) + "+SMS"));
-    EXPECT_EQ(items().size(), 10U);
-    expectWholeLine(ad->popup_layout, "elm.swallow.label.text");
-}
-
-INSTANTIATE_TEST_SUITE_P(TextSizes, StatusLooks, ::testing::Values(1.0, 1.3));
-INSTANTIATE_TEST_SUITE_P(TextSizes, PopupLooks, ::testing::Values(1.0, 1.3));
 
 } // namespace
-} // namespace pelliko
+} // namespace pelliko::test
