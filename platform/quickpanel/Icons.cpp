@@ -2,6 +2,7 @@
 
 #include <array>
 #include <filesystem>
+#include <string>
 
 namespace pelliko::quickpanel
 {
@@ -23,6 +24,8 @@ constexpr std::array<Rule, 7> pictures{{
     {"download", "document-save"},
     {"receiv", "document-save"},
 }};
+
+constexpr int uploadFrames = 4;
 
 template <typename Rules> std::string lookUp(const Rules &rules, const std::string &name)
 {
@@ -54,6 +57,16 @@ std::string drawableIcon(const std::string &image)
     if (image.empty() || image.find('/') == std::string::npos || exists(image))
         return image;
     return lookUp(pictures, std::filesystem::path(image).filename());
+}
+
+std::string movingIcon(const std::string &image, int percent)
+{
+    const std::string icon = drawableIcon(image);
+    const bool animated =
+        startsWith(image, "reserved:") && image.find("/ani/") != std::string::npos;
+    return animated && icon == "pelliko-upload"
+               ? "pelliko-uploading-" + std::to_string(percent % uploadFrames + 1)
+               : icon;
 }
 
 } // namespace pelliko::quickpanel

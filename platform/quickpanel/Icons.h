@@ -10,4 +10,8 @@ namespace pelliko::quickpanel
 // only a handset has become the themed icon name that says the same. Empty stays empty.
 std::string drawableIcon(const std::string &image);
 
+// The same for a picture that the handset's panel animates: a desktop shows one still picture at a
+// time, so each report of progress (0 to 100) brings the next of them.
+std::string movingIcon(const std::string &image, int percent);
+
 } // namespace pelliko::quickpanel

@@ -29,13 +29,18 @@ std::string nameOf(const std::string &app)
     return name;
 }
 
+int percentOf(const Record &record)
+{
+    return static_cast<int>(std::lround(record.progress * 100));
+}
+
 std::string iconOf(const Record &record)
 {
     for (const int kind : {NOTIFICATION_IMAGE_TYPE_ICON, NOTIFICATION_IMAGE_TYPE_THUMBNAIL,
                            NOTIFICATION_IMAGE_TYPE_ICON_FOR_INDICATOR}) {
         const auto found = record.images.find(kind);
         if (found != record.images.end())
-            return drawableIcon(found->second);
+            return movingIcon(found->second, percentOf(record));
     }
     return {};
 }
@@ -69,8 +74,7 @@ Variant hintsOf(const Record &record)
     g_variant_dict_insert(&hints, "urgency", "y", normalUrgency);
     g_variant_dict_insert(&hints, "desktop-entry", "s", record.app.c_str());
     if (record.layout == NOTIFICATION_LY_ONGOING_PROGRESS)
-        g_variant_dict_insert(&hints, "value", "i",
-                              static_cast<gint32>(std::lround(record.progress * 100)));
+        g_variant_dict_insert(&hints, "value", "i", percentOf(record));
     if (record.isOngoing()) {
         g_variant_dict_insert(&hints, "category", "s", "transfer");
         g_variant_dict_insert(&hints, "resident", "b", TRUE);

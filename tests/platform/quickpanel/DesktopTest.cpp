@@ -40,7 +40,7 @@ TEST_F(OnDesktop, AnOngoingUploadIsResidentWithABar)
     notification_set_progress(noti, 0.42);
     const Shown &shown = show(noti);
     EXPECT_EQ(shown.summary, "Sending 3 files");
-    EXPECT_EQ(shown.icon, "pelliko-upload");
+    EXPECT_EQ(shown.icon, "pelliko-uploading-3");
     EXPECT_EQ(shown.hint("value"), "42");
     EXPECT_EQ(shown.hint("resident"), "true");
     EXPECT_EQ(shown.hint("urgency"), "0x01");

@@ -1,8 +1,11 @@
+#include <filesystem>
 #include <gtest/gtest.h>
+#include <string>
 
 #include "Icons.h"
 
 using pelliko::quickpanel::drawableIcon;
+using pelliko::quickpanel::movingIcon;
 
 namespace
 {
@@ -32,6 +35,19 @@ TEST(Icons, AHandsetsPicturesBecomeThemedIcons)
     };
     for (const auto &row : table)
         EXPECT_EQ(drawableIcon(row.image), row.icon) << row.image;
+}
+
+TEST(Icons, AnAnimationMovesOnWithTheProgress)
+{
+    const std::string animation = "reserved://quickpanel/ani/uploading";
+    EXPECT_EQ(movingIcon(animation, 0), "pelliko-uploading-1");
+    EXPECT_EQ(movingIcon(animation, 1), "pelliko-uploading-2");
+    EXPECT_EQ(movingIcon(animation, 99), "pelliko-uploading-4");
+    EXPECT_EQ(movingIcon("/usr/apps/x/noti_upload_complete.png", 7), "pelliko-upload-complete");
+    EXPECT_EQ(movingIcon("reserved:default_caller_id", 7), "avatar-default");
+    for (int frame = 0; frame < 4; ++frame)
+        EXPECT_TRUE(std::filesystem::exists(PELLIKO_SOURCE_DIR "/res/icons/" +
+                                            movingIcon(animation, frame) + ".svg"));
 }
 
 TEST(Icons, ThemedNamesAndNothingStayAsTheyAre)
