@@ -6,6 +6,7 @@
 
 #include <Elementary.h>
 #include <algorithm>
+#include <array>
 #include <cmath>
 #include <cstdlib>
 
@@ -16,11 +17,12 @@ namespace
 {
 
 constexpr const char *widthPart = "pelliko.width";
+constexpr std::array<const char *, 2> controlParts{"elm.swallow.checkbox", "cancel_btn_area"};
 constexpr const char *frameGroup = "elm/popup/base/pelliko";
 
 // What a layout that was put into a popup needs to know of its surroundings. Lives with the layout.
 struct Frame {
-    Evas_Object *win, *popup, *layout;
+    Evas_Object *win, *popup, *scroller, *layout;
     Evas_Object *width,
         *room; ///< rectangles that nobody sees: how wide lines are, what the middle takes
     Evas_Coord last_width, last_height; ///< what was asked for last
@@ -54,8 +56,20 @@ Evas_Coord _frameHeight(const Frame &frame, Evas_Coord card_width)
     return height;
 }
 
+// A scroller that holds nothing for the keyboard would take it, and not give it back.
+void _guardKeyboard(const Frame &frame)
+{
+    const bool has_control =
+        std::any_of(controlParts.begin(), controlParts.end(), [&frame](const char *part) {
+            return elm_object_part_content_get(frame.layout, part) != nullptr;
+        });
+    if (elm_object_tree_focus_allow_get(frame.scroller) != has_control)
+        elm_object_tree_focus_allow_set(frame.scroller, has_control);
+}
+
 void _fit(Frame &frame)
 {
+    _guardKeyboard(frame);
     Evas_Coord win_width = 0, win_height = 0, height = 0;
     evas_object_geometry_get(frame.win, nullptr, nullptr, &win_width, &win_height);
     const double scale = _scaleOf(frame.popup);
@@ -133,7 +147,7 @@ void putPopupContent(PellikoAppData *ad, Evas_Object *popup, Evas_Object *layout
     elm_table_pack(cell, room, 0, 0, 1, 1);
     elm_table_pack(cell, scroller, 0, 0, 1, 1);
     elm_object_content_set(popup, cell);
-    auto *frame = new Frame{ad->win, popup, layout, width, room, -1, -1};
+    auto *frame = new Frame{ad->win, popup, scroller, layout, width, room, -1, -1};
     evas_object_event_callback_add(layout, EVAS_CALLBACK_CHANGED_SIZE_HINTS, _surroundingsChangedCb,
                                    frame);
     evas_object_event_callback_add(ad->win, EVAS_CALLBACK_RESIZE, _surroundingsChangedCb, frame);

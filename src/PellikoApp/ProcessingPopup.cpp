@@ -1,5 +1,6 @@
 #include "PellikoApp/ProcessingPopup.h"
 
+#include "PellikoApp/AccessibleName.h"
 #include "PellikoApp/AppData.h"
 #include "PellikoApp/PopupFrame.h"
 #include "PellikoApp/ThemeLayout.h"
@@ -45,7 +46,9 @@ void openProcessingPopup(PellikoAppData *ad, Evas_Smart_Cb back)
     Evas_Object *layout = addThemeLayout(popup, ad->theme, "processing_view_layout");
     elm_object_domain_translatable_part_text_set(layout, "elm.text", domain,
                                                  "IDS_RSH_TPOP_PROCESSING_ING_ABB2");
-    evas_object_data_set(popup, "progressbar", _addBar(ad, layout));
+    Evas_Object *bar = _addBar(ad, layout);
+    setAccessibleName(bar, elm_object_part_text_get(layout, "elm.text"));
+    evas_object_data_set(popup, "progressbar", bar);
     elm_object_content_set(popup, layout);
     evas_object_show(popup);
     showMainWindow(ad);

@@ -1,6 +1,7 @@
 #include "PellikoUploadDataManager/RecipientsRow.h"
 
 #include "AppLog/AppLog.h"
+#include "PellikoApp/AccessibleName.h"
 #include "PellikoApp/AppData.h"
 #include "PellikoApp/ThemeLayout.h"
 #include "PellikoUploadDataManager/Initials.h"
@@ -127,6 +128,7 @@ void _setBadge(Evas_Object *item)
         _tell(item, "badge,missing");
         return;
     }
+    setAccessibleName(badge, "SMS");
     _tint(badge, "AO004");
     const double scale =
         edje_object_scale_get(elm_layout_edje_get(item)) / elm_app_base_scale_get();
@@ -158,7 +160,8 @@ Evas_Object *_addScroller(Evas_Object *parent, Elm_Theme *theme)
     elm_scroller_policy_set(scroller, ELM_SCROLLER_POLICY_AUTO, ELM_SCROLLER_POLICY_OFF);
     elm_scroller_bounce_set(scroller, EINA_FALSE, EINA_FALSE);
     elm_scroller_content_min_limit(scroller, EINA_FALSE, EINA_TRUE);
-    elm_object_focus_allow_set(scroller, EINA_FALSE);
+    // Nothing in it can be acted on, and the keyboard would not find its way out again.
+    elm_object_tree_focus_allow_set(scroller, EINA_FALSE);
     return scroller;
 }
 

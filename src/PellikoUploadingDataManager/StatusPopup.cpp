@@ -50,6 +50,8 @@ void _writeStatusLine(Evas_Object *layout, const char *id)
     copyText(line, sizeof(line), translated(id));
     elm_object_part_text_set(layout, statusPart, line);
     setAccessibleName(layout, line);
+    if (Evas_Object *bar = elm_object_part_content_get(layout, barPart))
+        setAccessibleName(bar, line);
 }
 
 void _writeStateLine(Evas_Object *layout)
@@ -89,6 +91,7 @@ void _addBar(PellikoAppData *ad, double progress_percent)
     elm_progressbar_unit_format_set(bar, "%.0f%%");
     elm_progressbar_value_set(bar, progress_percent / 100.0);
     elm_object_part_content_set(ad->popup_layout, barPart, bar);
+    setAccessibleName(bar, elm_object_part_text_get(ad->popup_layout, statusPart));
     evas_object_show(bar);
     evas_object_data_set(ad->popup, "progressbar", bar);
     keepWhileAlive(&ad->progressbar, bar);
