@@ -1,4 +1,5 @@
 #include "ContactsFixture.h"
+#include "contacts_new_number.h"
 
 namespace pelliko::contacts::test
 {
@@ -27,6 +28,29 @@ protected:
     }
     using Rows = std::vector<std::string>;
 };
+
+TEST_F(ContactsWriting, ANewNumberIsAContactOfItsOwnAndAKnownOneIsFound)
+{
+    const int ann = add("Ann", {"+44 7700 900123"}).front();
+    int id = 0;
+    ASSERT_EQ(contacts_find_or_add_number("00447700900123", &id), CONTACTS_ERROR_NONE);
+    EXPECT_EQ(id, ann);
+    int added = 0;
+    ASSERT_EQ(contacts_find_or_add_number("+447700900777", &added), CONTACTS_ERROR_NONE);
+    ASSERT_EQ(contacts_find_or_add_number("+44 7700 900777", &id), CONTACTS_ERROR_NONE);
+    EXPECT_EQ(id, added);
+    EXPECT_EQ(listed(), (Rows{"1 Ann +44 7700 900123", "2 +447700900777 +447700900777"}));
+}
+
+TEST_F(ContactsWriting, WhatIsNoNumberIsNotAdded)
+{
+    int id = 7;
+    for (const char *text : {"", "+", "Ann"})
+        EXPECT_EQ(contacts_find_or_add_number(text, &id), CONTACTS_ERROR_INVALID_PARAMETER) << text;
+    EXPECT_EQ(contacts_find_or_add_number(nullptr, &id), CONTACTS_ERROR_INVALID_PARAMETER);
+    EXPECT_EQ(id, 7);
+    EXPECT_EQ(listed(), Rows{});
+}
 
 TEST_F(ContactsWriting, TheSameNameAndNumberCompletesTheContact)
 {
