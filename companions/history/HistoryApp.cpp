@@ -3,6 +3,7 @@
 #include "Launches.h"
 #include "Words.h"
 
+#include <ContactNames.h>
 #include <Language.h>
 #include <Theme.h>
 #include <app.h>
@@ -122,12 +123,9 @@ void HistoryApp::show()
     elm_box_clear(page_.column);
     list_.reset();
     share_.reset();
-    pick_.reset();
     elm_scroller_region_show(page_.scroller, 0, 0, 1, 1);
     if (screen_ == Screen::share)
         showShare();
-    else if (screen_ == Screen::pick)
-        showPick();
     else
         showList();
 }
@@ -178,30 +176,18 @@ SharePage::Wishes HistoryApp::shareWishes()
         if (openViewer(key_) != 0)
             share_->showMessage(translated("The viewer is not installed."));
     };
-    return {[this] { goTo(Screen::pick); }, open, [this] { withdraw(); }, [this] { forget(); },
+    const auto again = [this] { share_->showMessage(shareAgainFault()); };
+    return {again, open, [this] { withdraw(); }, [this] { forget(); },
             [this] { goTo(Screen::list); }};
 }
 
-void HistoryApp::showPick()
-{
-    pick_ = std::make_unique<PickPage>(page_, contactNumbers(),
-                                       PickPage::Wishes{[this](const std::vector<int32_t> &ids) {
-                                                            const std::string fault =
-                                                                shareAgainWith(ids);
-                                                            if (fault.empty())
-                                                                goTo(Screen::list);
-                                                            else
-                                                                pick_->showMessage(fault);
-                                                        },
-                                                        [this] { goTo(Screen::share); }});
-}
-
-std::string HistoryApp::shareAgainWith(const std::vector<int32_t> &numbers) const
+// The picker asks for the people and passes the share on.
+std::string HistoryApp::shareAgainFault() const
 {
     const SentShare *share = sentShare();
     if (!share || !isAvailable(*share))
         return translated("These files are no longer on the server.");
-    if (shareAgain(share->id, numbers) != 0)
+    if (shareAgain(share->id) != 0)
         return translated("Pelliko could not be started.");
     return {};
 }
@@ -255,9 +241,7 @@ void HistoryApp::onDone(int result, void *data)
 
 void HistoryApp::back()
 {
-    if (screen_ == Screen::pick)
-        goTo(Screen::share);
-    else if (screen_ == Screen::share && share_ && share_->dropQuestion())
+    if (screen_ == Screen::share && share_ && share_->dropQuestion())
         return;
     else if (screen_ == Screen::share)
         goTo(Screen::list);

@@ -2,7 +2,6 @@
 #pragma once
 
 #include "ListPage.h"
-#include "PickPage.h"
 #include "SharePage.h"
 
 #include <WApp.h>
@@ -29,7 +28,7 @@ protected:
     void onAppControl(app_control_h request, bool firstLaunch) override;
 
 private:
-    enum class Screen { list, share, pick };
+    enum class Screen { list, share };
 
     void open();
     void note(const Opening &opening);
@@ -38,14 +37,13 @@ private:
     void show();
     void showList();
     void showShare();
-    void showPick();
     void update();
     bool updateShare();
     SharePage::Wishes shareWishes();
     void withdraw();
     void forget();
     void back();
-    std::string shareAgainWith(const std::vector<int32_t> &numbers) const;
+    std::string shareAgainFault() const;
     const SentShare *sentShare() const;
     const ReceivedShare *receivedShare() const;
     static void onJob(void *app);
@@ -65,7 +63,6 @@ private:
     uint32_t call_ = 0;
     std::unique_ptr<ListPage> list_;
     std::unique_ptr<SharePage> share_;
-    std::unique_ptr<PickPage> pick_;
 };
 
 } // namespace pelliko::history

@@ -8,7 +8,7 @@ namespace pelliko::history
 namespace
 {
 
-constexpr const char *application = "com.velmora.pelliko";
+constexpr const char *picker = "com.velmora.pelliko-picker";
 constexpr const char *viewer = "com.velmora.pelliko-viewer";
 
 class Request
@@ -28,11 +28,6 @@ public:
     {
         app_control_add_extra_data(handle_, key, value.c_str());
     }
-    void add(const char *key, std::vector<const char *> values) const
-    {
-        app_control_add_extra_data_array(handle_, key, values.data(),
-                                         static_cast<int>(values.size()));
-    }
     int send() const { return app_control_send_launch_request(handle_, nullptr, nullptr); }
 
 private:
@@ -41,22 +36,10 @@ private:
 
 } // namespace
 
-int shareAgain(int32_t requestId, const std::vector<int32_t> &numberIds)
+int shareAgain(int32_t requestId)
 {
-    std::vector<std::string> texts;
-    for (size_t i = 0; i < numberIds.size() && i < mostRecipients; ++i)
-        texts.push_back(std::to_string(numberIds[i]));
-    std::vector<const char *> pointers;
-    pointers.reserve(texts.size());
-    for (const std::string &text : texts)
-        pointers.push_back(text.c_str());
-
-    const Request request(application, APP_CONTROL_OPERATION_SHARE);
+    const Request request(picker, APP_CONTROL_OPERATION_SHARE);
     request.add("pk_reshare", std::to_string(requestId));
-    request.add(APP_CONTROL_DATA_TO, std::move(pointers));
-    // Names the application whose view of contacts the people were picked in. The usage statistics
-    // tell people from contacts and recent ones by it, and these are from contacts.
-    request.add("ct_app_id", application);
     return request.send();
 }
 

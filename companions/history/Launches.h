@@ -3,18 +3,13 @@
 
 #include <cstdint>
 #include <string>
-#include <vector>
 
 namespace pelliko::history
 {
 
-/// How many people one request to share can name.
-inline constexpr size_t mostRecipients = 10;
-
-/// Asks the application to share the files of an earlier request again.
-/// @param numberIds of the contacts store; 1 to mostRecipients
+/// Shares the files of an earlier request again, with people that the recipient picker asks for.
 /// @return 0, or an error of the platform
-int shareAgain(int32_t requestId, const std::vector<int32_t> &numberIds);
+int shareAgain(int32_t requestId);
 
 /// Opens the viewer on a received share. 0, or an error of the platform.
 int openViewer(const std::string &contentsToken);

@@ -1,12 +1,18 @@
 #include "ContactNames.h"
 
+#include "Search.h"
+
 #include <contacts.h>
+#include <contacts_ex.h>
 #include <glib.h>
 
 #include <algorithm>
+#include <cstdlib>
 #include <functional>
-#include <iterator>
+#include <map>
 #include <memory>
+#include <set>
+#include <tuple>
 
 namespace pelliko::companion
 {
@@ -73,18 +79,63 @@ Record readRecord(const char *view, int id)
     return Record(record);
 }
 
-std::string folded(const std::string &text)
+constexpr const char *serviceBook = "ZORP_Universal_Contact";
+
+// The numbers of those who have joined: of each the first letters that are there decide.
+std::set<int32_t> joinedNumbers()
 {
-    g_autofree char *lower = g_utf8_casefold(text.c_str(), -1);
-    return lower;
+    contacts_filter_h filter = nullptr;
+    contacts_query_h query = nullptr;
+    contacts_list_h list = nullptr;
+    contacts_filter_create(_contacts_person_contact._uri, &filter);
+    contacts_filter_add_str(filter, _contacts_person_contact.address_book_name,
+                            CONTACTS_MATCH_FULLSTRING, serviceBook);
+    contacts_query_create(_contacts_person_contact._uri, &query);
+    contacts_query_set_filter(query, filter);
+    const int result = contacts_db_get_records_with_query(query, 0, 0, &list);
+    contacts_query_destroy(query);
+    contacts_filter_destroy(filter);
+    std::map<std::string, std::string> letters;
+    if (result == CONTACTS_ERROR_NONE)
+        visit(list, [&letters](contacts_record_h record) {
+            const std::string of = textOf(record, _contacts_person_contact_ex.sync2);
+            if (!of.empty())
+                letters.emplace(textOf(record, _contacts_person_contact_ex.number_id), of);
+            return true;
+        });
+    std::set<int32_t> joined;
+    for (const auto &[id, of] : letters) {
+        if (of.find('R') != std::string::npos)
+            joined.insert(std::atoi(id.c_str()));
+    }
+    return joined;
 }
 
-std::string digitsOf(const std::string &text)
+ContactNumber numberIn(contacts_record_h record, const std::set<int32_t> &joined)
 {
-    std::string digits;
-    std::copy_if(text.begin(), text.end(), std::back_inserter(digits),
-                 [](char c) { return g_ascii_isdigit(c) || c == '+'; });
-    return digits;
+    const int id = numberOf(record, _contacts_person_number.number_id);
+    return {id,
+            textOf(record, _contacts_person_number.display_name),
+            textOf(record, _contacts_person_number.number),
+            textOf(record, _contacts_person_number.image_thumbnail_path),
+            numberOf(record, _contacts_person_number.type),
+            joined.count(id) > 0};
+}
+
+// By the letters of the names; what begins with none, like a number, comes last.
+void sortByName(std::vector<ContactNumber> &numbers)
+{
+    std::vector<std::tuple<bool, std::string, size_t>> order;
+    for (size_t i = 0; i < numbers.size(); ++i) {
+        const gunichar first = g_utf8_get_char_validated(numbers[i].name.c_str(), -1);
+        order.emplace_back(!g_unichar_isalpha(first), foldedText(numbers[i].name), i);
+    }
+    std::sort(order.begin(), order.end()); // the store's order decides between equal names
+    std::vector<ContactNumber> sorted;
+    sorted.reserve(numbers.size());
+    for (const auto &[last, name, at] : order)
+        sorted.push_back(std::move(numbers[at]));
+    numbers = std::move(sorted);
 }
 
 } // namespace
@@ -115,33 +166,29 @@ std::string nameOfNumberId(int32_t id)
     return contact ? textOf(contact.get(), _contacts_simple_contact.display_name) : "";
 }
 
-std::vector<ContactNumber> contactNumbers()
+std::vector<ContactNumber> contactNumbers(bool *readable)
 {
     contacts_list_h list = nullptr;
-    if (contacts_db_get_all_records(_contacts_person_number._uri, 0, 0, &list) !=
-        CONTACTS_ERROR_NONE)
+    const int result = contacts_db_get_all_records(_contacts_person_number._uri, 0, 0, &list);
+    if (readable)
+        *readable = result == CONTACTS_ERROR_NONE;
+    if (result != CONTACTS_ERROR_NONE)
         return {};
+    const std::set<int32_t> joined = joinedNumbers();
     std::vector<ContactNumber> found;
-    visit(list, [&found](contacts_record_h record) {
-        ContactNumber number{numberOf(record, _contacts_person_number.number_id),
-                             textOf(record, _contacts_person_number.display_name),
-                             textOf(record, _contacts_person_number.number)};
+    visit(list, [&](contacts_record_h record) {
+        ContactNumber number = numberIn(record, joined);
         if (!number.name.empty() && !number.number.empty())
             found.push_back(std::move(number));
         return true;
     });
-    std::sort(found.begin(), found.end(), [](const ContactNumber &a, const ContactNumber &b) {
-        return a.name != b.name ? a.name < b.name : a.id < b.id;
-    });
+    sortByName(found);
     return found;
 }
 
 bool matches(const ContactNumber &number, const std::string &typed)
 {
-    if (folded(number.name).find(folded(typed)) != std::string::npos)
-        return true;
-    const std::string digits = digitsOf(typed);
-    return !digits.empty() && digitsOf(number.number).find(digits) != std::string::npos;
+    return Search(typed).finds(number.name, number.number);
 }
 
 } // namespace pelliko::companion

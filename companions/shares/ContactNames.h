@@ -13,6 +13,12 @@ struct ContactNumber {
     int32_t id = 0;
     std::string name;
     std::string number;
+    /// File with a picture of the person; may be empty.
+    std::string picture{};
+    /// Bits as in the contacts store: what kind of number it is.
+    int type = 0;
+    /// Whoever has not joined is told by SMS.
+    bool joined = false;
 };
 
 /// Opens the contacts store, once, before any name is asked for. Without it there are no names.
@@ -25,9 +31,10 @@ std::string nameOfNumber(const std::string &number);
 std::string nameOfNumberId(int32_t id);
 
 /// All numbers of people with a name, in the order of the names.
-std::vector<ContactNumber> contactNumbers();
+/// @param readable gets false when the store cannot be read; may be null
+std::vector<ContactNumber> contactNumbers(bool *readable = nullptr);
 
-/// Whether a typed text is in the name (case ignored) or, without its blanks, in the number.
+/// Whether a typed text is in the name or the number, see Search.
 bool matches(const ContactNumber &number, const std::string &typed);
 
 } // namespace pelliko::companion

@@ -1,6 +1,6 @@
 #include "Opening.h"
 
-#include <CText.h>
+#include <Requests.h>
 
 #include <algorithm>
 
@@ -9,10 +9,7 @@ namespace pelliko::viewer
 
 std::string tokenOf(app_control_h request)
 {
-    char *value = nullptr;
-    app_control_get_extra_data(request, "contents_token", &value);
-    const companion::CText owned(value);
-    return owned ? owned.get() : "";
+    return companion::extraOf(request, "contents_token");
 }
 
 bool isToken(const std::string &text)

@@ -16,6 +16,7 @@ APPLICATION = "res/locale"
 # Their English texts stand in the sources.
 OTHERS = {
     "companions/history/locale": "companions",
+    "companions/picker/locale": "companions",
     "companions/signin/locale": "companions",
     "companions/viewer/locale": "companions",
     "res/desktop/locale": "res/desktop",

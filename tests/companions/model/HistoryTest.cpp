@@ -2,8 +2,6 @@
 #include <history/Opening.h>
 #include <history/Words.h>
 
-#include <ContactNames.h>
-
 #include <gtest/gtest.h>
 
 namespace
@@ -131,15 +129,6 @@ TEST(HistoryWords, ServerAndDeviceErrorsAreToldApart)
 TEST(HistoryWords, ASenderWithoutANumberIsUnknown)
 {
     EXPECT_EQ("Unknown sender", senderText(ReceivedShare{}));
-}
-
-TEST(HistorySearch, APartOfTheNameInAnyCaseOrOfTheNumberIsEnough)
-{
-    const pelliko::companion::ContactNumber zoe{1, "Zoë Älbrecht", "+44 7700 900123"};
-    for (const char *typed : {"", "zoë", "älb", "ÄLB", "7700900", "+4477", "00 900 1"})
-        EXPECT_TRUE(matches(zoe, typed)) << typed;
-    for (const char *typed : {"anna", "999", "-"})
-        EXPECT_FALSE(matches(zoe, typed)) << typed;
 }
 
 } // namespace

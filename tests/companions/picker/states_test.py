@@ -1,0 +1,207 @@
+"""The recipient picker: what it shows of a request and of the contacts, and the request that goes on."""
+
+import base64
+import json
+import os
+import shutil
+import subprocess
+import sys
+import unittest
+
+sys.path.insert(0, os.path.join(os.path.dirname(os.path.abspath(__file__)), "..", "common"))
+
+import companion_case  # noqa: E402
+import doubles  # noqa: E402
+import screen  # noqa: E402
+import world  # noqa: E402
+
+NAMESPACE = "http://tizen.org/appcontrol/"
+TO = NAMESPACE + "data/to"
+STORE = os.path.join(os.environ["XDG_DATA_HOME"], "pelliko-platform", "contacts.db")
+SEARCH = "Search for a name or number"
+PICTURE = os.path.join(os.environ["PELLIKO_BUILD"], "app", "shared", "res", "com.velmora.pelliko.png")
+
+
+def add_pictured(name, number):
+    with open(PICTURE, "rb") as file:
+        picture = base64.b64encode(file.read()).decode()
+    card = f"BEGIN:VCARD\nVERSION:3.0\nFN:{name}\nTEL;TYPE=CELL:{number}\nPHOTO;ENCODING=b;TYPE=PNG:{picture}\nEND:VCARD\n"
+    path = os.path.join(os.environ["HOME"], "card.vcf")
+    with open(path, "w", encoding="utf-8") as file:
+        file.write(card)
+    world.run("contacts-tool", "import", path)
+
+
+class PickerCase(companion_case.CompanionCase):
+    program = "com.velmora.pelliko-picker"
+
+    @classmethod
+    def setUpClass(cls):
+        cls.ann = world.add_contact("Ann Example", "+44 7700 900123")
+        cls.office = world.add_contact("Ann Example", "+44 20 7946 0123")
+        cls.bo = world.add_contact("Bo Example", "+44 7700 900456", joined=True)
+        add_pictured("Zoë Älbrecht", "+49 151 12345678")
+        world.add_contact("ليلى العربية", "+971501234567")
+        world.add_contact("A name that goes on and on, as those of a lodge or of a parish council do", "+44 7700 900999")
+
+    def setUp(self):
+        super().setUp()
+        self.pelliko = doubles.Application("com.velmora.pelliko")
+        self.addCleanup(self.pelliko.close)
+
+    def row(self, start):
+        return world.wait_for(lambda: next((name for name, role, _, _ in screen.controls()
+                                            if name.startswith(start) and role == "list item"), None), f"a row “{start}”")
+
+    def choose(self, start):
+        self.press(self.row(start), "list item")
+
+    def type(self, text):
+        screen.type_into(SEARCH, text)
+
+    @staticmethod
+    def move_store(old, new):
+        for end in ("", "-wal", "-shm"):
+            if os.path.exists(new + end):
+                os.remove(new + end)
+            if os.path.exists(old + end):
+                shutil.move(old + end, new + end)
+
+    def share_photo(self, *options):
+        self.launch("share", "--uri", "file:///home/me/photo.jpg", *options)
+        self.see("\u2068photo.jpg\u2069")
+
+
+class Requests(PickerCase):
+    def test_the_same_request_goes_on_with_the_people(self):
+        self.launch("multi_share", "--extra-array", "appcontrol/data/path=/tmp/plan.pdf", "--extra-array",
+                    "appcontrol/data/path=/tmp/photo.jpg", "--extra", "of_the_sender=kept")
+        self.see("2 files · \u2068plan.pdf\u2069, \u2068photo.jpg\u2069")
+        self.picture("start")
+        self.choose("Bo Example, +44 7700 900456, Sees it in Pelliko")
+        self.row("Chosen: \u2068Bo Example")
+        self.type("albr")  # neither case nor dots matter
+        self.choose("Zoë Älbrecht, +49 151 12345678, Gets an SMS with the link")
+        self.see("2 people are chosen. At most 10 people at once.")
+        self.picture("two")
+        self.press("Remove \u2068Zoë Älbrecht\u2069")
+        self.see("1 person is chosen. At most 10 people at once.")
+        self.type("+44 7700 900777")
+        self.choose("Send to \u2068+447700900777\u2069, Not in your contacts")
+        self.see("2 people are chosen. At most 10 people at once.")
+        self.press("Share")
+        request = self.pelliko.wait_request()
+        self.application.wait_gone()
+        added = [contact for contact in world.contacts() if contact["number"] == "+447700900777"]
+        self.assertEqual(["+447700900777"], [contact["name"] for contact in added])
+        self.assertEqual(NAMESPACE + "operation/multi_share", request["operation"])
+        self.assertEqual({NAMESPACE + "data/path": ["/tmp/plan.pdf", "/tmp/photo.jpg"], "of_the_sender": "kept",
+                          TO: [str(self.bo), str(added[0]["number_id"])], "ct_app_id": "com.velmora.pelliko"},
+                         request["extras"])
+
+    def test_a_sender_that_waits_is_told_how_it_ended(self):
+        contacts = world.contacts()
+        for button, result in (("Cancel", -2), ("Share", 0)):
+            sender = subprocess.Popen(["app-launch", "--app", self.program, "--operation", "appcontrol/operation/share",
+                                       "--uri", "/tmp/photo.jpg", "--extra-array", f"appcontrol/data/to={self.ann}|x",
+                                       "--wait-reply"], stdout=subprocess.PIPE)
+            self.see("1 person is chosen. At most 10 people at once.")  # whom the request names
+            self.press(button)
+            self.assertEqual(result, json.loads(sender.communicate(timeout=world.LIMIT)[0])["result"])
+            self.application.wait_gone()
+        self.assertEqual([[str(self.ann)]], [request["extras"][TO] for request in self.pelliko.requests])
+        self.assertEqual(contacts, world.contacts())
+
+    def test_each_request_has_its_window(self):
+        self.share_photo()
+        self.launch("share_text", "--extra", "appcontrol/data/text=Meet at 7\nat the harbour")
+        self.see("A text · \u2068Meet at 7 at the harbour\u2069")
+        self.picture("text")
+        screen.key("Escape")
+        self.wait_away("A text · \u2068Meet at 7 at the harbour\u2069")
+        self.see("\u2068photo.jpg\u2069")
+        self.assertEqual([], self.pelliko.requests)
+
+    def test_an_earlier_share_is_told_by_its_files(self):
+        service = doubles.SharesService()
+        self.addCleanup(service.close)
+        service.sent = [doubles.sent(7, doubles.AVAILABLE, [], files=[("plan.pdf", 1, "")] * 5)]
+        self.launch("share", "--extra", "pk_reshare=7")
+        self.see("5 files · " + ", ".join(["\u2068plan.pdf\u2069"] * 3) + " and 2 more")
+
+    def test_a_start_without_anything_to_share_says_what_to_do(self):
+        self.launch()
+        self.see("There is nothing to share here. Choose files in another application and share them from there.")
+        self.picture("nothing")
+        screen.wait_active("pelliko-picker")
+        screen.key("Return")
+        self.application.wait_gone()
+
+
+class People(PickerCase):
+    def test_the_keyboard_is_enough(self):
+        self.share_photo()
+        screen.wait_active("pelliko-picker")
+        for text in ("020 7946", "bo"):
+            world.run("xdotool", "type", "--delay", "5", text)
+            world.wait_for(lambda: screen.text_of(SEARCH) == text, "what is typed")
+            screen.key("Return")
+            world.wait_for(lambda: screen.text_of(SEARCH) == "", "the next search")
+        self.see("2 people are chosen. At most 10 people at once.")
+        screen.wait_still()
+        for name in ("Tab", "Tab", "Tab", "Tab", "Tab", "Return"):  # both people, the list and Cancel lie between
+            screen.key(name)
+        self.assertEqual([str(self.office), str(self.bo)], self.pelliko.wait_request()["extras"][TO])
+
+    def test_nobody_comes_after_the_tenth(self):
+        many = [world.add_contact(f"Person {n:02}", f"+44 7700 9010{n:02}") for n in range(10)]
+        self.share_photo(*world.recipients_option(many))
+        self.see("10 people are chosen. At most 10 people at once.")
+        self.choose("Bo Example")
+        self.see("At most 10 people at once.")
+        self.picture("ten")
+        self.press("Share")
+        self.assertEqual([str(one) for one in many], self.pelliko.wait_request()["extras"][TO])
+
+    def test_a_number_is_offered_once_it_is_whole(self):
+        self.share_photo()
+        self.type("7700")
+        self.row("Ann Example")
+        self.type("0999 12")
+        self.see("Type the whole number with its country code, such as +44 7700 900123.")
+        self.picture("half-a-number")
+        self.type("+49 151 12345678")  # somebody has it
+        self.row("Zoë Älbrecht")
+        self.wait_away("Send to \u2068+4915112345678\u2069, Not in your contacts, Gets an SMS with the link")
+        self.type("nobody")
+        self.see("Nobody is called so.")
+
+    def test_contacts_that_cannot_be_read_are_asked_for_again(self):
+        away = STORE + ".away"
+        self.move_store(STORE, away)
+        self.addCleanup(self.move_store, away, STORE)
+        with open(STORE, "w", encoding="utf-8") as file:
+            file.write("This is no database. " * 100)
+        self.share_photo()
+        self.see("The contacts cannot be read.")
+        self.picture("unreadable")
+        os.remove(STORE)
+        self.press("Try again")
+        self.see("No contacts yet. Type a phone number to share with.")
+        self.picture("empty")
+        screen.key("Escape")
+        self.application.wait_gone()
+
+    def test_it_changes_its_language_while_it_is_open(self):
+        self.share_photo()
+        self.choose("Ann Example, \u2066+44 20 7946 0123\u2069 · Mobile")
+        self.addCleanup(self.language, "en_GB.UTF-8")
+        for language, title in (("de_DE.UTF-8", "Teilen mit"), ("ar", "المشاركة مع")):
+            self.language(language)
+            self.see(title)
+            self.picture(language[:2])
+        self.row("تم اختيار: ")
+
+
+if __name__ == "__main__":
+    unittest.main(verbosity=2)
