@@ -26,7 +26,8 @@ void addRecipients(app_control_h request, const std::vector<int32_t> &numberIds)
 
 } // namespace
 
-int shareWith(app_control_h request, const std::vector<int32_t> &numberIds)
+int shareWith(app_control_h request, const std::vector<int32_t> &numberIds,
+              app_control_delivered_cb taken, void *data)
 {
     app_control_h forwarded = nullptr;
     if (const int failed = app_control_clone(&forwarded, request); failed != 0)
@@ -37,7 +38,8 @@ int shareWith(app_control_h request, const std::vector<int32_t> &numberIds)
     // tell people from contacts and recent ones by it, and these are from contacts.
     if (companion::extraOf(forwarded, pickedIn).empty())
         app_control_add_extra_data(forwarded, pickedIn, application);
-    const int result = app_control_send_launch_request(forwarded, nullptr, nullptr);
+    // A request that is merely under way could be lost when the picker ends after its last window.
+    const int result = app_control_send_for_delivery(forwarded, taken, data);
     app_control_destroy(forwarded);
     return result;
 }

@@ -2,6 +2,7 @@
 #pragma once
 
 #include <app_control.h>
+#include <app_control_delivery.h>
 
 #include <cstdint>
 #include <vector>
@@ -9,11 +10,12 @@
 namespace pelliko::picker
 {
 
-/// Sends the application the same request with these recipients, and returns when it has taken it.
-/// Main loop only.
+/// Sends the application the same request with these recipients. Main loop only.
 /// @param numberIds of the contacts store; 1 to Choice::most
-/// @return 0, or an error of the platform
-int shareWith(app_control_h request, const std::vector<int32_t> &numberIds);
+/// @param taken called with 0 when the application has dealt with the request, or with an error
+/// @return 0, or an error of the platform, after which `taken` is not called
+int shareWith(app_control_h request, const std::vector<int32_t> &numberIds,
+              app_control_delivered_cb taken, void *data);
 
 /// Answers a sender that waits.
 void answer(app_control_h request, app_control_result_e result);

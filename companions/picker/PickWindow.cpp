@@ -29,11 +29,11 @@ PickWindow::PickWindow(app_control_h request, std::function<void()> closed)
       content_(contentOf(request))
 {
     app_control_clone(&request_, request);
-    const auto cancel = [](void *self, Evas_Object *, void *) {
-        static_cast<PickWindow *>(self)->finish(APP_CONTROL_RESULT_CANCELED);
+    const auto leave = [](void *self, Evas_Object *, void *) {
+        static_cast<PickWindow *>(self)->cancel();
     };
-    evas_object_smart_callback_add(window_.window, "delete,request", cancel, this);
-    eext_object_event_callback_add(window_.column, EEXT_CALLBACK_BACK, cancel, this);
+    evas_object_smart_callback_add(window_.window, "delete,request", leave, this);
+    eext_object_event_callback_add(window_.column, EEXT_CALLBACK_BACK, leave, this);
     if (content_.kind != Content::Kind::nothing) {
         readContacts();
         chooseNamed();
@@ -120,8 +120,7 @@ void PickWindow::showPage()
 {
     page_ = std::make_unique<PickPage>(
         window_, model_,
-        PickPage::Wishes{[this] { share(); }, [this] { finish(APP_CONTROL_RESULT_CANCELED); },
-                         [this] { againLater(); }});
+        PickPage::Wishes{[this] { share(); }, [this] { cancel(); }, [this] { againLater(); }});
     page_->showContent(contentText(content_));
 }
 
@@ -172,19 +171,42 @@ std::vector<int32_t> PickWindow::numberIds() const
 
 void PickWindow::share()
 {
+    if (sharing_)
+        return;
     const std::vector<int32_t> ids = numberIds();
     if (ids.empty()) {
         page_->showMessage(translated("The number cannot be kept on this device. Make room on it "
                                       "and try again."));
         return;
     }
-    if (const int result = shareWith(request_, ids); result != 0) {
-        dlog_print(DLOG_ERROR, logTag, "the application did not take the request: %d", result);
-        page_->showMessage(translated("Pelliko could not be started."));
+    dlog_print(DLOG_INFO, logTag, "shared with %zu number(s)", ids.size());
+    sharing_ = true;
+    const auto done = [](int result, void *self) {
+        static_cast<PickWindow *>(self)->taken(result);
+    };
+    if (const int result = shareWith(request_, ids, done, this); result != 0)
+        taken(result);
+}
+
+void PickWindow::taken(int result)
+{
+    sharing_ = false;
+    if (result == 0) {
+        finish(APP_CONTROL_RESULT_SUCCEEDED);
         return;
     }
-    dlog_print(DLOG_INFO, logTag, "shared with %zu number(s)", ids.size());
-    finish(APP_CONTROL_RESULT_SUCCEEDED);
+    dlog_print(DLOG_ERROR, logTag, "the application did not take the request: %d", result);
+    page_->showMessage(translated("Pelliko could not be started."));
+    evas_object_show(window_.window);
+}
+
+// A request that is on its way is not taken back.
+void PickWindow::cancel()
+{
+    if (sharing_)
+        evas_object_hide(window_.window);
+    else
+        finish(APP_CONTROL_RESULT_CANCELED);
 }
 
 void PickWindow::finish(app_control_result_e result)

@@ -38,6 +38,8 @@ private:
     void showNothing();
     void againLater();
     void share();
+    void taken(int result);
+    void cancel();
     std::vector<int32_t> numberIds() const;
     void finish(app_control_result_e result);
     static void onListed(int result, const pelliko_sent_share_s *shares, int count, void *window);
@@ -50,6 +52,8 @@ private:
     PickPage::Model model_;
     std::unique_ptr<PickPage> page_;
     uint32_t asking_ = 0;
+    /// The request is on its way to the application.
+    bool sharing_ = false;
     Ecore_Job *job_ = nullptr;
 };
 

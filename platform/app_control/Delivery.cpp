@@ -11,6 +11,14 @@ using namespace pelliko::platform;
 namespace
 {
 
+int resultOf(const LaunchOutcome &outcome)
+{
+    if (outcome.error.empty())
+        return APP_CONTROL_ERROR_NONE;
+    dlog_print(DLOG_ERROR, "APP_CONTROL", "a request was lost: %s", outcome.error.c_str());
+    return APP_CONTROL_ERROR_LAUNCH_FAILED;
+}
+
 int deliver(app_control_h request)
 {
     // A bus that goes away is an error like any other, not the end of this process.
@@ -20,10 +28,7 @@ int deliver(app_control_h request)
     int result = APP_CONTROL_ERROR_NONE;
     const int code = launch(request, false, [&](const LaunchOutcome &outcome) {
         settled = true;
-        if (outcome.error.empty())
-            return;
-        dlog_print(DLOG_ERROR, "APP_CONTROL", "a request was lost: %s", outcome.error.c_str());
-        result = APP_CONTROL_ERROR_LAUNCH_FAILED;
+        result = resultOf(outcome);
     });
     if (code != APP_CONTROL_ERROR_NONE)
         return code;
@@ -37,4 +42,16 @@ int deliver(app_control_h request)
 int app_control_deliver_launch_request(app_control_h app_control)
 {
     return guarded([=] { return deliver(app_control); });
+}
+
+int app_control_send_for_delivery(app_control_h app_control, app_control_delivered_cb callback,
+                                  void *user_data)
+{
+    if (!callback)
+        return APP_CONTROL_ERROR_INVALID_PARAMETER;
+    return guarded([=] {
+        return launch(app_control, false, [=](const LaunchOutcome &outcome) {
+            callback(resultOf(outcome), user_data);
+        });
+    });
 }

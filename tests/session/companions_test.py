@@ -103,7 +103,7 @@ class SentShares(CompanionsCase):
         with self.assertRaises(urllib.error.HTTPError) as refused:
             urllib.request.urlopen(world.link_in(message["text"]), timeout=world.LIMIT)
         self.assertEqual(410, refused.exception.code)
-        self.assertIn("withdrawn", refused.exception.read().decode())
+        self.assertIn("No longer shared", refused.exception.read().decode())
         self.picture("withdrawn")
 
     def test_a_share_goes_again_to_somebody_from_the_contacts(self):

@@ -1,5 +1,6 @@
 """The ground under the tests of companions: a person in front of one program, in a private world."""
 
+import contextlib
 import os
 import subprocess
 import sys
@@ -32,7 +33,8 @@ class CompanionCase(unittest.TestCase):
         if not all(case is not self for case, _ in self._outcome.result.failures + self._outcome.result.errors):
             self.picture(self._testMethodName)
         if self.application.owner:
-            os.kill(self.application.process_id(), 9)
+            with contextlib.suppress(world.GLib.Error, ProcessLookupError):  # it is just leaving by itself
+                os.kill(self.application.process_id(), 9)
             self.application.wait_gone()
 
     def launch(self, operation="default", *options):
