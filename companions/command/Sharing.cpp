@@ -12,6 +12,9 @@
 #include <filesystem>
 #include <iostream>
 #include <iterator>
+#include <memory>
+#include <new>
+#include <type_traits>
 #include <unistd.h>
 
 namespace pelliko::command
@@ -26,38 +29,30 @@ constexpr std::size_t mostRecipients = 10;
 // What is longer is a file rather than a text.
 constexpr std::size_t longestText = 1024UL * 1024UL;
 
-class Request
-{
-public:
-    Request(const char *receiver, const char *operation)
-    {
-        app_control_create(&handle_);
-        app_control_set_app_id(handle_, receiver);
-        app_control_set_operation(handle_, operation);
-    }
-    ~Request() { app_control_destroy(handle_); }
-    Request(const Request &) = delete;
-    Request &operator=(const Request &) = delete;
-
-    void setFile(const std::string &path) const { app_control_set_uri(handle_, path.c_str()); }
-    void add(const char *key, const std::string &value) const
-    {
-        app_control_add_extra_data(handle_, key, value.c_str());
-    }
-    void add(const char *key, const std::vector<std::string> &values) const
-    {
-        std::vector<const char *> pointers;
-        pointers.reserve(values.size());
-        for (const std::string &value : values)
-            pointers.push_back(value.c_str());
-        app_control_add_extra_data_array(handle_, key, pointers.data(),
-                                         static_cast<int>(pointers.size()));
-    }
-    int deliver() const { return app_control_deliver_launch_request(handle_); }
-
-private:
-    app_control_h handle_ = nullptr;
+struct Destroy {
+    void operator()(app_control_h request) const { app_control_destroy(request); }
 };
+using Request = std::unique_ptr<std::remove_pointer_t<app_control_h>, Destroy>;
+
+Request requestTo(const char *receiver, const char *operation)
+{
+    app_control_h request = nullptr;
+    if (app_control_create(&request) != APP_CONTROL_ERROR_NONE)
+        throw std::bad_alloc();
+    app_control_set_app_id(request, receiver);
+    app_control_set_operation(request, operation);
+    return Request(request);
+}
+
+void addTexts(const Request &request, const char *key, const std::vector<std::string> &texts)
+{
+    std::vector<const char *> pointers;
+    pointers.reserve(texts.size());
+    for (const std::string &text : texts)
+        pointers.push_back(text.c_str());
+    app_control_add_extra_data_array(request.get(), key, pointers.data(),
+                                     static_cast<int>(pointers.size()));
+}
 
 // The recipients of a command line: ids of numbers, in order and each once.
 struct Recipients {
@@ -140,7 +135,7 @@ Recipients recipientsOf(const std::vector<std::string> &to)
 Exit deliver(const Request &request, bool toPicker)
 {
     const std::string who = toPicker ? "the recipient picker" : "Pelliko";
-    switch (request.deliver()) {
+    switch (app_control_deliver_launch_request(request.get())) {
     case APP_CONTROL_ERROR_NONE:
         return Exit::done;
     case APP_CONTROL_ERROR_APP_NOT_FOUND:
@@ -160,8 +155,12 @@ const char *receiverFor(const Recipients &recipients)
 
 Exit send(const Request &request, const Recipients &recipients)
 {
-    if (!recipients.ids.empty())
-        request.add(APP_CONTROL_DATA_TO, recipients.ids);
+    if (!recipients.ids.empty()) {
+        addTexts(request, APP_CONTROL_DATA_TO, recipients.ids);
+        // Whose view of the contacts the people were picked in: the usage statistics tell by it
+        // that these are contacts.
+        app_control_add_extra_data(request.get(), "ct_app_id", application);
+    }
     return deliver(request, recipients.ids.empty());
 }
 
@@ -201,12 +200,13 @@ Exit shareFiles(const std::vector<std::string> &names, const std::vector<std::st
     if (recipients.status != Exit::done)
         return recipients.status;
     const bool single = files.paths.size() == 1;
-    const Request request(receiverFor(recipients),
-                          single ? APP_CONTROL_OPERATION_SHARE : APP_CONTROL_OPERATION_MULTI_SHARE);
+    const Request request =
+        requestTo(receiverFor(recipients),
+                  single ? APP_CONTROL_OPERATION_SHARE : APP_CONTROL_OPERATION_MULTI_SHARE);
     if (single)
-        request.setFile(files.paths.front());
+        app_control_set_uri(request.get(), files.paths.front().c_str());
     else
-        request.add(APP_CONTROL_DATA_PATH, files.paths);
+        addTexts(request, APP_CONTROL_DATA_PATH, files.paths);
     return send(request, recipients);
 }
 
@@ -221,8 +221,8 @@ Exit shareText(const std::vector<std::string> &words, const std::vector<std::str
     const Recipients recipients = recipientsOf(to);
     if (recipients.status != Exit::done)
         return recipients.status;
-    const Request request(receiverFor(recipients), APP_CONTROL_OPERATION_SHARE_TEXT);
-    request.add(APP_CONTROL_DATA_TEXT, text);
+    const Request request = requestTo(receiverFor(recipients), APP_CONTROL_OPERATION_SHARE_TEXT);
+    app_control_add_extra_data(request.get(), APP_CONTROL_DATA_TEXT, text.c_str());
     return send(request, recipients);
 }
 

@@ -61,7 +61,7 @@ const char *stateWord(pelliko_share_state_e state)
 
 std::string stateText(const SentShare &share)
 {
-    const std::string word = stateWord(share.state);
+    std::string word = stateWord(share.state);
     switch (share.state) {
     case PELLIKO_SHARE_UPLOADING:
     case PELLIKO_SHARE_PAUSED:

@@ -83,7 +83,7 @@ class Sharing(CommandCase):
         (request,) = application.requests
         self.assertEqual(OPERATION + "share", request["operation"])
         self.assertEqual(path, request["uri"])
-        self.assertEqual({DATA + "to": [self.ids["Zoë Doe", "+447700900107"]]}, request["extras"])
+        self.assertEqual({DATA + "to": [self.ids["Zoë Doe", "+447700900107"]], "ct_app_id": world.APP}, request["extras"])
 
     def test_several_files_are_one_multi_share(self):
         application = self.application()
