@@ -16,6 +16,7 @@ pkg_check_modules(ebook_contacts REQUIRED IMPORTED_TARGET libebook-contacts-1.2)
 pkg_check_modules(systemd REQUIRED IMPORTED_TARGET libsystemd)
 pkg_check_modules(postgres REQUIRED IMPORTED_TARGET libpq)
 pkg_check_modules(openssl REQUIRED IMPORTED_TARGET openssl)
+pkg_check_modules(pugixml REQUIRED IMPORTED_TARGET pugixml)
 find_package(SQLiteCpp REQUIRED)
 # scripts/setup installs the library without its development package, so without the plain name.
 find_path(PHONENUMBER_INCLUDE phonenumbers/phonenumberutil.h REQUIRED)

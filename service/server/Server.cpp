@@ -52,7 +52,7 @@ struct Server::State {
     State(const Config &config, Metadata &metadata, Blobs &blobs, std::function<Seconds()> now,
           std::unique_ptr<Peers> others)
         : timeouts(config.timeouts), drain(config.drain), peers(std::move(others)),
-          pool(storageThreads), writes(*peers),
+          pool(std::max(storageThreads, blobs.callsAtOnce())), writes(*peers),
           pushes(io.get_executor(), limitsOf(config, capacity)),
           context{metadata,      blobs,          *peers,          pool, writes, pushes,
                   config.limits, std::move(now), config.publicUrl},

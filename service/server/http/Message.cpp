@@ -20,6 +20,7 @@ constexpr Phrase phrases[] = {
     {204, "No Content"},
     {206, "Partial Content"},
     {304, "Not Modified"},
+    {307, "Temporary Redirect"},
     {400, "Bad Request"},
     {401, "Unauthorized"},
     {404, "Not Found"},

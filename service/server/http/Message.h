@@ -22,6 +22,7 @@ enum class Status {
     noContent = 204,
     partialContent = 206,
     notModified = 304,
+    temporaryRedirect = 307,
 };
 
 /// A request's head, read completely; the body is read through the Exchange.

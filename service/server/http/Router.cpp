@@ -200,6 +200,7 @@ Refusal refusalOf(StorageFailure::Kind kind)
     case StorageFailure::Kind::unavailable:
         return Refusal(Error::unavailable, {}, {{"Retry-After", secondsUntilRetry}});
     case StorageFailure::Kind::broken:
+    case StorageFailure::Kind::lost:
         break;
     }
     return Refusal(Error::internal);

@@ -107,6 +107,19 @@ Task<void> sendBlob(Exchange &exchange, Context &context, std::shared_ptr<BlobRe
     }
 }
 
+/// Where the store itself gives the whole file out, until the share ends. Parts of it and questions
+/// about it are answered here.
+std::optional<std::string> addressOf(const Request &request, Context &context,
+                                     const ShareRecord &share, const FileRecord &file)
+{
+    const bool wantsAll = request.method == "GET" && request.header("Range") == nullptr &&
+                          request.header("If-None-Match") == nullptr;
+    if (!wantsAll || file.size == 0)
+        return std::nullopt;
+    return context.blobs.addressOf(
+        file.blob, {share.deadline - context.now(), attachmentDisposition(file.name), file.type});
+}
+
 Task<void> zipFile(Exchange &exchange, Context &context, ZipWriter &zip, FileRecord file,
                    Seconds modified)
 {
@@ -163,7 +176,14 @@ Task<void> downloadFile(Exchange &exchange, Context &context, std::string token,
     const LinkRecord link = co_await findLiveLink(context, token);
     if (index >= link.share.files.size())
         throw Refusal(Error::notFound);
-    co_await sendShareFile(exchange, context, link.share.files[index]);
+    const FileRecord &file = link.share.files[index];
+    if (const auto address = addressOf(exchange.request(), context, link.share, file)) {
+        Response elsewhere = makeResponse(Status::temporaryRedirect,
+                                          {{"Location", *address}, {"Cache-Control", "no-store"}});
+        co_await exchange.respond(std::move(elsewhere));
+        co_return;
+    }
+    co_await sendShareFile(exchange, context, file);
 }
 
 Task<void> sendShareFile(Exchange &exchange, Context &context, const FileRecord &file)

@@ -5,6 +5,7 @@
 #include "store/PostgresClock.h"
 #include "store/PostgresMetadata.h"
 #include "store/PostgresPeers.h"
+#include "store/S3Blobs.h"
 #include "store/SqliteMetadata.h"
 
 #include <ctime>
@@ -45,7 +46,7 @@ bool isPostgres(const std::string &url)
 }
 
 constexpr const char *metadataForms = "sqlite:PATH or postgresql://…";
-constexpr const char *blobForms = "dir:PATH";
+constexpr const char *blobForms = "dir:PATH or s3://…";
 
 fs::path sqliteFile(const std::string &url, Absent absent)
 {
@@ -100,6 +101,8 @@ std::unique_ptr<Metadata> openMetadata(const std::string &url, Absent absent)
 
 std::unique_ptr<Blobs> openBlobs(const std::string &url)
 {
+    if (after(url, "s3:"))
+        return std::make_unique<S3Blobs>(s3::parseAddress(url));
     const auto path = after(url, directory);
     if (!path || path->empty())
         refuse("blobs", url, blobForms);

@@ -12,7 +12,7 @@
 namespace pelliko::server
 {
 
-/// Where the server's data are: `sqlite:PATH` or `postgresql://…`, and `dir:PATH`.
+/// Where the server's data are: `sqlite:PATH` or `postgresql://…`, and `dir:PATH` or `s3://…`.
 struct StoreUrls {
     std::string metadata;
     std::string blobs;

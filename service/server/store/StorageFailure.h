@@ -14,7 +14,9 @@ public:
         broken,
         full,
         /// Not to be reached, or too busy: the same call may succeed a little later.
-        unavailable
+        unavailable,
+        /// Bytes of an unfinished blob that it had taken are not there any more.
+        lost
     };
 
     StorageFailure(Kind kind, const std::string &what) : std::runtime_error(what), m_kind(kind) {}

@@ -24,6 +24,8 @@ struct ActiveWrite {
     std::uint64_t written = 0;
     /// The end of what may have been noted as durable; nothing before it is dropped.
     std::uint64_t kept = 0;
+    /// The end of the whole file.
+    std::uint64_t size = 0;
     /// What Peers gave for it, to be shown with every offset.
     std::int64_t right = 0;
 };

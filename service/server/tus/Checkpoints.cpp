@@ -8,6 +8,7 @@
 #include <boost/asio/this_coro.hpp>
 #include <boost/asio/use_awaitable.hpp>
 
+#include <algorithm>
 #include <exception>
 #include <utility>
 
@@ -24,6 +25,15 @@ constexpr std::uint64_t leastStep = 8 * 1024 * 1024;
 /// network; a piece of up to a MiB may come on top.
 constexpr std::uint64_t mostUnnoted = 63 * 1024 * 1024;
 
+void noteOffset(Metadata &metadata, const ActiveWrite &write, std::uint64_t upTo)
+{
+    if (metadata.recordOffset(write.key, upTo, write.right))
+        return;
+    if (metadata.recordOffset(write.key, 0))
+        throw Refusal(Error::conflict, "Another request has taken over this upload.");
+    throw Refusal(Error::gone);
+}
+
 } // namespace
 
 struct Checkpoints::Running {
@@ -35,6 +45,7 @@ struct Checkpoints::Running {
     /// Never expires: cancelled to wake who waits for the end.
     asio::steady_timer done;
     bool ended = false;
+    std::uint64_t notedUpTo = 0;
     std::exception_ptr error;
 };
 
@@ -43,17 +54,28 @@ Task<void> checkpoint(Context &context, std::shared_ptr<ActiveWrite> write)
     if (!write->writer)
         co_return;
     const std::uint64_t upTo = write->kept = write->written;
-    bool wanted = true;
-    const bool noted = co_await context.pool.run([&] {
-        write->writer->sync();
-        const bool done = context.metadata.recordOffset(write->key, upTo, write->right);
-        wanted = done || context.metadata.recordOffset(write->key, 0);
-        return done;
+    co_await context.pool.run([&] {
+        if (upTo == write->size)
+            write->writer->finish();
+        else
+            write->writer->sync();
+        noteOffset(context.metadata, *write, upTo);
     });
-    if (!noted && wanted)
-        throw Refusal(Error::conflict, "Another request has taken over this upload.");
-    if (!noted)
-        throw Refusal(Error::gone);
+}
+
+/// A checkpoint while more is coming: as far as the store has got by itself.
+Task<void> Checkpoints::note(std::shared_ptr<Running> running)
+{
+    const std::shared_ptr<ActiveWrite> write = m_write;
+    const std::uint64_t written = write->written;
+    running->notedUpTo =
+        co_await m_context.pool.run([&] { return write->writer->settle(written); });
+    // The whole file is noted only when its blob is whole.
+    if (running->notedUpTo <= write->kept || running->notedUpTo >= write->size)
+        co_return;
+    write->kept = running->notedUpTo;
+    co_await m_context.pool.run(
+        [&] { noteOffset(m_context.metadata, *write, running->notedUpTo); });
 }
 
 Checkpoints::Checkpoints(Context &context, std::shared_ptr<ActiveWrite> write)
@@ -73,12 +95,11 @@ Task<void> Checkpoints::advance()
     m_begunUpTo = m_write->written;
     const auto executor = co_await asio::this_coro::executor;
     m_running = std::make_shared<Running>(executor);
-    asio::co_spawn(executor, checkpoint(m_context, m_write),
-                   [running = m_running](std::exception_ptr error) {
-                       running->error = std::move(error);
-                       running->ended = true;
-                       running->done.cancel();
-                   });
+    asio::co_spawn(executor, note(m_running), [running = m_running](std::exception_ptr error) {
+        running->error = std::move(error);
+        running->ended = true;
+        running->done.cancel();
+    });
 }
 
 Task<void> Checkpoints::finish()
@@ -90,7 +111,7 @@ Task<void> Checkpoints::finish()
         co_await running->done.async_wait(asio::as_tuple(asio::use_awaitable));
     if (running->error)
         std::rethrow_exception(running->error);
-    m_notedUpTo = m_begunUpTo;
+    m_notedUpTo = std::max(m_notedUpTo, running->notedUpTo);
 }
 
 } // namespace pelliko::server

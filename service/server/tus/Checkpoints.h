@@ -7,8 +7,9 @@
 namespace pelliko::server
 {
 
-/// Makes what was written so far durable and then notes the new offset. Refuses when the share
-/// ended meanwhile (gone), or another server has the upload now (conflict).
+/// Makes what was written so far durable, and the blob whole when that is all of it, and then notes
+/// the new offset. Refuses when the share ended meanwhile (gone), or another server has the upload
+/// now (conflict).
 Task<void> checkpoint(Context &context, std::shared_ptr<ActiveWrite> write);
 
 /// The checkpoints of one append, made while more of its body arrives, one at a time. Network
@@ -27,6 +28,8 @@ public:
 
 private:
     struct Running;
+
+    Task<void> note(std::shared_ptr<Running> running);
 
     Context &m_context;
     std::shared_ptr<ActiveWrite> m_write;

@@ -7,6 +7,7 @@
 #include "tus/TusHeaders.h"
 
 #include <algorithm>
+#include <cstdio>
 #include <exception>
 #include <utility>
 #include <vector>
@@ -26,9 +27,9 @@ Task<void> openWriter(Context &context, ActiveWrite &write)
         [&]() -> std::shared_ptr<BlobWriter> { return context.blobs.openForWriting(write.key); });
 }
 
-/// Copies the body into the blob, up to `end`.
+/// Copies the body into the blob, up to the end of the file.
 Task<void> copyBody(Exchange &exchange, Context &context, std::shared_ptr<ActiveWrite> write,
-                    std::uint64_t end, Checkpoints &checkpoints)
+                    Checkpoints &checkpoints)
 {
     if (exchange.request().bodyLength == 0)
         co_return;
@@ -36,7 +37,7 @@ Task<void> copyBody(Exchange &exchange, Context &context, std::shared_ptr<Active
     std::vector<char> buffer(bufferSize);
     std::uint64_t at = write->written;
     const BodyTaker store = [&](std::string_view piece) {
-        piece = piece.substr(0, end - at);
+        piece = piece.substr(0, write->size - at);
         write->writer->write(at, piece);
         at += piece.size();
     };
@@ -62,12 +63,12 @@ Task<void> copyBody(Exchange &exchange, Context &context, std::shared_ptr<Active
     }
 }
 
-bool isFull(const std::exception_ptr &ending)
+bool isFailure(const std::exception_ptr &ending, StorageFailure::Kind kind)
 {
     try {
         std::rethrow_exception(ending);
     } catch (const StorageFailure &failure) {
-        return failure.kind() == StorageFailure::Kind::full;
+        return failure.kind() == kind;
     } catch (...) {
         return false;
     }
@@ -97,6 +98,48 @@ void checkAppend(const Request &request, const UploadRecord &upload, std::uint64
         throw Refusal(Error::tooLarge, "The upload is longer than announced.");
 }
 
+/// Copies the body and makes durable what came of it, whatever ends it.
+Task<void> appendHeld(Exchange &exchange, Context &context, std::shared_ptr<ActiveWrite> write)
+{
+    Checkpoints checkpoints(context, write);
+    std::exception_ptr ending;
+    try {
+        co_await copyBody(exchange, context, write, checkpoints);
+    } catch (const std::exception &) {
+        ending = std::current_exception();
+    }
+    try {
+        co_await checkpoints.finish();
+    } catch (const std::exception &) {
+        ending = std::current_exception();
+    }
+    if (ending && isFailure(ending, StorageFailure::Kind::full))
+        co_await dropUnnoted(context, write);
+    co_await checkpoint(context, write);
+    if (ending)
+        rethrowEnding(ending);
+}
+
+/// The store does not have what it had taken: only the sender still has the file, and is told to
+/// send it from its beginning.
+Task<void> beginAgain(Context &context, std::int64_t account, std::string upload,
+                      std::exception_ptr failure)
+{
+    try {
+        std::rethrow_exception(failure);
+    } catch (const std::exception &error) {
+        std::fprintf(stderr, "pelliko-server: an upload begins again: %s\n", error.what());
+    }
+    const Seconds now = context.now();
+    const bool begun = co_await context.pool.run(
+        [&] { return context.metadata.resetUpload(account, upload, now); });
+    if (!begun)
+        throw Refusal(Error::gone);
+    context.peers.wakeSweeper();
+    throw Refusal(Error::conflict, "The store has lost bytes of the upload: it begins again.",
+                  {{"Upload-Offset", "0"}});
+}
+
 } // namespace
 
 Task<UploadRecord> findWantedUpload(Context &context, std::int64_t account, std::string upload)
@@ -124,23 +167,17 @@ Task<std::uint64_t> appendBody(Exchange &exchange, Context &context, std::int64_
     checkAppend(exchange.request(), current, offset);
     const std::shared_ptr<ActiveWrite> &write = lease.write();
     write->written = write->kept = offset;
-    Checkpoints checkpoints(context, write);
-    std::exception_ptr ending;
+    write->size = current.file.size;
+    std::exception_ptr failure;
     try {
-        co_await copyBody(exchange, context, write, current.file.size, checkpoints);
+        co_await appendHeld(exchange, context, write);
     } catch (const std::exception &) {
-        ending = std::current_exception();
+        failure = std::current_exception();
     }
-    try {
-        co_await checkpoints.finish();
-    } catch (const std::exception &) {
-        ending = std::current_exception();
-    }
-    if (ending && isFull(ending))
-        co_await dropUnnoted(context, write);
-    co_await checkpoint(context, write);
-    if (ending)
-        rethrowEnding(ending);
+    if (failure && isFailure(failure, StorageFailure::Kind::lost))
+        co_await beginAgain(context, account, upload, failure);
+    if (failure)
+        std::rethrow_exception(failure);
     co_return write->written;
 }
 

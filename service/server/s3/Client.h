@@ -1,0 +1,96 @@
+#pragma once
+
+#include "s3/Address.h"
+#include "s3/Answers.h"
+#include "s3/Wire.h"
+
+#include <cstdint>
+#include <memory>
+#include <optional>
+#include <string>
+#include <vector>
+
+namespace pelliko::server::s3
+{
+
+/// The calls of an S3 store. Names of objects are without the address's prefix. Each call is
+/// repeated with growing pauses as long as the store is away, busy or failing, for some seconds;
+/// then, and for every refusal that another try would not change, it throws StorageFailure. Each
+/// body that is sent is hashed and the store refuses one that arrives changed. Thread-safe.
+class Client
+{
+public:
+    /// Throws std::runtime_error when there are no credentials.
+    explicit Client(Address address);
+
+    /// What the store has said to a call.
+    struct Answer {
+        WireAnswer wire;
+        std::string errorCode;
+
+        [[nodiscard]] bool good() const { return wire.status < 300 && errorCode.empty(); }
+    };
+
+    /// A body that is read in pieces.
+    struct Stream {
+        std::shared_ptr<Wire> wire = {};
+        /// The size of the whole object.
+        std::uint64_t size = 0;
+        std::string etag = {};
+    };
+
+    void put(const std::string &name, std::string_view bytes);
+    /// Size of the object; nothing when there is none.
+    std::optional<std::uint64_t> sizeOf(const std::string &name);
+    /// Begins to read at `offset`, up to `most` bytes (0: to the end); nothing when there is no
+    /// such object, or, with `etag`, when it is another one now.
+    std::optional<Stream> read(const std::string &name, std::uint64_t offset, std::uint64_t most,
+                               const std::string &etag = {});
+    /// Exactly these bytes.
+    std::string get(const std::string &name, std::uint64_t offset, std::uint64_t length);
+    void remove(const std::string &name);
+    std::vector<Object> objects(const std::string &namesBeginWith);
+
+    OpenUpload beginUpload(const std::string &name);
+    std::vector<OpenUpload> openUploads(const std::string &namesBeginWith);
+    /// In the order of their numbers; nothing for an upload that is not open.
+    std::vector<Part> parts(const OpenUpload &upload);
+    Part putPart(const OpenUpload &upload, int number, std::string_view bytes);
+    Part copyPart(const OpenUpload &upload, int number, const std::string &from,
+                  std::uint64_t offset, std::uint64_t length);
+    /// `size` is that of the whole: an object of that size and of as many parts counts as the one
+    /// that an answer was lost of.
+    void completeUpload(const OpenUpload &upload, const std::vector<Part> &parts,
+                        std::uint64_t size);
+    void abortUpload(const OpenUpload &upload);
+
+    /// An address that everybody may get the object from.
+    std::string presigned(const std::string &name, long seconds, const std::string &disposition,
+                          const std::string &type) const;
+
+    [[nodiscard]] const Address &address() const { return m_address; }
+
+private:
+    struct Call {
+        std::string method;
+        /// Without the prefix; empty for the bucket itself.
+        std::string name = {};
+        Pairs query = {};
+        Pairs headers = {};
+        std::string_view body = {};
+        bool ofBucket = false;
+        bool streamed = false;
+    };
+
+    WireRequest prepare(const Call &call, const std::string &payloadHash) const;
+    Signable signable(const Call &call) const;
+    Answer ask(const Call &call, std::shared_ptr<Wire> wire = nullptr);
+    Answer askOnce(const Call &call, const std::string &payloadHash, Wire &wire) const;
+    Answer need(const Call &call);
+
+    Address m_address;
+    Credentials m_credentials;
+    std::shared_ptr<Wires> m_wires;
+};
+
+} // namespace pelliko::server::s3

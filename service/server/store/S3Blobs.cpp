@@ -1,0 +1,141 @@
+#include "store/S3Blobs.h"
+
+#include "store/S3Reader.h"
+#include "store/S3Writing.h"
+#include "store/StorageFailure.h"
+#include "text/Secrets.h"
+
+#include <algorithm>
+#include <map>
+#include <mutex>
+#include <set>
+#include <utility>
+
+namespace pelliko::server
+{
+namespace
+{
+
+/// Most of a call's time is the store's: more of them may wait than for a disk.
+constexpr std::size_t atOnce = 48;
+/// The longest that a signature holds.
+constexpr std::int64_t longestVisit = 604800;
+/// A part that was on its way may come after the end of its upload.
+constexpr int mostAborts = 5;
+
+class S3Writer final : public BlobWriter
+{
+public:
+    explicit S3Writer(std::shared_ptr<S3Writing> writing) : m_writing(std::move(writing)) {}
+
+    void write(std::uint64_t offset, std::string_view bytes) override
+    {
+        m_writing->write(offset, bytes);
+    }
+    void truncate(std::uint64_t size) override { m_writing->truncate(size); }
+    void sync() override { m_writing->sync(); }
+    std::uint64_t settle(std::uint64_t) override { return m_writing->settle(); }
+    void finish() override { m_writing->finish(); }
+
+private:
+    std::shared_ptr<S3Writing> m_writing;
+};
+
+void checkKey(const std::string &key)
+{
+    if (!looksLikeToken(key))
+        throw StorageFailure(StorageFailure::Kind::broken, "not a blob's key");
+}
+
+} // namespace
+
+struct S3Blobs::State {
+    explicit State(s3::Address address) : client(std::move(address)) {}
+
+    std::shared_ptr<S3Writing> writingOf(const std::string &key);
+
+    s3::Client client;
+    // Goes before the client: its threads still use that.
+    S3Couriers couriers;
+    std::mutex mutex;
+    /// Blobs that this process is writing.
+    std::map<std::string, std::weak_ptr<S3Writing>> writings;
+};
+
+std::shared_ptr<S3Writing> S3Blobs::State::writingOf(const std::string &key)
+{
+    const std::lock_guard lock(mutex);
+    const auto found = writings.find(key);
+    return found == writings.end() ? nullptr : found->second.lock();
+}
+
+S3Blobs::S3Blobs(s3::Address address) : m_state(std::make_unique<State>(std::move(address))) {}
+
+S3Blobs::~S3Blobs() = default;
+
+std::size_t S3Blobs::callsAtOnce() const
+{
+    return atOnce;
+}
+
+std::unique_ptr<BlobWriter> S3Blobs::openForWriting(const std::string &key)
+{
+    checkKey(key);
+    auto writing = std::make_shared<S3Writing>(m_state->client, m_state->couriers, key);
+    const std::lock_guard lock(m_state->mutex);
+    std::erase_if(m_state->writings, [](const auto &entry) { return entry.second.expired(); });
+    m_state->writings[key] = writing;
+    return std::make_unique<S3Writer>(std::move(writing));
+}
+
+std::unique_ptr<BlobReader> S3Blobs::openForReading(const std::string &key)
+{
+    checkKey(key);
+    auto writing = m_state->writingOf(key);
+    if (writing)
+        writing->finish();
+    if (auto reader = S3Reader::open(m_state->client, key))
+        return reader;
+    // Whoever wrote it ended before it was made whole: what is there is the blob.
+    writing = std::make_shared<S3Writing>(m_state->client, m_state->couriers, key);
+    if (!writing->exists())
+        return nullptr;
+    writing->finish();
+    return S3Reader::open(m_state->client, key);
+}
+
+std::vector<std::string> S3Blobs::keys()
+{
+    std::set<std::string> found;
+    for (const s3::Object &object : m_state->client.objects(""))
+        found.insert(s3KeyOf(object.name));
+    for (const s3::OpenUpload &upload : m_state->client.openUploads(""))
+        found.insert(s3KeyOf(upload.name));
+    // What is named otherwise was put there by somebody else.
+    found.erase("");
+    return {found.begin(), found.end()};
+}
+
+void S3Blobs::remove(const std::string &key)
+{
+    checkKey(key);
+    auto uploads = m_state->client.openUploads(key);
+    for (int aborts = 0; !uploads.empty() && aborts < mostAborts; ++aborts) {
+        for (const s3::OpenUpload &upload : uploads)
+            m_state->client.abortUpload(upload);
+        uploads = m_state->client.openUploads(key);
+    }
+    for (const s3::Object &object : m_state->client.objects(key))
+        m_state->client.remove(object.name);
+}
+
+std::optional<std::string> S3Blobs::addressOf(const std::string &key, const BlobVisit &visit)
+{
+    checkKey(key);
+    if (!m_state->client.address().redirect || visit.seconds <= 0)
+        return std::nullopt;
+    return m_state->client.presigned(key, std::min(visit.seconds, longestVisit), visit.disposition,
+                                     visit.type);
+}
+
+} // namespace pelliko::server
