@@ -21,7 +21,8 @@ PUBLIC_NAMES = {"ITapiNetwork.h", "ITapiSim.h", "WApp.h", "WWindowController.h"}
 
 # Beginning of the include, the files that may have it, and what to use instead.
 LIBRARIES = [
-    ("curl/", ["service/pelliko-service/Curl*", "service/korrin/Curl*"], "transfers go through CurlTransfer or CurlPost"),
+    ("curl/", ["service/pelliko-service/Curl*", "service/korrin/Curl*", "service/server/s3/Wire.cpp"],
+     "transfers go through CurlTransfer, CurlPost or Wire"),
     ("sqlite3.h", ["src/PellikoDatabaseManager/*", "platform/contacts/Database.cpp",
                    "platform/quickpanel/Store.cpp", "platform/preference/PreferenceStore.cpp",
                    "service/pelliko-service/QueueFile.cpp", "service/server/store/*"],

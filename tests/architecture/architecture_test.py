@@ -145,7 +145,7 @@ class Architecture(unittest.TestCase):
                                              "#include <boost/asio.hpp>\n")
         self.append("src/Log/Log.cpp", "#include <SQLiteCpp/Database.h>\n")
         self.assert_found(
-            "platform/app/Pump.cpp includes curl/curl.h: transfers go through CurlTransfer or CurlPost",
+            "platform/app/Pump.cpp includes curl/curl.h: transfers go through CurlTransfer, CurlPost or Wire",
             "platform/app/Pump.cpp includes sqlite3.h: only the files that own a table know SQLite",
             "platform/app/Pump.cpp includes boost/asio.hpp: Boost is for the share server",
             "src/Log/Log.cpp includes SQLiteCpp/Database.h: the application uses SQLite's own "
