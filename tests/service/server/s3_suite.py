@@ -33,9 +33,10 @@ class S3Case(ServerCase):
         self.proxy = StoreProxy(STORE)
         self.addCleanup(self.proxy.close)
         self.prefix = self.id().rsplit(".", 1)[1]
-        self.options = ["--blobs",
-                        f"s3://127.0.0.1:{self.proxy.port}/{BUCKET}/{self.prefix}?tls=off{self.store_options}"]
         super().setUp()
+
+    def other_stores(self):
+        return ["--blobs", f"s3://127.0.0.1:{self.proxy.port}/{BUCKET}/{self.prefix}?tls=off{self.store_options}"]
 
     # The store, seen from outside
 
