@@ -1,8 +1,6 @@
 #include "Field.h"
 
-#include "AccessibleName.h"
 #include "CText.h"
-#include "Language.h"
 #include "Theme.h"
 #include "Widgets.h"
 
@@ -54,7 +52,7 @@ Field addField(Evas_Object *box, const char *name, const char *guide,
     elm_entry_prediction_allow_set(field.entry, EINA_FALSE);
     elm_entry_input_panel_layout_set(field.entry, keyboard);
     elm_object_part_text_set(field.entry, "elm.guide", guide);
-    setAccessibleName(field.entry, translated(name));
+    setTranslatedName(field.entry, name);
     elm_object_scale_set(field.entry, entryScale);
     evas_object_event_callback_add(field.entry, EVAS_CALLBACK_MOUSE_UP, focusPressed, nullptr);
     append(box, withLeastHeight(box, field.entry));

@@ -8,10 +8,13 @@
 #include <vconf-keys.h>
 #include <vconf.h>
 
+#include <algorithm>
+#include <array>
 #include <clocale>
 #include <cstdlib>
 #include <cstring>
 #include <libintl.h>
+#include <string_view>
 
 namespace pelliko::companion
 {
@@ -30,17 +33,13 @@ Language &language()
     return kept;
 }
 
-// The session's own language, for a locale that is not installed. A wish in LANGUAGE goes before
-// it.
-void nameLanguageOfSession()
+// Written from right to left, by what a locale begins with.
+bool isRightToLeft(const std::string &language)
 {
-    for (const char *variable : {"LC_ALL", "LC_MESSAGES", "LANG"}) {
-        const char *value = getenv(variable);
-        if (!value || !*value)
-            continue;
-        setenv("LANGUAGE", (std::string(value) + ":en").c_str(), 0);
-        return;
-    }
+    constexpr std::array<std::string_view, 7> languages{"ar", "fa", "he", "iw", "ps", "ur", "yi"};
+    const std::string_view begin =
+        std::string_view(language).substr(0, language.find_first_of("_.@"));
+    return std::find(languages.begin(), languages.end(), begin) != languages.end();
 }
 
 // Message catalogues are looked up by LANGUAGE as soon as the locale is any but "C".
@@ -52,12 +51,11 @@ void applyLanguage()
         setenv("LANGUAGE", (std::string(name.get()) + ":en").c_str(), 1);
     }
     const char *locale = setlocale(LC_ALL, "");
-    if (!locale || std::strcmp(setlocale(LC_MESSAGES, nullptr), "C") == 0) {
-        if (!name)
-            nameLanguageOfSession();
+    if (!locale || std::strcmp(setlocale(LC_MESSAGES, nullptr), "C") == 0)
         setlocale(LC_ALL, "C.UTF-8");
-    }
     elm_language_set(name ? name.get() : "");
+    // The toolkit would ask its own catalogue, which knows only installed locales.
+    elm_config_mirrored_set(name && isRightToLeft(name.get()) ? EINA_TRUE : EINA_FALSE);
 }
 
 void onLanguage(app_event_info_h, void *)

@@ -2,6 +2,7 @@
 
 #include "AccessibleName.h"
 #include "Icons.h"
+#include "Theme.h"
 #include "Widgets.h"
 
 namespace pelliko::companion
@@ -9,13 +10,18 @@ namespace pelliko::companion
 namespace
 {
 
+constexpr int iconSize = 40;
+
+// No widget of the toolkit: a control that holds one is told to assistive programs as one that the
+// keyboard cannot act on.
 void addIcon(Evas_Object *row, const char *name)
 {
     const std::string file = iconFile(name);
     if (file.empty())
         return;
-    Evas_Object *icon = elm_image_add(row);
-    elm_image_file_set(icon, file.c_str(), nullptr);
+    Evas_Object *icon = evas_object_image_filled_add(evas_object_evas_get(row));
+    evas_object_image_load_size_set(icon, scaled(iconSize), scaled(iconSize));
+    evas_object_image_file_set(icon, file.c_str(), nullptr);
     elm_object_part_content_set(row, "icon", icon);
 }
 

@@ -68,7 +68,30 @@ Evas_Object *addColumn(Evas_Object *window, Evas_Object *middle, double align)
     return column;
 }
 
+void nameAgain(void *text, Evas_Object *object, void *)
+{
+    setAccessibleName(object, translated(static_cast<const char *>(text)));
+}
+
+void titleAgain(void *title, Evas_Object *window, void *)
+{
+    elm_win_title_set(window, translated(static_cast<const char *>(title)));
+}
+
+// Called with a literal, now and whenever the toolkit says that the language is another.
+void sayInEveryLanguage(Evas_Object *object, const char *text, Evas_Smart_Cb say)
+{
+    void *data = const_cast<char *>(text);
+    say(data, object, nullptr);
+    evas_object_smart_callback_add(object, "language,changed", say, data);
+}
+
 } // namespace
+
+void setTranslatedName(Evas_Object *object, const char *text)
+{
+    sayInEveryLanguage(object, text, nameAgain);
+}
 
 void append(Evas_Object *box, Evas_Object *part)
 {
@@ -139,7 +162,7 @@ Evas_Object *addProgress(Evas_Object *box, const char *name)
 {
     Evas_Object *progress = elm_progressbar_add(box);
     elm_progressbar_pulse_set(progress, EINA_TRUE);
-    setAccessibleName(progress, translated(name));
+    setTranslatedName(progress, name);
     append(box, progress);
     evas_object_hide(progress);
     return progress;
@@ -149,7 +172,7 @@ Evas_Object *addBar(Evas_Object *box, const char *name)
 {
     Evas_Object *bar = elm_progressbar_add(box);
     elm_object_style_set(bar, "companion");
-    setAccessibleName(bar, name);
+    setTranslatedName(bar, name);
     append(box, bar);
     return bar;
 }
@@ -167,7 +190,7 @@ Page addPage(const char *name, const char *title, double align)
 {
     Page page;
     page.window = elm_win_add(nullptr, name, ELM_WIN_BASIC);
-    elm_win_title_set(page.window, translated(title));
+    sayInEveryLanguage(page.window, title, titleAgain);
     elm_win_focus_highlight_enabled_set(page.window, EINA_TRUE);
     elm_win_focus_highlight_style_set(page.window, "companion");
     addGround(page.window);

@@ -30,13 +30,17 @@ Evas_Object *addButton(Evas_Object *box, const char *style, const char *text, Ev
 /// A row whose parts share its width.
 Evas_Object *addRow(Evas_Object *box);
 
+/// What assistive programs call a control, now and at every change of the language.
+/// @param text English, a literal
+void setTranslatedName(Evas_Object *object, const char *text);
+
 /// Moves while something is waited for; hidden at first.
-/// @param name what assistive programs call it
+/// @param name as of setTranslatedName()
 Evas_Object *addProgress(Evas_Object *box, const char *name);
 void setBusy(Evas_Object *progress, bool busy);
 
 /// A bar that shows how far something is, 0.0 to 1.0 (elm_progressbar_value_set()).
-/// @param name what assistive programs call it
+/// @param name as of setTranslatedName()
 Evas_Object *addBar(Evas_Object *box, const char *name);
 
 /// A window with one column of parts that scrolls when it is too long and is never wider than is
@@ -48,7 +52,7 @@ struct Page {
 };
 
 /// @param name of the window for the desktop
-/// @param title English; translated now
+/// @param title English, a literal; translated now and at every change of the language
 /// @param align where a short column stands: 0.0 top, 0.5 in the middle
 Page addPage(const char *name, const char *title, double align = 0.5);
 

@@ -23,7 +23,7 @@ FormPage::FormPage(const Page &page, const Typed &proposal, Wishes wishes)
                        ELM_INPUT_PANEL_LAYOUT_PHONENUMBER);
     code_ = addField(page.column, mark("Invitation code"), "", ELM_INPUT_PANEL_LAYOUT_NORMAL);
     message_ = addText(page.column, "error", "");
-    progress_ = addProgress(page.column, translated(mark("Please wait")));
+    progress_ = addProgress(page.column, mark("Please wait"));
     Evas_Object *row = addRow(page.column);
     addButton(row, "popup", mark("Cancel"), onCancel, this);
     submit_ = addButton(row, "popup/primary", mark("Sign in"), onSubmit, this);

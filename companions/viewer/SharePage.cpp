@@ -55,9 +55,9 @@ void SharePage::showActions(Actions actions)
     elm_box_clear(actions_);
     progress_ = first_ = nullptr;
     if (actions == Actions::waiting)
-        setBusy(addProgress(actions_, translated(mark("Progress"))), true);
+        setBusy(addProgress(actions_, mark("Progress")), true);
     if (actions == Actions::cancel)
-        progress_ = addBar(actions_, translated(mark("Progress")));
+        progress_ = addBar(actions_, mark("Progress"));
     if (actions == Actions::tryAgain)
         addAction("popup/primary", mark("Try again"), onTryAgain);
     if (actions == Actions::save)

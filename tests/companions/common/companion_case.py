@@ -60,5 +60,11 @@ class CompanionCase(unittest.TestCase):
         prefix = "" if size == "480x800" else size + "-"
         screen.screenshot(os.path.join(SEEN, f"{prefix}{self.program.split('.')[-1]}-{name}.png"))
 
+    def enlarge(self, scale="2.0"):
+        """Programs that are started from now on in this case are as large as for somebody who sees little."""
+        usual = os.environ.get("ELM_SCALE", "1.0")
+        world.activation_environment(ELM_SCALE=scale)
+        self.addCleanup(world.activation_environment, ELM_SCALE=usual)
+
     def language(self, name):
         subprocess.run([SETTER, "--text", "db/menu_widget/language", name], check=True)

@@ -8,6 +8,7 @@ sys.path.insert(0, os.path.join(os.path.dirname(os.path.abspath(__file__)), ".."
 
 import companion_case  # noqa: E402
 import doubles  # noqa: E402
+import reach  # noqa: E402
 import screen  # noqa: E402
 import world  # noqa: E402
 
@@ -218,6 +219,28 @@ class Launches(HistoryCase):
         self.see("Zurückziehen", "button")
         self.see(ANN + ", Sieht es in Pelliko")
         self.picture("german")
+
+    def test_who_sees_little_reaches_everything(self):
+        self.service.sent = [self.available(), doubles.sent(8, doubles.PAUSED, [(BO, self.bo, doubles.SMS)])]
+        self.enlarge()
+        self.launch()
+        self.row("Bo Example")
+        screen.wait_active("pelliko-history")
+        screen.wait_still()
+        reach.expect_all_named_and_reached(self)
+        reach.expect_within(self, 480)
+        self.language("ar_EG.UTF-8")
+        self.addCleanup(self.language, "en_GB.UTF-8")
+        self.see("المرسلة، معروضة", "button")
+        screen.wait_still()
+        reach.expect_mirrored(self)
+        reach.expect_within(self, 480)
+        self.picture("large-arabic")
+        self.open_row("Ann Example")
+        self.see("سحب", "button")
+        screen.wait_still()
+        reach.expect_all_named_and_reached(self)
+        self.picture("large-arabic-share")
 
     def test_the_keyboard_is_enough(self):
         self.service.sent = [self.available()]

@@ -15,6 +15,7 @@ sys.path.insert(0, os.path.join(HERE, "..", "common"))
 sys.dont_write_bytecode = True
 
 import presses  # noqa: E402
+import reach  # noqa: E402
 import screen  # noqa: E402
 import tls_server  # noqa: E402
 import world  # noqa: E402
@@ -357,10 +358,25 @@ class ByItself(SignInCase):
             screen.key("Escape")
             self.assertEqual(0, self.program.wait(world.LIMIT))
 
-    def test_speaks_german(self):
+    def speak(self, language):
         setter = os.path.join(os.environ["PELLIKO_BUILD"], "tests", "key-setter")
-        subprocess.run([setter, "--text", "db/menu_widget/language", "de_DE.UTF-8"], check=True)
+        subprocess.run([setter, "--text", "db/menu_widget/language", language], check=True)
         self.addCleanup(subprocess.run, [setter, "--text", "db/menu_widget/language", "en_GB.UTF-8"], check=True)
+
+    def test_who_sees_little_reaches_everything(self):
+        self.start(ELM_SCALE="2.0")
+        screen.wait_active(WINDOW)
+        screen.wait_still()
+        reach.expect_all_named_and_reached(self, "Cancel", "Sign in")
+        self.speak("ar_EG.UTF-8")
+        screen.wait_for_control("رقم هاتفك", "entry")
+        screen.wait_for_control("حساب Pelliko", "window")
+        screen.wait_still()
+        reach.expect_within(self, 480)
+        self.picture("large-arabic")
+
+    def test_speaks_german(self):
+        self.speak("de_DE.UTF-8")
         self.start()
         screen.wait_active(WINDOW)
         self.picture("german")

@@ -9,6 +9,7 @@ sys.path.insert(0, os.path.join(os.path.dirname(os.path.abspath(__file__)), ".."
 
 import companion_case  # noqa: E402
 import doubles  # noqa: E402
+import reach  # noqa: E402
 import presses  # noqa: E402
 import screen  # noqa: E402
 import world  # noqa: E402
@@ -228,6 +229,20 @@ class SavingFiles(ViewerCase):
             screen.key(name)
         world.wait_for(lambda: [call[2] for call in self.service.calls if call[0] == "download"] == [0, 0],
                        "the first file to be saved by the keyboard")
+
+    def test_who_sees_little_reaches_everything(self):
+        self.enlarge()
+        self.open()
+        self.see("Save all", "button")
+        screen.wait_active("pelliko-viewer")
+        screen.wait_still()
+        reach.expect_all_named_and_reached(self)
+        self.language("ar_EG.UTF-8")
+        self.addCleanup(self.language, "en_GB.UTF-8")
+        self.see("حفظ الكل", "button")
+        screen.wait_still()
+        reach.expect_within(self, 480)
+        self.picture("large-arabic")
 
     def test_it_speaks_german_and_changes_while_it_saves(self):
         self.open()
