@@ -1,9 +1,11 @@
 #include "store/PostgresConnection.h"
 
 #include <libpq-fe.h>
+#include <poll.h>
 
 #include <algorithm>
 #include <array>
+#include <cerrno>
 #include <charconv>
 #include <cstring>
 #include <string_view>
@@ -24,13 +26,15 @@ constexpr std::uint32_t typeText = 25;
 constexpr std::uint32_t typeTextArray = 1009;
 constexpr std::uint32_t typeBigintArray = 1016;
 
+/// Beyond what the database itself grants a statement: it hangs, or somebody in between does.
+constexpr std::chrono::seconds answersPatience{13};
 /// A statement that takes longer waits for something that will not come; its request is told to
 /// come again. A peer that is silent for the connection's own limits is taken for dead.
 constexpr const char *sessionSettings = "SET client_min_messages = warning;"
                                         "SET client_encoding = 'UTF8';"
-                                        "SET statement_timeout = '15s';"
-                                        "SET lock_timeout = '10s';"
-                                        "SET idle_in_transaction_session_timeout = '20s';"
+                                        "SET statement_timeout = '10s';"
+                                        "SET lock_timeout = '8s';"
+                                        "SET idle_in_transaction_session_timeout = '15s';"
                                         "SET standard_conforming_strings = on";
 
 std::string firstLineOf(const char *message)
@@ -169,6 +173,7 @@ PostgresConnection::PostgresConnection(const std::string &url)
     if (!isAlive())
         throw PostgresFailure(Kind::unavailable, Remedy::none,
                               "metadata: " + firstLineOf(PQerrorMessage(get())));
+    m_patience = answersPatience;
     PQsetNoticeProcessor(
         get(), [](void *, const char *) {}, nullptr);
     command(sessionSettings);
@@ -178,7 +183,45 @@ PostgresConnection::~PostgresConnection() = default;
 
 bool PostgresConnection::isAlive() const
 {
-    return PQstatus(get()) == CONNECTION_OK;
+    return !m_isSilent && PQstatus(get()) == CONNECTION_OK;
+}
+
+/// Waits until the database has sent something; false when it has not in time.
+bool PostgresConnection::awaitInput()
+{
+    pollfd wait{PQsocket(get()), POLLIN, 0};
+    const int patience = m_patience ? static_cast<int>(m_patience->count()) : -1;
+    int ready = -1;
+    while (ready < 0) {
+        ready = ::poll(&wait, 1, patience);
+        if (ready < 0 && errno != EINTR)
+            return false;
+    }
+    return ready > 0;
+}
+
+/// The last of the answers to what was sent, or the first that is a refusal.
+PostgresRows PostgresConnection::answer(int sent)
+{
+    std::unique_ptr<pg_result, void (*)(pg_result *)> last(nullptr, PQclear);
+    while (sent != 0) {
+        while (PQisBusy(get()) != 0) {
+            m_isSilent = m_isSilent || !awaitInput();
+            if (m_isSilent)
+                throw PostgresFailure(Kind::unavailable, Remedy::reconnect,
+                                      "metadata: the database does not answer");
+            if (PQconsumeInput(get()) == 0)
+                break;
+        }
+        pg_result *result = PQgetResult(get());
+        if (result == nullptr)
+            break;
+        if (last && PQresultStatus(last.get()) == PGRES_FATAL_ERROR)
+            PQclear(result);
+        else
+            last.reset(result);
+    }
+    return checked(last.release());
 }
 
 PostgresRows PostgresConnection::checked(pg_result *result)
@@ -198,7 +241,7 @@ PostgresRows PostgresConnection::checked(pg_result *result)
 
 PostgresRows PostgresConnection::command(const std::string &sql)
 {
-    return checked(PQexec(get(), sql.c_str()));
+    return answer(PQsendQuery(get(), sql.c_str()));
 }
 
 const std::string &PostgresConnection::prepared(const char *sql, const PostgresValues &values)
@@ -210,7 +253,7 @@ const std::string &PostgresConnection::prepared(const char *sql, const PostgresV
     for (const PostgresValues::Value &value : values.m_values)
         types.push_back(value.type);
     std::string name = "s" + std::to_string(m_statements.size());
-    checked(PQprepare(get(), name.c_str(), sql, static_cast<int>(types.size()), types.data()));
+    answer(PQsendPrepare(get(), name.c_str(), sql, static_cast<int>(types.size()), types.data()));
     return m_statements.emplace(sql, std::move(name)).first->second;
 }
 
@@ -225,8 +268,8 @@ PostgresRows PostgresConnection::run(const char *sql, const PostgresValues &valu
         lengths.push_back(static_cast<int>(value.data.size()));
         formats.push_back(value.isBinary ? 1 : 0);
     }
-    return checked(PQexecPrepared(get(), name.c_str(), static_cast<int>(data.size()), data.data(),
-                                  lengths.data(), formats.data(), 0));
+    return answer(PQsendQueryPrepared(get(), name.c_str(), static_cast<int>(data.size()),
+                                      data.data(), lengths.data(), formats.data(), 0));
 }
 
 } // namespace pelliko::server

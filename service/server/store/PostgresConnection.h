@@ -3,6 +3,7 @@
 #include "store/Bytes.h"
 #include "store/StorageFailure.h"
 
+#include <chrono>
 #include <cstdint>
 #include <memory>
 #include <optional>
@@ -117,6 +118,9 @@ public:
     /// Runs commands without values; returns the last one's rows.
     PostgresRows command(const std::string &sql);
 
+    /// From here on an answer is waited for as long as it takes.
+    void waitForever() { m_patience.reset(); }
+
     /// False once the session has ended.
     [[nodiscard]] bool isAlive() const;
 
@@ -129,9 +133,14 @@ private:
     };
     PostgresRows run(const char *sql, const PostgresValues &values);
     const std::string &prepared(const char *sql, const PostgresValues &values);
+    PostgresRows answer(int sent);
+    bool awaitInput();
     PostgresRows checked(pg_result *result);
 
     std::unique_ptr<pg_conn, Finish> m_connection;
+    std::optional<std::chrono::milliseconds> m_patience;
+    /// Something that was asked was never answered: whatever came now would belong to it.
+    bool m_isSilent = false;
     std::unordered_map<const char *, std::string> m_statements;
 };
 

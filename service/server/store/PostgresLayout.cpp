@@ -131,6 +131,7 @@ void goAllTheWay(PostgresConnection &db)
 
 void migrate(PostgresConnection &db)
 {
+    db.waitForever();
     db.command("BEGIN");
     goAllTheWay(db);
     db.command("COMMIT");

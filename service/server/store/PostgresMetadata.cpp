@@ -11,7 +11,8 @@ PostgresMetadata::PostgresMetadata(const std::string &url, std::size_t connectio
     : m_pool(std::make_unique<PostgresPool>(url, connections)),
       m_clock(std::make_shared<PostgresClock>())
 {
-    m_pool->single([](PostgresConnection &db) { migrate(db); });
+    PostgresConnection first(url);
+    migrate(first);
     m_pool->single([this](PostgresConnection &db) { m_clock->set(db); });
 }
 

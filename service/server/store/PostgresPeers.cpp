@@ -194,7 +194,8 @@ void PostgresPeers::Thread::connect()
 {
     auto session = std::make_unique<PostgresConnection>(m_url);
     // Who writes a blob is forgotten with the sessions when the database falls.
-    session->command("SET synchronous_commit = off; LISTEN " PELLIKO_CHANNEL);
+    session->command(
+        "SET synchronous_commit = off; SET lock_timeout = '2s'; LISTEN " PELLIKO_CHANNEL);
     auto election = std::make_unique<PostgresConnection>(m_url);
     election->command(waitForever);
     const std::string lock = "SELECT pg_advisory_lock(" + std::to_string(lockGroup) + ", " +

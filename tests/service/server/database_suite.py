@@ -31,6 +31,16 @@ class Restarts(ClusterCase):
         self.assertEqual(self.get(link + "/0").body, b"12345")
         self.make_finished(b"abc")
 
+    def test_a_database_that_is_silent_is_given_up_and_found_again(self):
+        share, _ = self.make_finished(b"12345")
+        self.engine.signal_all(signal.SIGSTOP)
+        try:
+            self.assert_refused(self.request("GET", "/api/v1/shares/" + share["share"]), 503, "unavailable")
+        finally:
+            self.engine.signal_all(signal.SIGCONT)
+        self.assertEqual(self.when_back("GET", "/api/v1/account").json()["used_bytes"], 5)
+        self.make_finished(b"abc")
+
     def test_an_upload_goes_on_after_a_crash_of_the_database(self):
         content = os.urandom(4 * MIB)
         share = self.make_share(len(content))

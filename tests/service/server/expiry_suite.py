@@ -1,7 +1,6 @@
 """Ends of shares and of unfinished uploads, seen from outside."""
 
 import os
-import sqlite3
 import time
 
 from harness import ServerCase
@@ -37,8 +36,7 @@ class Expiry(WatchingCase):
     def test_what_expired_while_the_server_was_down_is_deleted_at_its_start(self):
         self.make_finished(b"12345")
         self.assertEqual(self.stop(), 0)
-        with sqlite3.connect(self.data + "/metadata.db") as metadata:
-            metadata.execute("UPDATE shares SET deadline = ?", [int(time.time()) - 1])
+        self.change_database(f"UPDATE shares SET deadline = {int(time.time()) - 1}")
         deletions = self.watch_blobs()
         self.start()
         deletions.wait(10)

@@ -6,11 +6,13 @@ import os
 import shutil
 import signal
 import socket
+import sqlite3
 import subprocess
 import tempfile
 import unittest
 
 PROGRAM = None  # set by http_test.py
+POSTGRES = os.environ.get("PELLIKO_POSTGRES")  # by scripts/with-postgres
 NUMBER = "+4915112345678"
 
 
@@ -42,7 +44,25 @@ class ServerCase(unittest.TestCase):
 
     def other_stores(self):
         """Options that say where the server's data are when not all of them in its directory; begins anew."""
-        return []
+        if POSTGRES is None:
+            return []
+        self.change_database("DROP SCHEMA public CASCADE; CREATE SCHEMA public")
+        return ["--metadata", POSTGRES]
+
+    def change_database(self, statement):
+        """Something that only time, or an older server, brings about."""
+        if POSTGRES is None:
+            with sqlite3.connect(self.data + "/metadata.db") as database:
+                database.execute(statement)
+        else:
+            subprocess.run(["psql", "-XqAt", "-d", POSTGRES, "-c", statement], check=True, stderr=subprocess.DEVNULL)
+
+    def whole_database(self):
+        """Everything that the stopped server has kept, but for the blobs."""
+        if POSTGRES is None:
+            with open(self.data + "/metadata.db", "rb") as file:
+                return file.read()
+        return subprocess.run(["pg_dump", "-d", POSTGRES], check=True, capture_output=True).stdout
 
     def run_account(self, command, *arguments, ok=True):
         done = subprocess.run([PROGRAM, "account", command, *self.stores, *arguments],

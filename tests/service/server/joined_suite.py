@@ -59,5 +59,4 @@ class Joined(ServerCase):
     def test_the_numbers_asked_for_are_not_kept(self):
         self.ask(["+15555550100"])
         self.assertEqual(self.stop(), 0)
-        with open(self.data + "/metadata.db", "rb") as file:
-            self.assertNotIn(b"+15555550100", file.read())
+        self.assertNotIn(b"+15555550100", self.whole_database())

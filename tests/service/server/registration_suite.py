@@ -2,7 +2,6 @@
 
 import json
 import os
-import sqlite3
 import threading
 
 from harness import NUMBER, ServerCase
@@ -59,8 +58,7 @@ class Registration(ServerCase):
 
     def test_an_expired_code_says_so(self):
         code = self.invite("--expires", "7d")
-        with sqlite3.connect(os.path.join(self.data, "metadata.db")) as database:
-            database.execute("UPDATE invitations SET expires = created")
+        self.change_database("UPDATE invitations SET expires = created")
         self.assert_refused(self.register("+4915199999999", code), 403, "code_expired")
 
     def test_a_lost_answer_is_asked_for_again(self):

@@ -81,8 +81,7 @@ class Shares(ServerCase):
     def test_secrets_are_not_in_the_directory(self):
         _, link = self.make_finished(b"12345")
         self.assertEqual(self.stop(), 0)
-        with open(self.data + "/metadata.db", "rb") as file:
-            stored = file.read()
+        stored = self.whole_database()
         self.assertIn(NUMBER.encode(), stored)
         self.assertNotIn(self.token.encode(), stored)
         self.assertNotIn(link[len("/s/"):].encode(), stored)
