@@ -50,6 +50,12 @@ function(pelliko_program name)
   endif()
 endfunction()
 
+# Where the system looks for configuration, which is /etc for what is installed below /usr/local too.
+set(pelliko_system_etc "${CMAKE_INSTALL_SYSCONFDIR}")
+if(CMAKE_INSTALL_PREFIX MATCHES "^/usr(/local)?/?$")
+  set(pelliko_system_etc /etc)
+endif()
+
 # Where programs look for their modules, seen from their own folder: the same in the build tree and installed.
 file(RELATIVE_PATH pelliko_module_dir "${CMAKE_INSTALL_FULL_BINDIR}" "${CMAKE_INSTALL_FULL_LIBDIR}/pelliko")
 
