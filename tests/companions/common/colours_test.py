@@ -7,7 +7,7 @@ import xml.etree.ElementTree as ElementTree
 
 SOURCE = pathlib.Path(__file__).resolve().parents[3]
 TABLE = SOURCE / "res" / "tables" / "com.velmora.pelliko_ChangeableColorTable.xml"
-LAYOUT = SOURCE / "companions" / "common" / "edje" / "companion.edc"
+LAYOUTS = SOURCE / "companions" / "common" / "edje"
 PAGE = "pelliko/card"  # what Widgets paints behind a page
 LEAST = 4.5
 
@@ -20,12 +20,13 @@ def palettes():
 
 def letters_and_grounds():
     """Pairs of classes: what is written, and what it is written on."""
-    layout = LAYOUT.read_text(encoding="utf-8")
+    layout = "".join(path.read_text(encoding="utf-8") for path in sorted(LAYOUTS.glob("*.edc")))
     pairs = {(letters, PAGE) for letters in re.findall(r'^   TEXT\("\w+", "\d+", "\w+", "([^"]+)"', layout, re.M)}
-    rows = re.findall(r'LINE\("[^"]+", "[^"]+", \d+, "\w+", "([^"]+)"\)', layout)
+    rows = re.findall(r'LINE\("[^"]+", "[^"]+", \d+, "\w+", "([^"]+)"', layout)
     pairs |= {(letters, ground) for letters in rows for ground in ("pelliko/row", "pelliko/row/pressed")}
     for kind in ("button", "primary"):
         pairs |= {(f"pelliko/{kind}/text", f"pelliko/{kind}{state}") for state in ("", "/pressed")}
+    pairs.add(("pelliko/person/text", "pelliko/person/1"))  # initials
     for letters in ("/fg/normal/entry/text", "/fg/normal/entry/text/guide"):
         pairs.add((letters, "/bg/normal/entry"))
     return pairs
@@ -45,7 +46,7 @@ def contrast(one, other):
 class Colours(unittest.TestCase):
     def test_letters_can_be_told_from_their_ground(self):
         pairs = letters_and_grounds()
-        self.assertGreaterEqual(len(pairs), 12)
+        self.assertGreaterEqual(len(pairs), 13)
         for name, colours in palettes().items():
             for letters, ground in sorted(pairs):
                 with self.subTest(f"{name}: {letters} on {ground}"):
