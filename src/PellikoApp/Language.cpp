@@ -68,9 +68,10 @@ bool _isBareLocale(const char *locale)
 // locale is not installed C.UTF-8 stands in: under it LANGUAGE chooses the catalogue.
 void _translateWithoutLocale(const char *dir, const std::string &language)
 {
-    if (!_isBareLocale(setlocale(LC_MESSAGES, nullptr)))
-        return;
     LOG_DEBUG("locale %s is not installed, its texts are used without it", language.c_str());
+    // Texts that were looked up are kept until the locale changes, and it was this one already if
+    // the language before had no locale either.
+    setlocale(LC_ALL, "C");
     setlocale(LC_ALL, "C.UTF-8");
     _bindCatalogue(domain, dir);
 }
@@ -93,8 +94,9 @@ void _langChanged(app_event_info_h, void *data)
     LOG_DEBUG("Current Lang : %s", language.c_str());
     const CText resources(app_get_resource_path());
     const std::string dir = std::string(resources ? resources.get() : "") + "locale";
-    _initI18n(domain, dir.c_str(), language.c_str());
-    _translateWithoutLocale(dir.c_str(), language);
+    if (_initI18n(domain, dir.c_str(), language.c_str()) != 0 ||
+        _isBareLocale(setlocale(LC_MESSAGES, nullptr)))
+        _translateWithoutLocale(dir.c_str(), language);
     elm_language_set(language.c_str());
     // The toolkit would ask its own catalogue, which knows only installed locales.
     elm_config_mirrored_set(_isRightToLeft(language));

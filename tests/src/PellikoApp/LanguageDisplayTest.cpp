@@ -79,6 +79,18 @@ TEST_F(Language, TheSessionsLanguageListDoesNotWinOverTheDevices)
     EXPECT_STREQ(translated("IDS_RSH_BUTTON_SHARE_ABB5"), "Teilen");
 }
 
+TEST_F(Language, OneWithoutALocaleFollowsAnother)
+{
+    speak("ar.UTF-8");
+    EXPECT_STREQ(translated("IDS_RSH_BUTTON_SHARE_ABB5"), "مشاركة");
+    EXPECT_TRUE(elm_config_mirrored_get());
+    speak("ja.UTF-8");
+    EXPECT_STREQ(translated("IDS_RSH_BUTTON_SHARE_ABB5"), "共有");
+    EXPECT_FALSE(elm_config_mirrored_get());
+    speak("he_IL.UTF-8");
+    EXPECT_TRUE(elm_config_mirrored_get());
+}
+
 TEST_F(Language, UsersSeeTextsAlsoWhereNoLocaleIsInstalled)
 {
     loseLocales();

@@ -44,7 +44,7 @@ protected:
     {
         if (!getenv("PELLIKO_KEEP_PICTURES"))
             return;
-        settle(ad->popup ? button("button1") : ad->win);
+        waitForFrames(150); // it fades in
         std::ostringstream name;
         name << "looks-" << size << "-" << scale << "-" << letters << "-" << language << "-"
              << variant.name;
