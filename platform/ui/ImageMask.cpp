@@ -52,15 +52,6 @@ Pixels loadMask(Evas *canvas, const char *path)
     return pixelsOf(file.get());
 }
 
-// The toolkit's smooth scaling reads a few bytes behind the last pixel. Where that is the end of a
-// memory page, as with 256 by 256 pixels, nothing may lie behind it.
-bool fillsPages(const Pixels &picture)
-{
-    constexpr int pagePixels = 1024;
-    return picture.width > 1 && picture.height > 1 &&
-           picture.width * picture.height % pagePixels == 0;
-}
-
 // The largest part of `picture` around its middle that has the mask's proportions.
 Pixels cropToProportions(const Pixels &picture, const Pixels &mask)
 {
@@ -70,10 +61,6 @@ Pixels cropToProportions(const Pixels &picture, const Pixels &mask)
     part.height = std::min(picture.height, static_cast<int>(std::lround(picture.width / wanted)));
     part.width = std::max(part.width, 1);
     part.height = std::max(part.height, 1);
-    if (fillsPages(part)) {
-        --part.width;
-        --part.height;
-    }
     const int left = (picture.width - part.width) / 2, top = (picture.height - part.height) / 2;
     for (int y = 0; y < part.height; ++y) {
         const auto row = picture.data.begin() + (top + y) * picture.width + left;

@@ -5,6 +5,7 @@
 #include "PellikoApp/AppData.h"
 #include "PellikoApp/ThemeLayout.h"
 #include "PellikoUploadDataManager/Initials.h"
+#include "PellikoUploadDataManager/WholePicture.h"
 
 #include <Elementary.h>
 #include <cmath>
@@ -35,34 +36,14 @@ void _tint(Evas_Object *image, const char *color_class)
     evas_object_color_set(image, r, g, b, a);
 }
 
-// A damaged file may begin well: only its pixels tell.
-bool _hasPixels(const Evas_Object *image)
-{
-    Evas_Object *shown = elm_image_object_get(image);
-    void *pixels = shown ? evas_object_image_data_get(shown, EINA_FALSE) : nullptr;
-    if (!pixels)
-        return false;
-    evas_object_image_data_set(shown, pixels);
-    return evas_object_image_load_error_get(shown) == EVAS_LOAD_ERROR_NONE;
-}
-
-// The toolkit would take what it could read of the file for all of it when it is asked the next
-// time.
-void _forget(Evas_Object *image)
-{
-    if (Evas_Object *shown = elm_image_object_get(image))
-        evas_object_image_file_set(shown, nullptr, nullptr);
-    evas_image_cache_flush(evas_object_evas_get(image));
-    evas_object_del(image);
-}
-
 // Null when the file cannot be shown: the theme has its own drawing for its place.
 Evas_Object *_withFile(Evas_Object *image, const char *file)
 {
-    if (elm_image_file_set(image, file, nullptr) && _hasPixels(image))
+    if (isWholePicture(evas_object_evas_get(image), file) &&
+        elm_image_file_set(image, file, nullptr))
         return image;
     LOG_ERROR("the picture %s cannot be shown", file);
-    _forget(image);
+    evas_object_del(image);
     return nullptr;
 }
 
@@ -181,6 +162,7 @@ Evas_Object *_addBox(Evas_Object *scroller, RowCells cells)
 
 void putRecipientsRow(PellikoAppData *ad, const std::vector<RowPerson> &people, RowCells cells)
 {
+    forgetWholePictures();
     Evas_Object *layout = addThemeLayout(ad->popup_layout, ad->theme, "scroller.swallow");
     Evas_Object *scroller = _addScroller(layout, ad->theme);
     Evas_Object *box = _addBox(scroller, cells);

@@ -159,24 +159,6 @@ TEST_F(Pictures, DamagedFilesLeaveNoEmptyPlace)
     }
 }
 
-// The toolkit reads a little behind the last pixel when it scales: see the decision about it.
-TEST_F(Pictures, NoDrawingFillsMemoryPages)
-{
-    int looked_at = 0;
-    for (const char *folder : {PELLIKO_BUILD_DIR "/res/theme", "/tmp/whole"}) {
-        for (const auto &file : std::filesystem::directory_iterator(folder)) {
-            Evas_Object *image = evas_object_image_add(evas_object_evas_get(ad->win));
-            evas_object_image_file_set(image, file.path().c_str(), nullptr);
-            int width = 0, height = 0;
-            evas_object_image_size_get(image, &width, &height);
-            evas_object_del(image);
-            EXPECT_NE(width * height % 1024, 0) << file.path();
-            ++looked_at;
-        }
-    }
-    EXPECT_GT(looked_at, 12);
-}
-
 TEST_F(Pictures, DamagedPictureOfAPersonGivesWayToInitials)
 {
     const std::string photo = "/tmp/photo.png";

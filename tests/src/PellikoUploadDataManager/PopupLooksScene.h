@@ -56,11 +56,23 @@ protected:
         return evas_object_name_find(evas_object_evas_get(ad->win), "share-fail");
     }
 
+    /// People as they are called somewhere, from the longest name on.
+    static std::vector<std::string> names(size_t count)
+    {
+        static const std::vector<std::string> all = {
+            longName, "Mara Lindqvist", "Kofi Danso", "山田 太郎",      "Анна Каренина", "محمد علي",
+            "Bo",     "हरि कुमार",       "Zoë Ørsted", "+44 7700 900123"};
+        return {all.begin(), all.begin() + static_cast<ptrdiff_t>(count)};
+    }
+
     void openShare(int32_t action, int people, int unsupported = 0)
     {
         unsupported_file_count = unsupported;
         ad->action_type = action;
-        share(100, 512 << 20, std::vector<Person>(static_cast<size_t>(people), {longName, true}));
+        std::vector<Person> recipients;
+        for (const std::string &name : names(static_cast<size_t>(people)))
+            recipients.push_back({name, recipients.size() % 3 != 2});
+        share(100, 512 << 20, recipients);
         _createPopupView(ad);
     }
 
@@ -71,7 +83,8 @@ protected:
         g_noti_press_data.upload_status = state;
         g_noti_press_data.total_files = 100;
         g_noti_press_data.total_size = 1000 << 20;
-        g_noti_press_data.recipients.assign(people, std::string(longName) + "+SMS");
+        for (const std::string &name : names(people))
+            g_noti_press_data.recipients.push_back(name + "+SMS");
         ad->operation_type = OPERATION_UPLOADING_NOTI_PRESSED;
         _createPopupView(ad);
     }

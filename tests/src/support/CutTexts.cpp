@@ -90,7 +90,8 @@ std::string whatIsWrong(const Evas_Object *object)
     evas_object_textblock_size_formatted_get(object, &formatted_width, &formatted_height);
     if (formatted_height > height + 1)
         return std::to_string(formatted_height) + " high in " + std::to_string(height);
-    return formatted_width <= width + 1
+    // Words are broken to the width; a space at the end of a line hangs over.
+    return formatted_width <= width + width / 40
                ? ""
                : std::to_string(formatted_width) + " wide in " + std::to_string(width);
 }
