@@ -82,15 +82,6 @@ Found oneOf(const std::string &who, const Contacts &found)
     return {0, {}, severalPeople(who, found)};
 }
 
-Found byNumber(const std::string &who, const Contacts &contacts)
-{
-    const std::string digits = digitsOf(who);
-    const Contacts found = those(contacts, [&digits](const ContactNumber &contact) {
-        return digitsOf(contact.number) == digits;
-    });
-    return found.empty() ? Found{0, who, {}} : oneOf(who, found);
-}
-
 Found byName(const std::string &who, const Contacts &contacts)
 {
     const std::string wanted = folded(who);
@@ -116,7 +107,7 @@ Found byName(const std::string &who, const Contacts &contacts)
 
 Found findPerson(const std::string &who, const Contacts &contacts)
 {
-    return isNumber(who) ? byNumber(who, contacts) : byName(who, contacts);
+    return isNumber(who) ? Found{0, who, {}} : byName(who, contacts);
 }
 
 Contacts peopleWith(const std::string &text, const Contacts &contacts)

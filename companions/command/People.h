@@ -13,14 +13,14 @@ namespace pelliko::command
 struct Found {
     /// A number of the contacts, by its id; 0 when there is none.
     int32_t id = 0;
-    /// A phone number that nobody in the contacts has.
-    std::string newNumber;
+    /// A phone number, of somebody in the contacts or of nobody.
+    std::string number;
     /// Why nobody is meant for certain; may have lines with candidates.
     std::string fault;
 };
 
-/// Finds a person by name (whole, or a part that is in one name only; case does not matter) or by
-/// phone number (written in any way).
+/// Finds a person by name: whole, or a part that is in one name only; case does not matter. A phone
+/// number, however it is written, is taken as it is.
 Found findPerson(const std::string &who, const std::vector<companion::ContactNumber> &contacts);
 
 /// Those whose name or number has the text in it; all for an empty one.

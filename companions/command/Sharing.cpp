@@ -6,10 +6,11 @@
 
 #include <app_control.h>
 #include <app_control_delivery.h>
-#include <gio/gio.h>
+#include <contacts.h>
+#include <contacts_new_number.h>
+#include <glib.h>
 
 #include <algorithm>
-#include <filesystem>
 #include <iostream>
 #include <iterator>
 #include <memory>
@@ -60,36 +61,13 @@ struct Recipients {
     Exit status = Exit::done;
 };
 
-std::string contactsTool()
+// Only numbers of the contacts can be shared with: who is not there yet becomes a contact.
+std::string idOf(const std::string &number, std::string &fault)
 {
-    std::error_code error;
-    const auto self = std::filesystem::read_symlink("/proc/self/exe", error);
-    return (self.parent_path() / "contacts-tool").string();
-}
-
-// Only numbers of the contacts can be shared with: who is not there yet becomes a contact, by the
-// tool that keeps them.
-std::string addedId(const std::string &number, std::string &fault)
-{
-    const std::string tool = contactsTool();
-    g_autoptr(GError) error = nullptr;
-    g_autoptr(GSubprocess) process = g_subprocess_new(
-        static_cast<GSubprocessFlags>(G_SUBPROCESS_FLAGS_STDOUT_PIPE |
-                                      G_SUBPROCESS_FLAGS_STDERR_PIPE),
-        &error, tool.c_str(), "add", "--name", number.c_str(), "--number", number.c_str(), nullptr);
-    g_autofree char *said = nullptr;
-    g_autofree char *complaint = nullptr;
-    if (!process ||
-        !g_subprocess_communicate_utf8(process, nullptr, nullptr, &said, &complaint, &error)) {
-        fault = "the number cannot be added to the contacts: " + std::string(error->message);
-        return {};
-    }
-    if (!g_subprocess_get_successful(process)) {
-        fault = printable(number) + " cannot be added to the contacts: " +
-                std::string(complaint ? g_strstrip(complaint) : "no reason was given");
-        return {};
-    }
-    return g_strstrip(said);
+    int id = 0;
+    if (contacts_find_or_add_number(number.c_str(), &id) != CONTACTS_ERROR_NONE)
+        fault = printable(number) + " cannot be added to the contacts";
+    return std::to_string(id);
 }
 
 // All are looked for before any is added: a mistake changes nothing.
@@ -121,7 +99,7 @@ Recipients recipientsOf(const std::vector<std::string> &to)
     for (const Found &person : found) {
         std::string fault;
         const std::string id =
-            person.id != 0 ? std::to_string(person.id) : addedId(person.newNumber, fault);
+            person.id != 0 ? std::to_string(person.id) : idOf(person.number, fault);
         if (!fault.empty()) {
             recipients.status = refuse(Exit::recipient, fault);
             return recipients;
