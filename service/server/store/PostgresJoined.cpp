@@ -11,24 +11,14 @@ namespace
 /// Seconds until the question fits the account's limit; nothing when it fits now.
 std::optional<Seconds> waitForNumbers(PostgresConnection &db, const JoinedQuestion &question)
 {
-    const Seconds since = question.now - question.limitWindow;
-    std::uint64_t used = question.numbers.size();
     PostgresRows rows = db.query("SELECT at, numbers FROM questions"
                                  " WHERE account = $1 AND at > $2 ORDER BY at",
-                                 question.account, since);
-    std::vector<std::pair<Seconds, std::uint64_t>> counted;
-    while (rows.next()) {
-        counted.emplace_back(rows.integer(0), rows.size(1));
-        used += counted.back().second;
-    }
-    if (used <= question.dailyLimit)
-        return std::nullopt;
-    for (const auto &[at, numbers] : counted) {
-        used -= numbers;
-        if (used <= question.dailyLimit)
-            return at + question.limitWindow - question.now;
-    }
-    return question.limitWindow;
+                                 question.account, question.now - question.limitWindow);
+    std::vector<Use> uses;
+    while (rows.next())
+        uses.push_back({rows.integer(0), rows.size(1)});
+    return waitForRoom(question.numbers.size(), uses,
+                       {question.dailyLimit, question.limitWindow, question.now});
 }
 
 std::vector<std::string> joinedOf(PostgresConnection &db, const std::vector<std::string> &numbers)

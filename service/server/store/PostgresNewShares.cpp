@@ -11,34 +11,19 @@ namespace
 
 using Outcome = CreateResult::Outcome;
 
-std::uint64_t announcedBytes(const NewShare &share)
-{
-    std::uint64_t sum = 0;
-    for (const NewFile &file : share.files)
-        sum += file.size;
-    return sum;
-}
-
 /// Seconds until the share fits the account's limit; nothing when it fits now.
 std::optional<Seconds> waitForLimit(PostgresConnection &db, const NewShare &share)
 {
     const std::uint64_t wanted = announcedBytes(share);
-    const Seconds since = share.now - share.limitWindow;
-    PostgresRows sum = db.query("SELECT coalesce(sum(bytes), 0)::bigint FROM usage"
-                                " WHERE account = $1 AND at > $2",
-                                share.account, since);
-    std::uint64_t used = wanted + (sum.next() ? sum.size(0) : 0);
-    if (wanted == 0 || used <= share.dailyLimit)
+    if (wanted == 0)
         return std::nullopt;
-    PostgresRows uses = db.query("SELECT at, bytes FROM usage"
+    PostgresRows rows = db.query("SELECT at, bytes FROM usage"
                                  " WHERE account = $1 AND at > $2 ORDER BY at",
-                                 share.account, since);
-    while (uses.next()) {
-        used -= uses.size(1);
-        if (used <= share.dailyLimit)
-            return uses.integer(0) + share.limitWindow - share.now;
-    }
-    return share.limitWindow;
+                                 share.account, share.now - share.limitWindow);
+    std::vector<Use> uses;
+    while (rows.next())
+        uses.push_back({rows.integer(0), rows.size(1)});
+    return waitForRoom(wanted, uses, {share.dailyLimit, share.limitWindow, share.now});
 }
 
 void addRecipients(PostgresConnection &db, std::int64_t share,

@@ -13,20 +13,6 @@ namespace pelliko::server
 namespace
 {
 
-using Outcome = FinishResult::Outcome;
-
-// The statements below name the states by number.
-static_assert(static_cast<int>(PushState::waiting) == 0);
-static_assert(static_cast<int>(PushState::acknowledged) == 1);
-static_assert(static_cast<int>(PushState::forgotten) == 3);
-
-/// Bounds what a stream holds in memory; it asks again for the rest.
-constexpr int pushesAtOnce = 64;
-
-#define PELLIKO_RECEIVED_COLUMNS PELLIKO_SHARE_COLUMNS ", a.number, p.id"
-#define PELLIKO_RECEIVED_TABLES                                                                    \
-    " FROM pushes p JOIN shares s ON s.id = p.share JOIN accounts a ON a.id = s.account"
-
 /// The accounts among the recipients by number, locked in the order of their ids: two shares that
 /// go to the same people take them one after the other.
 std::map<std::string, std::int64_t> lockRecipients(PostgresConnection &db, const ShareRecord &share)
@@ -92,19 +78,11 @@ FinishResult finish(PostgresConnection &db, ShareRow &share, const std::string &
                     Seconds deadline)
 {
     ShareRecord &record = share.record;
-    const bool first = record.state == ShareState::uploading;
-    if (!first && record.state != ShareState::finished)
-        return {Outcome::gone, std::move(record), {}, {}};
-    for (const FileRecord &file : record.files) {
-        if (!file.complete())
-            return {Outcome::incomplete, std::move(record), {}, {}};
-    }
-    if (first)
-        record.deadline = deadline;
-    record.state = ShareState::finished;
+    if (const auto refused = markFinished(record, deadline))
+        return {*refused, std::move(record), {}, {}};
     db.query("UPDATE shares SET state = $2, deadline = $3, link_hash = $4 WHERE id = $1", share.id,
              static_cast<int>(record.state), record.deadline, Bytes{linkHash});
-    FinishResult result{Outcome::finished, {}, {}, {}};
+    FinishResult result{FinishResult::Outcome::finished, {}, {}, {}};
     tellRecipients(db, share, result);
     result.share = std::move(record);
     return result;
@@ -165,7 +143,7 @@ std::optional<ReceivedRecord> PostgresMetadata::findReceived(std::int64_t accoun
                                                              const ReceivedKey &key, Seconds now)
 {
     return m_pool->read([&](PostgresConnection &db) -> std::optional<ReceivedRecord> {
-        PostgresRows row = db.query("SELECT " PELLIKO_RECEIVED_COLUMNS PELLIKO_RECEIVED_TABLES
+        PostgresRows row = db.query("SELECT " PELLIKO_RECEIVED
                                     " WHERE p.account = $1 AND (p.id = $2 OR p.token_hash = $3)"
                                     " AND p.state <> 3",
                                     account, key.push, Bytes{key.tokenHash});
@@ -180,10 +158,10 @@ std::optional<ReceivedRecord> PostgresMetadata::findReceived(std::int64_t accoun
 std::vector<ReceivedRecord> PostgresMetadata::listReceived(std::int64_t account, Seconds now)
 {
     return m_pool->read([&](PostgresConnection &db) {
-        PostgresRows rows = db.query("SELECT " PELLIKO_RECEIVED_COLUMNS PELLIKO_RECEIVED_TABLES
-                                     " WHERE p.account = $1 AND (p.state = 1 OR"
-                                     " (p.state = 0 AND s.deadline > $2)) ORDER BY p.id DESC",
-                                     account, now);
+        PostgresRows rows =
+            db.query("SELECT " PELLIKO_RECEIVED " WHERE p.account = $1 AND (p.state = 1 OR"
+                     " (p.state = 0 AND s.deadline > $2)) ORDER BY p.id DESC",
+                     account, now);
         std::vector<ReceivedRecord> list;
         std::vector<ShareRow> shares;
         while (rows.next()) {

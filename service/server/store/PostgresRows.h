@@ -11,9 +11,6 @@
 namespace pelliko::server
 {
 
-/// The share of a row of PELLIKO_SHARE_COLUMNS, without files and recipients.
-[[nodiscard]] ShareRow shareRowOf(const PostgresRows &row, Seconds now);
-
 /// Reads the files and recipients of all these shares.
 void addParts(PostgresConnection &db, std::vector<ShareRow> &shares);
 void addParts(PostgresConnection &db, ShareRow &share);

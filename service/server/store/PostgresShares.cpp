@@ -24,18 +24,6 @@ std::vector<std::int64_t> idsOf(const std::vector<ShareRow> &shares)
 
 } // namespace
 
-ShareRow shareRowOf(const PostgresRows &row, Seconds now)
-{
-    ShareRow share;
-    share.id = row.integer(0);
-    share.record.key = row.text(1);
-    share.record.created = row.integer(3);
-    share.record.deadline = row.integer(4);
-    share.stored = static_cast<ShareState>(row.integer(2));
-    share.record.state = stateAt(share.stored, share.record.deadline, now);
-    return share;
-}
-
 void addParts(PostgresConnection &db, std::vector<ShareRow> &shares)
 {
     if (shares.empty())

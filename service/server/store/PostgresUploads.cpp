@@ -10,10 +10,6 @@ namespace pelliko::server
 namespace
 {
 
-// The statements below name the live states by number.
-static_assert(static_cast<int>(ShareState::uploading) == 0);
-static_assert(static_cast<int>(ShareState::finished) == 1);
-
 /// Enough for one round of sweeping; the next round takes the rest.
 constexpr int doomedAtOnce = 256;
 constexpr int endedAtOnce = 64;
@@ -52,17 +48,12 @@ std::optional<UploadRecord> PostgresMetadata::findUpload(std::int64_t account,
     if (!looksLikeToken(upload))
         return std::nullopt;
     return m_pool->single([&](PostgresConnection &db) -> std::optional<UploadRecord> {
-        PostgresRows row = db.query(
-            "SELECT " PELLIKO_SHARE_COLUMNS ", f.name, f.type, f.size, coalesce(b.received, 0),"
-            " f.upload, coalesce(b.key, '') FROM files f JOIN shares s ON s.id = f.share"
-            " LEFT JOIN blobs b ON b.id = f.blob WHERE f.upload = $1 AND s.account = $2",
-            upload, account);
+        PostgresRows row =
+            db.query("SELECT " PELLIKO_UPLOAD_COLUMNS " WHERE f.upload = $1 AND s.account = $2",
+                     upload, account);
         if (!row.next())
             return std::nullopt;
-        const ShareRecord share = shareRowOf(row, now).record;
-        return UploadRecord{share.key, share.state, share.deadline,
-                            FileRecord{row.text(5), row.text(6), row.size(7), row.size(8),
-                                       row.text(9), row.text(10)}};
+        return uploadOf(row, now);
     });
 }
 

@@ -1,3 +1,4 @@
+#include "store/ShareRow.h"
 #include "store/SqliteConnection.h"
 
 namespace pelliko::server
@@ -5,24 +6,13 @@ namespace pelliko::server
 
 std::optional<Seconds> SqliteMetadata::Connection::waitForNumbers(const JoinedQuestion &question)
 {
-    const Seconds since = question.now - question.limitWindow;
-    std::uint64_t used = question.numbers.size();
-    {
-        Query sum = query("SELECT coalesce(sum(numbers), 0) FROM questions"
-                          " WHERE account = ? AND at > ?",
-                          question.account, since);
-        used += sum.next() ? sum.size(0) : 0;
-    }
-    if (used <= question.dailyLimit)
-        return std::nullopt;
+    std::vector<Use> uses;
     Query rows = query("SELECT at, numbers FROM questions WHERE account = ? AND at > ? ORDER BY at",
-                       question.account, since);
-    while (rows.next()) {
-        used -= rows.size(1);
-        if (used <= question.dailyLimit)
-            return rows.integer(0) + question.limitWindow - question.now;
-    }
-    return question.limitWindow;
+                       question.account, question.now - question.limitWindow);
+    while (rows.next())
+        uses.push_back({rows.integer(0), rows.size(1)});
+    return waitForRoom(question.numbers.size(), uses,
+                       {question.dailyLimit, question.limitWindow, question.now});
 }
 
 JoinedAnswer SqliteMetadata::askJoined(const JoinedQuestion &question)

@@ -1,4 +1,5 @@
-#include "store/SqliteRows.h"
+#include "store/ShareRow.h"
+#include "store/SqliteConnection.h"
 #include "text/Secrets.h"
 
 #include <utility>
@@ -10,36 +11,19 @@ namespace
 
 using Outcome = CreateResult::Outcome;
 
-std::uint64_t announcedBytes(const NewShare &share)
-{
-    std::uint64_t sum = 0;
-    for (const NewFile &file : share.files)
-        sum += file.size;
-    return sum;
-}
-
 } // namespace
 
 std::optional<Seconds> SqliteMetadata::Connection::waitForLimit(const NewShare &share)
 {
     const std::uint64_t wanted = announcedBytes(share);
-    const Seconds since = share.now - share.limitWindow;
-    std::uint64_t used = wanted;
-    {
-        Query sum = query("SELECT coalesce(sum(bytes), 0) FROM usage WHERE account = ? AND at > ?",
-                          share.account, since);
-        used += sum.next() ? sum.size(0) : 0;
-    }
-    if (wanted == 0 || used <= share.dailyLimit)
+    if (wanted == 0)
         return std::nullopt;
-    Query uses = query("SELECT at, bytes FROM usage WHERE account = ? AND at > ? ORDER BY at",
-                       share.account, since);
-    while (uses.next()) {
-        used -= uses.size(1);
-        if (used <= share.dailyLimit)
-            return uses.integer(0) + share.limitWindow - share.now;
-    }
-    return share.limitWindow;
+    std::vector<Use> uses;
+    Query rows = query("SELECT at, bytes FROM usage WHERE account = ? AND at > ? ORDER BY at",
+                       share.account, share.now - share.limitWindow);
+    while (rows.next())
+        uses.push_back({rows.integer(0), rows.size(1)});
+    return waitForRoom(wanted, uses, {share.dailyLimit, share.limitWindow, share.now});
 }
 
 void SqliteMetadata::Connection::addFile(std::int64_t share, int position, const NewFile &file,

@@ -1,5 +1,6 @@
 // Pushes and what accounts see of the shares that they received
-#include "store/SqliteRows.h"
+#include "store/ShareRow.h"
+#include "store/SqliteConnection.h"
 #include "text/Secrets.h"
 
 #include <algorithm>
@@ -9,18 +10,6 @@ namespace pelliko::server
 {
 namespace
 {
-
-// The statements below name the states by number.
-static_assert(static_cast<int>(PushState::waiting) == 0);
-static_assert(static_cast<int>(PushState::acknowledged) == 1);
-static_assert(static_cast<int>(PushState::forgotten) == 3);
-
-/// Bounds what a stream holds in memory; it asks again for the rest.
-constexpr int pushesAtOnce = 64;
-
-#define PELLIKO_RECEIVED_COLUMNS PELLIKO_SHARE_COLUMNS ", a.number, p.id"
-#define PELLIKO_RECEIVED_TABLES                                                                    \
-    " FROM pushes p JOIN shares s ON s.id = p.share JOIN accounts a ON a.id = s.account"
 
 } // namespace
 
@@ -119,7 +108,7 @@ std::optional<ReceivedRecord> SqliteMetadata::findReceived(std::int64_t account,
         ShareRow share;
         ReceivedRecord received;
         {
-            Query row = db.query("SELECT " PELLIKO_RECEIVED_COLUMNS PELLIKO_RECEIVED_TABLES
+            Query row = db.query("SELECT " PELLIKO_RECEIVED
                                  " WHERE p.account = ? AND (p.id = ? OR p.token_hash = ?)"
                                  " AND p.state <> 3",
                                  account, key.push, Bytes{key.tokenHash});
@@ -140,8 +129,7 @@ std::vector<ReceivedRecord> SqliteMetadata::listReceived(std::int64_t account, S
     auto &db = *m_connection;
     return db.read([&] {
         std::vector<ReceivedRecord> list;
-        Query rows = db.query("SELECT " PELLIKO_RECEIVED_COLUMNS PELLIKO_RECEIVED_TABLES
-                              " WHERE p.account = ? AND (p.state = 1 OR"
+        Query rows = db.query("SELECT " PELLIKO_RECEIVED " WHERE p.account = ? AND (p.state = 1 OR"
                               " (p.state = 0 AND s.deadline > ?)) ORDER BY p.id DESC",
                               account, now);
         while (rows.next()) {

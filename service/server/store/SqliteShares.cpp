@@ -1,21 +1,10 @@
-#include "store/SqliteRows.h"
+#include "store/ShareRow.h"
+#include "store/SqliteConnection.h"
 
 #include <utility>
 
 namespace pelliko::server
 {
-
-ShareRow shareRowOf(const Query &row, Seconds now)
-{
-    ShareRow share;
-    share.id = row.integer(0);
-    share.record.key = row.text(1);
-    share.record.created = row.integer(3);
-    share.record.deadline = row.integer(4);
-    share.stored = static_cast<ShareState>(row.integer(2));
-    share.record.state = stateAt(share.stored, share.record.deadline, now);
-    return share;
-}
 
 void SqliteMetadata::Connection::addParts(ShareRow &share)
 {
@@ -88,16 +77,8 @@ FinishResult SqliteMetadata::finishShare(std::int64_t account, const std::string
         if (!share)
             return {};
         ShareRecord &record = share->record;
-        const bool first = record.state == ShareState::uploading;
-        if (!first && record.state != ShareState::finished)
-            return {Outcome::gone, std::move(record), {}, {}};
-        for (const FileRecord &file : record.files) {
-            if (!file.complete())
-                return {Outcome::incomplete, std::move(record), {}, {}};
-        }
-        if (first)
-            record.deadline = deadline;
-        record.state = ShareState::finished;
+        if (const auto refused = markFinished(record, deadline))
+            return {*refused, std::move(record), {}, {}};
         db.query("UPDATE shares SET state = ?, deadline = ?, link_hash = ? WHERE id = ?",
                  static_cast<int>(record.state), record.deadline, Bytes{linkHash}, share->id)
             .run();
