@@ -5,6 +5,8 @@
 #include "store/StorageFailure.h"
 #include "text/Secrets.h"
 
+#include <malloc.h>
+
 #include <algorithm>
 #include <map>
 #include <mutex>
@@ -20,6 +22,8 @@ namespace
 constexpr std::size_t atOnce = 48;
 /// The longest that a signature holds.
 constexpr std::int64_t longestVisit = 604800;
+/// Room of this size comes from the kernel and goes back to it.
+constexpr int largeBuffer = 1024 * 1024;
 /// A part that was on its way may come after the end of its upload.
 constexpr int mostAborts = 5;
 
@@ -69,7 +73,11 @@ std::shared_ptr<S3Writing> S3Blobs::State::writingOf(const std::string &key)
     return found == writings.end() ? nullptr : found->second.lock();
 }
 
-S3Blobs::S3Blobs(s3::Address address) : m_state(std::make_unique<State>(std::move(address))) {}
+S3Blobs::S3Blobs(s3::Address address) : m_state(std::make_unique<State>(std::move(address)))
+{
+    // Otherwise the C library keeps the room of parts that were sent, once for each of its arenas.
+    mallopt(M_MMAP_THRESHOLD, largeBuffer);
+}
 
 S3Blobs::~S3Blobs() = default;
 

@@ -16,11 +16,14 @@ namespace
 /// this one.
 constexpr std::size_t mostUnderWay = 3;
 
-/// As appending does, but never beyond what a part needs.
-void growTo(std::string &text, std::size_t size)
+/// Small files take what they have; a part has its room at once, of which the kernel gives only the
+/// pages that are written to.
+constexpr std::size_t smallTail = 256UL * 1024;
+
+void makeRoom(std::string &tail, std::size_t size)
 {
-    if (text.capacity() < size)
-        text.reserve(std::min<std::size_t>(s3PartSize, std::max(size, 2 * text.capacity())));
+    if (tail.capacity() < size)
+        tail.reserve(size <= smallTail ? smallTail : s3PartSize);
 }
 
 } // namespace
@@ -57,7 +60,7 @@ void S3Writing::write(std::uint64_t offset, std::string_view bytes)
         if (m_failure)
             std::rethrow_exception(m_failure);
         const auto count = std::min<std::size_t>(bytes.size(), s3PartSize - m_tail.size());
-        growTo(m_tail, m_tail.size() + count);
+        makeRoom(m_tail, m_tail.size() + count);
         m_tail.append(bytes.substr(0, count));
         bytes.remove_prefix(count);
         if (m_tail.size() == s3PartSize)

@@ -282,6 +282,21 @@ TEST_F(S3Store, AWrongKeyIsAClearRefusal)
     }
 }
 
+TEST_F(S3Store, WithTlsTheStoresCertificateCounts)
+{
+    const std::string url =
+        "s3://" + environment("PELLIKO_S3_TLS_HOST") + "/" + environment("PELLIKO_S3_BUCKET");
+    const auto trusting = open(url + "/tls?ca=" + environment("PELLIKO_S3_CA"));
+    trusting->openForWriting(m_key)->finish();
+    EXPECT_EQ(trusting->keys(), std::vector<std::string>{m_key});
+    try {
+        open(url)->keys();
+        FAIL() << "the server trusts anybody";
+    } catch (const StorageFailure &failure) {
+        EXPECT_NE(std::string(failure.what()).find("certificate"), std::string::npos);
+    }
+}
+
 TEST_F(S3Store, AddressesAreGivenOutOnlyWhereWanted)
 {
     const auto writer = m_blobs->openForWriting(m_key);
