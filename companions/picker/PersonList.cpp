@@ -50,31 +50,31 @@ PersonList::PersonList(Evas_Object *box, Press press)
     elm_scroller_policy_set(list_, ELM_SCROLLER_POLICY_OFF, ELM_SCROLLER_POLICY_AUTO);
     elm_scroller_bounce_set(list_, EINA_FALSE, EINA_FALSE);
     evas_object_size_hint_min_set(list_, 0, scaled(leastHeight));
+    evas_object_smart_callback_add(list_, "realized", onRealized, nullptr);
     append(box, list_);
     evas_object_size_hint_weight_set(list_, EVAS_HINT_EXPAND, EVAS_HINT_EXPAND);
     evas_object_size_hint_align_set(list_, EVAS_HINT_FILL, EVAS_HINT_FILL);
 }
 
-void PersonList::show(const std::vector<const Line *> &lines, const Choice &choice)
+void PersonList::show(const Lines &lines, const Choice &choice)
 {
     rows_.clear();
     elm_genlist_clear(list_);
     rows_.reserve(lines.size());
-    for (const Line *line : lines) {
-        auto row = std::make_unique<Row>(Row{this, *line, nullptr, choice.has(line->person)});
+    for (const auto &line : lines) {
+        auto row = std::make_unique<Row>(Row{this, line, nullptr, choice.has(line->person)});
         row->item = elm_genlist_item_append(list_, style_, row.get(), nullptr,
                                             ELM_GENLIST_ITEM_NONE, onPressed, row.get());
         if (!row->item)
             continue;
         rows_.push_back(row.release());
-        name(*rows_.back());
     }
 }
 
 void PersonList::mark(const Choice &choice)
 {
     for (Row *row : rows_) {
-        const bool chosen = choice.has(row->line.person);
+        const bool chosen = choice.has(row->line->person);
         if (chosen == row->chosen)
             continue;
         row->chosen = chosen;
@@ -86,12 +86,18 @@ void PersonList::mark(const Choice &choice)
 
 void PersonList::name(const Row &row)
 {
-    setAccessibleName(row.item, rowName(row.line.person, row.line.several, row.chosen).c_str());
+    setAccessibleName(row.item, rowName(row.line->person, row.line->several, row.chosen).c_str());
+}
+
+// Most of them are never looked at.
+void PersonList::onRealized(void *, Evas_Object *, void *item)
+{
+    name(*static_cast<Row *>(elm_object_item_data_get(static_cast<Elm_Object_Item *>(item))));
 }
 
 char *PersonList::textOf(void *data, Evas_Object *, const char *part)
 {
-    const Line &line = static_cast<Row *>(data)->line;
+    const Line &line = *static_cast<Row *>(data)->line;
     if (std::strcmp(part, "elm.text") != 0)
         return strdup(numberText(line.person, line.several).c_str());
     const std::string title =
@@ -103,7 +109,7 @@ Evas_Object *PersonList::contentOf(void *data, Evas_Object *list, const char *pa
 {
     const auto *row = static_cast<Row *>(data);
     if (std::strcmp(part, "elm.swallow.icon") == 0)
-        return addAvatar(list, row->line.person);
+        return addAvatar(list, row->line->person);
     Evas_Object *check = elm_check_add(list);
     elm_object_style_set(check, "pelliko");
     elm_check_state_set(check, row->chosen ? EINA_TRUE : EINA_FALSE);
@@ -121,7 +127,7 @@ void PersonList::onPressed(void *data, Evas_Object *, void *)
 {
     const auto *row = static_cast<Row *>(data);
     elm_genlist_item_selected_set(row->item, EINA_FALSE);
-    row->list->press_(row->line.person);
+    row->list->press_(row->line->person);
 }
 
 } // namespace pelliko::picker

@@ -7,6 +7,7 @@
 #include <Search.h>
 
 #include <algorithm>
+#include <iterator>
 #include <utility>
 
 namespace pelliko::picker
@@ -67,19 +68,18 @@ void PickPage::showMessage(const std::string &sentence)
     setPlaceText(message_, "error", sentence);
 }
 
-std::vector<const PersonList::Line *> PickPage::found(const std::string &typed) const
+PersonList::Lines PickPage::found(const std::string &typed) const
 {
     const Search wanted(typed);
-    std::vector<const PersonList::Line *> lines;
-    for (const PersonList::Line &line : model_.people) {
-        if (typed.empty() || wanted.finds(line.person.name, line.person.number))
-            lines.push_back(&line);
-    }
+    PersonList::Lines lines;
+    std::copy_if(model_.people.begin(), model_.people.end(), std::back_inserter(lines),
+                 [&](const auto &line) {
+                     return typed.empty() || wanted.findsFolded(line->folded, line->digits);
+                 });
     return lines;
 }
 
-// A number that is whole is offered too, unless somebody in the list has it.
-void PickPage::addTyped(const std::string &typed, std::vector<const PersonList::Line *> &lines)
+void PickPage::addTyped(const std::string &typed, PersonList::Lines &lines) const
 {
     // Making one form of a number takes a while, and few have the same digits.
     constexpr size_t mostCompared = 50;
@@ -89,13 +89,13 @@ void PickPage::addTyped(const std::string &typed, std::vector<const PersonList::
     const size_t compared = std::min(lines.size(), mostCompared);
     const bool known =
         std::any_of(lines.begin(), lines.begin() + static_cast<std::ptrdiff_t>(compared),
-                    [&](const auto *line) {
+                    [&](const auto &line) {
                         return wholeNumber(line->person.number, model_.homeCode) == number;
                     });
     if (number.empty() || known)
         return;
-    typed_ = {{0, number, number}, false};
-    lines.insert(lines.begin(), &typed_);
+    lines.insert(lines.begin(),
+                 std::make_shared<PersonList::Line>(PersonList::Line{{0, number, number}, false}));
 }
 
 std::string PickPage::note(const std::string &typed, bool isEmpty) const
@@ -112,14 +112,14 @@ std::string PickPage::note(const std::string &typed, bool isEmpty) const
 void PickPage::search()
 {
     const std::string typed = typedText(search_);
-    std::vector<const PersonList::Line *> lines = found(typed);
+    PersonList::Lines lines = found(typed);
     addTyped(typed, lines);
     lines_ = std::move(lines);
     list_->show(lines_, model_.choice);
     setPlaceText(note_, "text", note(typed, lines_.empty()));
 }
 
-// The list is in the middle of a call when somebody in it is pressed.
+// Also because the list is in the middle of a call when somebody in it is pressed.
 void PickPage::searchLater()
 {
     if (!job_)
@@ -136,18 +136,17 @@ void PickPage::onJob(void *data)
 void PickPage::choose(const ContactNumber &person)
 {
     showMessage({});
-    const ContactNumber copy = person; // the place that it was pressed in may go now
-    if (!model_.choice.toggle(copy)) {
+    if (!model_.choice.toggle(person)) {
         showMessage(counted("At most one person.", "At most %d people at once.", Choice::most));
         return;
     }
-    list_->mark(model_.choice);
-    showChoice();
     // Whoever was looked for is found: the next one is looked for among all.
-    if (model_.choice.has(copy) && !typedText(search_).empty()) {
+    if (model_.choice.has(person) && !typedText(search_).empty()) {
         setTypedText(search_, "");
         searchLater();
     }
+    list_->mark(model_.choice);
+    showChoice(); // what was pressed to get here may go now
 }
 
 void PickPage::showChoice()
@@ -162,13 +161,17 @@ void PickPage::onTyped(void *data, Evas_Object *, void *)
 {
     auto *page = static_cast<PickPage *>(data);
     page->showMessage({});
-    page->search();
+    page->searchLater(); // letters that come at once are one search
 }
 
 // Whoever has typed enough to be understood needs no pointer.
 void PickPage::onReturn(void *data, Evas_Object *, void *)
 {
     auto *page = static_cast<PickPage *>(data);
+    if (page->job_) {
+        ecore_job_del(std::exchange(page->job_, nullptr));
+        page->search();
+    }
     if (typedText(page->search_).empty() || page->lines_.empty())
         return;
     if (!page->model_.choice.has(page->lines_.front()->person))

@@ -27,7 +27,7 @@ public:
     };
     /// What the page shows and changes; outlives it.
     struct Model {
-        std::vector<PersonList::Line> people;
+        PersonList::Lines people;
         bool readable = true;
         std::string homeCode;
         Choice choice;
@@ -46,8 +46,9 @@ private:
     void addButtons(Evas_Object *column);
     void searchLater();
     void search();
-    std::vector<const PersonList::Line *> found(const std::string &typed) const;
-    void addTyped(const std::string &typed, std::vector<const PersonList::Line *> &lines);
+    PersonList::Lines found(const std::string &typed) const;
+    /// A number that is whole is offered too, unless somebody in the list has it.
+    void addTyped(const std::string &typed, PersonList::Lines &lines) const;
     std::string note(const std::string &typed, bool isEmpty) const;
     void choose(const companion::ContactNumber &person);
     void showChoice();
@@ -68,9 +69,7 @@ private:
     std::unique_ptr<PersonList> list_;
     Evas_Object *message_ = nullptr;
     Evas_Object *share_ = nullptr;
-    std::vector<const PersonList::Line *> lines_;
-    /// The number that was typed, while it is in the list.
-    PersonList::Line typed_;
+    PersonList::Lines lines_;
     Ecore_Job *job_ = nullptr;
 };
 

@@ -5,6 +5,7 @@
 #include "Words.h"
 
 #include <Language.h>
+#include <Search.h>
 #include <dlog.h>
 #include <efl_extension.h>
 
@@ -79,7 +80,10 @@ void PickWindow::readContacts()
         ++numbersOf[number.name];
     for (ContactNumber &number : numbers) {
         const bool several = numbersOf[number.name] > 1;
-        model_.people.push_back({std::move(number), several});
+        PersonList::Line line{std::move(number), several};
+        line.folded = foldedText(line.person.name);
+        line.digits = digitsOf(line.person.number);
+        model_.people.push_back(std::make_shared<PersonList::Line>(std::move(line)));
     }
     model_.homeCode = homeCode();
 }
@@ -88,11 +92,10 @@ void PickWindow::readContacts()
 void PickWindow::chooseNamed()
 {
     for (const int32_t id : recipientsOf(request_)) {
-        const auto found =
-            std::find_if(model_.people.begin(), model_.people.end(),
-                         [id](const PersonList::Line &line) { return line.person.id == id; });
-        if (found != model_.people.end() && !model_.choice.has(found->person))
-            model_.choice.toggle(found->person);
+        const auto found = std::find_if(model_.people.begin(), model_.people.end(),
+                                        [id](const auto &line) { return line->person.id == id; });
+        if (found != model_.people.end() && !model_.choice.has((*found)->person))
+            model_.choice.toggle((*found)->person);
     }
 }
 

@@ -111,11 +111,15 @@ bool Search::isInNumber(const std::string &digits) const
 
 bool Search::finds(const std::string &name, const std::string &number) const
 {
-    const std::string folded = foldedText(name);
+    return findsFolded(foldedText(name), digitsOf(number));
+}
+
+bool Search::findsFolded(const std::string &name, const std::string &digits) const
+{
     const bool named = std::all_of(words_.begin(), words_.end(), [&](const std::string &word) {
-        return folded.find(word) != std::string::npos;
+        return name.find(word) != std::string::npos;
     });
-    return named || (!digits_.empty() && isInNumber(digitsOf(number)));
+    return named || (!digits_.empty() && isInNumber(digits));
 }
 
 } // namespace pelliko::companion

@@ -23,6 +23,8 @@ public:
     /// Whether each typed word is in the name, or the typed digits are in the number: also when one
     /// of the two has the country's code and the other the zero that stands for it at home.
     bool finds(const std::string &name, const std::string &number) const;
+    /// The same with what foldedText() and digitsOf() made of them: many people are found faster.
+    bool findsFolded(const std::string &name, const std::string &digits) const;
 
 private:
     bool isInNumber(const std::string &digits) const;
