@@ -45,6 +45,13 @@ class DesktopFiles(unittest.TestCase):
         self.assertEqual("Mit Pelliko senden", entry_of(ACTION).get_locale_string("Desktop Entry", "Name", "de"))
         self.assertEqual(21, len(LANGUAGES))
 
+    def test_the_action_keeps_to_what_file_managers_bear(self):
+        profile = "X-Action-Profile share"
+        action = entry_of(ACTION)
+        self.assertEqual(["all/allfiles"], action.get_string_list(profile, "MimeTypes"))  # folders are left out
+        self.assertIn("%F", action.get_string(profile, "Exec"))
+        self.assertNotIn("Schemes", action.get_keys(profile)[0])  # PCManFM 1.3 crashes at it
+
     def test_all_that_can_be_shared_can_be_opened_with_it(self):
         table = (SOURCE / "src/PellikoUploadDataManager/SupportedFileTypes.cpp").read_text()
         names = re.findall(r'"(\w+)"', table.split("supported_extensions[] = {")[1].split("};")[0])
