@@ -24,11 +24,6 @@ ErrorWords wordsByStatus(int status)
                 "Many requests came from your connection. Wait a few minutes, then open the link "
                 "again.",
                 false};
-    if (status == 503)
-        return {Mark::clock, "The server is busy",
-                "It has more to do than it can manage at the moment. Wait a few minutes, then open "
-                "the link again.",
-                false};
     if (status >= 500)
         return {Mark::trouble, "This did not work", "The server could not answer. Try again later.",
                 true};
@@ -57,6 +52,11 @@ ErrorWords wordsOf(const ErrorEntry &entry)
         return {Mark::takenBack, "No longer shared",
                 "The sender has taken this share back, so it cannot be downloaded any more. If you "
                 "still need it, ask the sender.",
+                false};
+    case Error::busy:
+        return {Mark::clock, "The server is busy",
+                "It has more to do than it can manage at the moment. Wait a few minutes, then open "
+                "the link again.",
                 false};
     default:
         return wordsByStatus(entry.status);

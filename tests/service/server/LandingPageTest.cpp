@@ -4,6 +4,7 @@
 #include "pages/HomePage.h"
 #include "pages/PageCatalogues.h"
 #include "pages/TextInPlace.h"
+#include "text/Escape.h"
 
 #include <gmock/gmock.h>
 
@@ -39,10 +40,10 @@ std::string errorBody(Error error, const PageLanguage &language = {})
 
 /// Every refusal that a page can tell of; the others belong to the calls of accounts.
 constexpr Error errorsOfPages[] = {
-    Error::badRequest,      Error::notFound,  Error::methodNotAllowed,
-    Error::expired,         Error::withdrawn, Error::rangeNotSatisfiable,
-    Error::tooManyAttempts, Error::internal,  Error::busy,
-    Error::noSpace};
+    Error::badRequest,      Error::notFound,   Error::methodNotAllowed,
+    Error::expired,         Error::withdrawn,  Error::rangeNotSatisfiable,
+    Error::tooManyAttempts, Error::internal,   Error::busy,
+    Error::noSpace,         Error::unavailable};
 
 TEST(LandingPage, TellsSenderFilesSizesAndEnd)
 {
@@ -171,9 +172,9 @@ TEST(ErrorPage, WhoHasToWaitIsToldSoAndHowLong)
 
 TEST(ErrorPage, FailuresOfTheServerAreNotBlamedOnTheReader)
 {
-    for (const Error error : {Error::internal, Error::noSpace}) {
+    for (const Error error : {Error::internal, Error::noSpace, Error::unavailable}) {
         EXPECT_THAT(errorBody(error), HasSubstr("The server could not answer"));
-        EXPECT_THAT(errorBody(error), HasSubstr(errorEntry(error).sentence));
+        EXPECT_THAT(errorBody(error), HasSubstr(htmlEscape(errorEntry(error).sentence)));
     }
     EXPECT_THAT(errorBody(Error::methodNotAllowed), Not(HasSubstr("could not answer")));
     EXPECT_THAT(errorBody(Error::rangeNotSatisfiable), HasSubstr("Open the link again"));
