@@ -33,7 +33,7 @@ Evas_Object *Chips::addRow()
     append(place_, scroller);
     Evas_Object *row = elm_box_add(scroller);
     elm_box_horizontal_set(row, EINA_TRUE);
-    elm_box_align_set(row, elm_object_mirrored_get(row) ? 1.0 : 0.0, 0.5);
+    elm_box_align_set(row, 0.0, 0.5);
     elm_box_padding_set(row, scaled(gap), 0);
     evas_object_size_hint_weight_set(row, EVAS_HINT_EXPAND, EVAS_HINT_EXPAND);
     elm_object_content_set(scroller, row);
