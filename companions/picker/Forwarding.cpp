@@ -18,6 +18,7 @@ void addRecipients(app_control_h request, const std::vector<int32_t> &numberIds)
     std::vector<std::string> texts;
     std::vector<const char *> pointers;
     texts.reserve(numberIds.size());
+    pointers.reserve(numberIds.size());
     for (const int32_t id : numberIds)
         pointers.push_back(texts.emplace_back(std::to_string(id)).c_str());
     app_control_add_extra_data_array(request, APP_CONTROL_DATA_TO, pointers.data(),
