@@ -110,6 +110,7 @@ def upgrade():
 
 
 def remove():
+    programs = {path for path in run("dpkg", "--listfiles", *PACKAGES).splitlines() if os.path.isfile(path) and os.access(path, os.X_OK)}
     run("systemctl", "stop", "user@1000.service", "nginx.service")
     os.remove("/etc/nginx/sites-enabled/pelliko")
     os.remove("/etc/nginx/sites-available/pelliko")
@@ -117,13 +118,13 @@ def remove():
     check(os.path.exists(CONFIGURATION) and os.path.exists("/var/lib/pelliko-server/metadata.db")
           and os.path.exists(f"{APPLICATION}/data/.pelliko.db"), "removed packages leave configuration and data")
     run("dpkg", "--purge", *PACKAGES)
-    running = [name for name in os.listdir("/proc") if name.isdigit() and "pelliko" in command_of(name)]
-    check(not running, "nothing of them runs any more")
+    check(not programs & {program_of(name) for name in os.listdir("/proc") if name.isdigit()}, "nothing of them runs any more")
 
 
-def command_of(process):
+def program_of(process):
+    """The path of what a process runs, also when the file is gone."""
     try:
-        return os.path.basename(os.readlink(f"/proc/{process}/exe"))
+        return os.readlink(f"/proc/{process}/exe").removesuffix(" (deleted)")
     except OSError:
         return ""
 
