@@ -78,7 +78,7 @@ def install():
     run("dpkg", "--install", *glob.glob("/run/packages/pelliko*.deb"))
     check(run("dpkg", "--audit") == "", "the packages are installed, with dependencies of the archive alone")
     check(run("pelliko-owner") == USER, "the application is given to the machine's only person")
-    for program in ("pelliko-server", "pelliko-service", "app-launch", "contacts-tool", "quickpanel-tool", "velmora-log"):
+    for program in ("pelliko", "pelliko-server", "pelliko-service", "app-launch", "contacts-tool", "quickpanel-tool", "velmora-log"):
         run(program, "--help")
 
 
