@@ -85,7 +85,8 @@ void addStores(CLI::App &command, StoreOptions &options)
                        "Directory of everything the server keeps, as far as nothing else is given");
     command.add_option("--metadata", options.urls.metadata,
                        "What is known about shares: sqlite:PATH or postgresql://HOST/DATABASE");
-    command.add_option("--blobs", options.urls.blobs, "The bytes of files: dir:PATH or s3://HOST/BUCKET");
+    command.add_option("--blobs", options.urls.blobs,
+                       "The bytes of files: dir:PATH or s3://HOST/BUCKET");
 }
 
 void addServe(CLI::App &app, ServeOptions &options)
