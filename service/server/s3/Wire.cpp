@@ -125,8 +125,11 @@ void Wire::State::start(const WireRequest &request, bool asStream)
     headerBytes = 0;
     result = CURLE_OK;
     streaming = asStream;
-    for (const auto &[name, value] : request.headers)
-        headers = curl_slist_append(headers, (name + ": " + value).c_str());
+    std::string line;
+    for (const auto &[name, value] : request.headers) {
+        line.assign(name).append(": ").append(value);
+        headers = curl_slist_append(headers, line.c_str());
+    }
     // The whole body is at hand: asking first costs more than it saves.
     headers = curl_slist_append(headers, "Expect:");
     headers = curl_slist_append(headers, "Content-Type:");

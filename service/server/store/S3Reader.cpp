@@ -49,7 +49,7 @@ std::unique_ptr<S3Reader> S3Reader::open(s3::Client &client, const std::string &
     }
 }
 
-S3Reader::S3Reader(s3::Client &client, std::string name, s3::Client::Stream beginning)
+S3Reader::S3Reader(s3::Client &client, std::string name, const s3::Client::Stream &beginning)
     : m_client(client), m_name(std::move(name)), m_size(beginning.size), m_etag(beginning.etag)
 {
 }

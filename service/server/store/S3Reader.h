@@ -20,7 +20,7 @@ public:
     std::size_t read(std::uint64_t offset, std::span<char> into) override;
 
 private:
-    S3Reader(s3::Client &client, std::string name, s3::Client::Stream beginning);
+    S3Reader(s3::Client &client, std::string name, const s3::Client::Stream &beginning);
 
     void begin(std::uint64_t offset);
     std::size_t readStream(std::span<char> into);

@@ -36,7 +36,8 @@ class S3Case(ServerCase):
         super().setUp()
 
     def other_stores(self):
-        return ["--blobs", f"s3://127.0.0.1:{self.proxy.port}/{BUCKET}/{self.prefix}?tls=off{self.store_options}"]
+        return [*super().other_stores(), "--blobs",
+                f"s3://127.0.0.1:{self.proxy.port}/{BUCKET}/{self.prefix}?tls=off{self.store_options}"]
 
     # The store, seen from outside
 
