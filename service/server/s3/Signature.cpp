@@ -65,7 +65,7 @@ std::string namesOf(const Pairs &headers)
 {
     std::string names;
     for (const auto &[name, value] : headers)
-        names += (names.empty() ? "" : ";") + name;
+        names.append(names.empty() ? "" : ";").append(name);
     return names;
 }
 
@@ -75,7 +75,7 @@ std::string signatureOf(const Signable &request, const std::string &query,
 {
     std::string canonical = request.method + "\n" + request.path + "\n" + query + "\n";
     for (const auto &[name, value] : request.headers)
-        canonical += name + ":" + value + "\n";
+        canonical.append(name).append(":").append(value).append("\n");
     canonical += "\n" + namesOf(request.headers) + "\n";
     canonical += payloadHash;
     const std::string time = signingTime(signer.now);
@@ -109,7 +109,7 @@ std::string encodedQuery(Pairs query)
     std::sort(query.begin(), query.end());
     std::string text;
     for (const auto &[name, value] : query)
-        text += (text.empty() ? "" : "&") + name + "=" + value;
+        text.append(text.empty() ? "" : "&").append(name).append("=").append(value);
     return text;
 }
 
