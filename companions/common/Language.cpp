@@ -51,8 +51,11 @@ void applyLanguage()
         setenv("LANGUAGE", (std::string(name.get()) + ":en").c_str(), 1);
     }
     const char *locale = setlocale(LC_ALL, "");
-    if (!locale || std::strcmp(setlocale(LC_MESSAGES, nullptr), "C") == 0)
+    if (!locale || std::strcmp(setlocale(LC_MESSAGES, nullptr), "C") == 0) {
+        // Texts that were looked up are kept until the locale changes.
+        setlocale(LC_ALL, "C");
         setlocale(LC_ALL, "C.UTF-8");
+    }
     elm_language_set(name ? name.get() : "");
     // The toolkit would ask its own catalogue, which knows only installed locales.
     elm_config_mirrored_set(name && isRightToLeft(name.get()) ? EINA_TRUE : EINA_FALSE);
