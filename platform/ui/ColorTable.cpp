@@ -70,16 +70,10 @@ void apply(Uxt_Color_Table &table)
 }
 
 // The one in use follows the user, also while its colours are on the screen.
-void followDesktop()
+void applyAgain()
 {
-    static const bool following = [] {
-        pelliko::ui::watchDesktopSettings([] {
-            if (inUse)
-                apply(*inUse);
-        });
-        return true;
-    }();
-    (void)following;
+    if (inUse)
+        apply(*inUse);
 }
 
 } // namespace
@@ -105,7 +99,7 @@ Eina_Bool uxt_theme_set_color_table(Uxt_Color_Table *table)
         return EINA_FALSE;
     inUse = table;
     apply(*table);
-    followDesktop();
+    pelliko::ui::watchDesktopSettings(applyAgain);
     return EINA_TRUE;
 }
 

@@ -4,7 +4,6 @@
 
 #include <algorithm>
 #include <cstdlib>
-#include <utility>
 #include <vector>
 
 namespace pelliko::ui
@@ -17,11 +16,11 @@ constexpr const char *schemaName = "org.gnome.desktop.interface";
 constexpr const char *colorKey = "color-scheme";
 constexpr const char *textKey = "text-scaling-factor";
 
-std::vector<std::function<void()>> listeners;
+std::vector<void (*)()> listeners;
 
 void callListeners(GSettings *, const char *, void *)
 {
-    for (const auto &listener : listeners)
+    for (void (*listener)() : listeners)
         listener();
 }
 
@@ -76,9 +75,10 @@ double wishedTextScale()
                : 1.0;
 }
 
-void watchDesktopSettings(std::function<void()> changed)
+void watchDesktopSettings(void (*changed)())
 {
-    listeners.push_back(std::move(changed));
+    if (std::find(listeners.begin(), listeners.end(), changed) == listeners.end())
+        listeners.push_back(changed);
     desktopSettings();
 }
 

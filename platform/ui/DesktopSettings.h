@@ -1,7 +1,6 @@
 // What the desktop's user has asked of all programs: light or dark colours, larger texts.
 #pragma once
 
-#include <functional>
 #include <string>
 
 namespace pelliko::ui
@@ -15,6 +14,7 @@ std::string wishedPalette();
 double wishedTextScale();
 
 /// Calls back on the main loop whenever one of the above may have changed, until the process ends.
-void watchDesktopSettings(std::function<void()> changed);
+/// The same function twice is called once.
+void watchDesktopSettings(void (*changed)());
 
 } // namespace pelliko::ui

@@ -37,16 +37,10 @@ void apply(const Uxt_Font_Table &table)
 }
 
 // The one in use follows the user, also while its texts are on the screen.
-void followDesktop()
+void applyAgain()
 {
-    static const bool following = [] {
-        pelliko::ui::watchDesktopSettings([] {
-            if (inUse)
-                apply(*inUse);
-        });
-        return true;
-    }();
-    (void)following;
+    if (inUse)
+        apply(*inUse);
 }
 
 } // namespace
@@ -85,7 +79,7 @@ Eina_Bool uxt_theme_set_font_table(Uxt_Font_Table *table)
         return EINA_FALSE;
     inUse = table;
     apply(*table);
-    followDesktop();
+    pelliko::ui::watchDesktopSettings(applyAgain);
     return EINA_TRUE;
 }
 

@@ -61,7 +61,7 @@ TEST_F(EveryPopup, IsWholeInEveryLanguageAndSize)
     for (const std::string &letters : wished("PELLIKO_LOOKS_LETTERS", "1.3")) {
         enlargeTexts(wish, std::stod(letters));
         for (const std::string &scale : wished("PELLIKO_LOOKS_SCALES", "2.5"))
-            for (const std::string &language : wished("PELLIKO_LOOKS_LANGUAGES", "de ar hi"))
+            for (const std::string &language : wished("PELLIKO_LOOKS_LANGUAGES", "de ar"))
                 lookAtAll(language, std::stod(scale), std::stod(letters));
     }
 }
