@@ -17,6 +17,7 @@ constexpr std::size_t numbersAtOnce = 300;
 std::vector<std::int64_t> idsOf(const std::vector<ShareRow> &shares)
 {
     std::vector<std::int64_t> ids;
+    ids.reserve(shares.size());
     for (const ShareRow &share : shares)
         ids.push_back(share.id);
     return ids;
@@ -157,6 +158,7 @@ std::vector<ShareRecord> PostgresMetadata::listShares(std::int64_t account, Seco
             shares.push_back(shareRowOf(rows, now));
         addParts(db, shares);
         std::vector<ShareRecord> records;
+        records.reserve(shares.size());
         for (ShareRow &share : shares)
             records.push_back(std::move(share.record));
         return records;
