@@ -19,7 +19,7 @@ from world import LIMIT, WorldError, run, wait_for
 
 _EVENTS = ("object:state-changed:showing", "object:state-changed:visible", "object:children-changed",
            "object:bounds-changed", "window:create", "window:activate", "object:state-changed:focused",
-           "object:text-changed:insert", "object:text-changed:delete")
+           "object:text-changed:insert", "object:text-changed:delete", "object:property-change:accessible-name")
 _CURSOR_WIDTH, _CURSOR_HEIGHT = 16, 64  # what is drawn anew when a text cursor blinks, in whole tiles
 
 
@@ -126,6 +126,24 @@ def awake():
         yield
     finally:
         drawing.close()
+
+
+@contextlib.contextmanager
+def _forgetting(seconds):
+    """Forgets what is remembered of every program's controls after so long, and wakes the loop."""
+    timer = GLib.timeout_add_seconds(seconds, _forget)
+    try:
+        yield
+    finally:
+        if GLib.MainContext.default().find_source_by_id(timer):
+            GLib.source_remove(timer)
+
+
+def _forget():
+    for application in pyatspi.Registry.getDesktop(0):
+        if application:
+            application.clear_cache()
+    return GLib.SOURCE_REMOVE
 
 
 def wait_for_control(label, role=None, limit=LIMIT):

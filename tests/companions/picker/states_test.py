@@ -58,7 +58,9 @@ class PickerCase(companion_case.CompanionCase):
                                             if name.startswith(start) and role == "list item"), None), f"a row “{start}”")
 
     def choose(self, start):
-        self.press(self.row(start), "list item")
+        name = self.row(start)
+        screen.wait_still(0.6)  # a list that is laid out anew between press and release takes no press
+        self.press(name, "list item")
 
     def type(self, text):
         screen.type_into(SEARCH, text)
@@ -131,8 +133,13 @@ class Requests(PickerCase):
     def test_an_earlier_share_is_told_by_its_files(self):
         service = doubles.SharesService()
         self.addCleanup(service.close)
-        service.sent = [doubles.sent(7, doubles.AVAILABLE, [], files=[("plan.pdf", 1, "")] * 5)]
+        questions = []
+        service.on_ListSent = lambda call, _sender: questions.append(call)
         self.launch("share", "--extra", "pk_reshare=7")
+        self.see("Files that you have shared before")
+        world.wait_for(lambda: questions, "the question what was shared")
+        sent = doubles.sent(7, doubles.AVAILABLE, [], files=[("plan.pdf", 1, "")] * 5)
+        questions[0].return_value(doubles.GLib.Variant("(aa{sv})", ([sent],)))
         self.see("5 files · " + ", ".join(["\u2068plan.pdf\u2069"] * 3) + " and 2 more")
 
     def test_a_start_without_anything_to_share_says_what_to_do(self):
