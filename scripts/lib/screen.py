@@ -19,7 +19,7 @@ from world import LIMIT, WorldError, run, wait_for
 
 _EVENTS = ("object:state-changed:showing", "object:state-changed:visible", "object:children-changed",
            "object:bounds-changed", "window:create", "window:activate", "object:state-changed:focused",
-           "object:text-changed:insert", "object:text-changed:delete", "object:property-change:accessible-name")
+           "object:text-changed:insert", "object:text-changed:delete")
 _CURSOR_WIDTH, _CURSOR_HEIGHT = 16, 64  # what is drawn anew when a text cursor blinks, in whole tiles
 
 
@@ -149,10 +149,18 @@ def _forget():
 def wait_for_control(label, role=None, limit=LIMIT):
     """Waits until a control with this label shows and returns its extents.
 
-    A program may announce a control a moment before it answers for it; what it draws then is looked at too.
+    A program may announce a control a moment before it answers for it; what it draws then is looked at too. A name that
+    was asked for while it changed is remembered as it was, so what is remembered is forgotten once.
     """
-    with awake():
+    with awake(), _forgetting(5):
         return wait_for(lambda: find(label, role), f"the control “{label}”", limit)
+
+
+def wait_for_row(start, role, limit=LIMIT):
+    """Waits until a control whose name begins so shows, and returns its name."""
+    with awake(), _forgetting(5):
+        return wait_for(lambda: next((name for name, found, _, _ in controls() if name.startswith(start) and role in found),
+                                     None), f"a row “{start}”", limit)
 
 
 def _window_with_keyboard(display):

@@ -78,8 +78,7 @@ class CompanionsCase(share_case.ShareCase):
 
     @staticmethod
     def row(start, kind="button"):
-        return world.wait_for(lambda: next((name for name, role, _, _ in screen.controls()
-                                            if name.startswith(start) and kind in role), None), f"a row “{start}”")
+        return screen.wait_for_row(start, kind)
 
 
 class SentShares(CompanionsCase):

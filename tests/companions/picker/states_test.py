@@ -54,8 +54,7 @@ class PickerCase(companion_case.CompanionCase):
         self.addCleanup(self.pelliko.close)
 
     def row(self, start):
-        return world.wait_for(lambda: next((name for name, role, _, _ in screen.controls()
-                                            if name.startswith(start) and role == "list item"), None), f"a row “{start}”")
+        return screen.wait_for_row(start, "list item")
 
     def choose(self, start):
         name = self.row(start)
