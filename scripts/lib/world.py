@@ -156,6 +156,18 @@ class BusName:
                              "GetConnectionUnixProcessID", GLib.Variant("(s)", (self.name,)), None,
                              Gio.DBusCallFlags.NONE, 5000).unpack()[0]
 
+    def kill(self):
+        """Ends the program and waits until it is gone; False when it had left, or was leaving, by itself."""
+        if self.owner is None:
+            return False
+        try:
+            os.kill(self.process_id(), signal.SIGKILL)
+            killed = True
+        except (GLib.Error, ProcessLookupError):
+            killed = False
+        self.wait_gone()
+        return killed
+
 
 # --- contacts and launch requests ---------------------------------------------------------------
 

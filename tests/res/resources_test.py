@@ -69,7 +69,7 @@ class Resources(unittest.TestCase):
 
     def test_menus_name_the_companions_in_every_language(self):
         entries = list((BUILD / "companions").glob("*/*.desktop"))
-        self.assertEqual(len(entries), 3)
+        self.assertEqual(len(entries), 4)
         wanted = {path.stem for path in (SOURCE / "res/locale").glob("*.po")} - {"en"}
         for entry in entries:
             for key in ("Name", "Comment"):
@@ -84,7 +84,10 @@ class Resources(unittest.TestCase):
     def test_every_class_of_the_layouts_is_in_the_tables(self):
         layouts = "".join(path.read_text() for path in (SOURCE / "res/edje").glob("*.edc"))
         fonts = {font.get("class") for font in table("FontInfoTable").iter("font")}
-        self.assertEqual(set(re.findall(r'"(pelliko/[a-z/]+)"', layouts)) - set(colors()), set())
+        named = set(re.findall(r'"(pelliko/[a-z/]*[a-z])"', layouts))
+        named |= {f"pelliko/person/{number}" for number in re.findall(r"\bGROUND\((\d)\)", layouts)}
+        self.assertEqual(named - set(colors()), set())
+        self.assertIn("pelliko/person/5", named)
         self.assertEqual(set(re.findall(r"text_class[=: ]+\"?(pelliko_[a-z]+)", layouts)) - fonts, set())
 
     def test_locales_are_made_once_and_kept(self):

@@ -4,7 +4,6 @@ are damaged and a disk that is full. No program crashes, and what can be sent is
 import glob
 import os
 import re
-import signal
 import subprocess
 import unittest
 
@@ -56,13 +55,6 @@ class Faults(share_case.ShareCase):
                 file.write(change(before))
         self.reload_services()
 
-    @staticmethod
-    def kill(name):
-        running = world.BusName(name)
-        if running.owner:
-            os.kill(running.process_id(), signal.SIGKILL)
-            running.wait_gone()
-
     def wait_progress(self, part):
         world.wait_for(lambda: any(i["progress"] >= part for i in self.posted(event="update")), f"{part} of the upload")
 
@@ -112,7 +104,7 @@ class Faults(share_case.ShareCase):
         self.confirm()
         self.wait_progress(0.2)
         self.replace_service("org.freedesktop.Notifications", None)
-        self.kill("org.freedesktop.Notifications")
+        world.BusName("org.freedesktop.Notifications").kill()
         self.wait_progress(0.6)
         world.activation_environment(PELLIKO_UPLOAD_RATE="0")
         self.wait_sent_and_gone()
@@ -120,8 +112,8 @@ class Faults(share_case.ShareCase):
 
     def test_damaged_databases_do_not_stop_a_share(self):
         self.panel.close()  # while it begins to watch it would start the panel again
-        self.kill("com.velmora.quickpanel")
-        self.kill(world.SERVICE)
+        world.BusName("com.velmora.quickpanel").kill()
+        world.BusName(world.SERVICE).kill()
         paths = [os.path.join(PLATFORM, "notifications.db"), os.path.join(DATA, ".pelliko.db"),
                  os.path.join(PLATFORM, "preferences", world.APP + ".db"),
                  os.path.join(os.environ["XDG_DATA_HOME"], "pelliko-service", "queue.db")]

@@ -12,7 +12,6 @@ import contextlib
 import fcntl
 import os
 import random
-import signal
 import sqlite3
 import sys
 import unittest
@@ -69,12 +68,8 @@ class Killing(share_case.ShareCase):
         if victim == "server":
             world.kill_server()
             return
-        name = world.BusName(NAMES[victim])
-        if name.owner is None:
+        if not world.BusName(NAMES[victim]).kill():
             print(f"  the {victim} had left by itself", flush=True)
-            return
-        os.kill(name.process_id(), signal.SIGKILL)
-        name.wait_gone()
 
     def bring_back(self, victim):
         """As the system does: a login starts the service, its supervisor the server; the bus starts the others."""

@@ -1,6 +1,5 @@
 """The ground under the tests of companions: a person in front of one program, in a private world."""
 
-import contextlib
 import os
 import subprocess
 import sys
@@ -32,10 +31,7 @@ class CompanionCase(unittest.TestCase):
     def _end(self):
         if not all(case is not self for case, _ in self._outcome.result.failures + self._outcome.result.errors):
             self.picture(self._testMethodName)
-        if self.application.owner:
-            with contextlib.suppress(world.GLib.Error, ProcessLookupError):  # it is just leaving by itself
-                os.kill(self.application.process_id(), 9)
-            self.application.wait_gone()
+        self.application.kill()
 
     def launch(self, operation="default", *options):
         return world.launch(operation, *options, app=self.program)

@@ -346,8 +346,8 @@ class ByItself(SignInCase):
         self.start()
         screen.wait_active(WINDOW)
         # Twice the same key within a millisecond is one to the toolkit; no hand is that quick.
-        world.run("xdotool", "type", "--delay", "12", "--args", "1", NUMBER, "key", "Return",
-                  "type", "--delay", "12", "--args", "1", account_command("invite"), "key", "Return")
+        world.run("xdotool", "type", "--delay", "12", "--args", "1", "--", NUMBER, "key", "Return",
+                  "type", "--delay", "12", "--args", "1", "--", account_command("invite"), "key", "Return")
         screen.wait_for_control("You are signed in")
         self.assertEqual(NUMBER, self.account()["number"])
 
