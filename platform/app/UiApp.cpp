@@ -1,5 +1,6 @@
 #include "Frame.h"
 #include "GlibPump.h"
+#include "Readers.h"
 
 #include <ApplicationId.h>
 #include <FilesReceiver.h>
@@ -145,6 +146,7 @@ int ui_app_main(int argc, char **argv, ui_app_lifecycle_callback_s *callback, vo
         return role == Role::HandedOver ? APP_ERROR_NONE : APP_ERROR_INVALID_CONTEXT;
     if (receiver.onlyPassedOn())
         return APP_ERROR_NONE;
+    connectReaders();
     if (callback->create && !callback->create(user_data))
         return APP_ERROR_INVALID_CONTEXT;
     runLoop(receiver, start, *callback, user_data);
