@@ -3,46 +3,63 @@
 #include <Eldbus.h>
 #include <Elementary.h>
 
+#include <utility>
+
 namespace pelliko::platform
 {
 namespace
 {
 
 constexpr double mostMs = 500;
+/// The toolkit asks whether readers are there, and then where. For the second answer it gives a
+/// tenth of a second, and does without readers when the loop was busy meanwhile, as a popup makes
+/// it.
+constexpr int questions = 2;
 
-void noteAnswer(void *data, const Eldbus_Message *, Eldbus_Pending *)
+} // namespace
+
+Readers::~Readers()
 {
-    *static_cast<bool *>(data) = true;
+    then_ = nullptr;
+    if (pending_)
+        eldbus_pending_cancel(pending_);
+    if (bus_)
+        eldbus_connection_unref(bus_);
+}
+
+void Readers::whenConnected(std::function<void()> then)
+{
+    if (elm_config_atspi_mode_get())
+        bus_ = eldbus_connection_get(ELDBUS_CONNECTION_TYPE_SESSION);
+    if (!bus_) {
+        then();
+        return;
+    }
+    then_ = std::move(then);
+    ask();
 }
 
 // Whoever answers does so in the order of the questions: after this one, those that the toolkit had
 // asked on the same connection are answered too.
-void awaitAnswersOfAccessibilityBus(Eldbus_Connection *bus)
+void Readers::ask()
 {
-    bool answered = false;
     Eldbus_Message *question = eldbus_message_method_call_new("org.a11y.Bus", "/org/a11y/bus",
                                                               "org.a11y.Bus", "GetAddress");
-    if (!question || !eldbus_connection_send(bus, question, noteAnswer, &answered, mostMs))
-        return;
-    while (!answered)
-        ecore_main_loop_iterate_may_block(EINA_TRUE);
+    pending_ = question ? eldbus_connection_send(bus_, question, onAnswer, this, mostMs) : nullptr;
+    if (!pending_)
+        std::exchange(then_, nullptr)();
 }
 
-} // namespace
-
-// The toolkit asks whether readers are there, and then where. For the second answer it gives a
-// tenth of a second, and does without readers when the loop was busy meanwhile, as a popup makes
-// it.
-void connectReaders()
+void Readers::onAnswer(void *data, const Eldbus_Message *, Eldbus_Pending *)
 {
-    if (!elm_config_atspi_mode_get())
+    auto *self = static_cast<Readers *>(data);
+    self->pending_ = nullptr;
+    if (!self->then_)
         return;
-    Eldbus_Connection *bus = eldbus_connection_get(ELDBUS_CONNECTION_TYPE_SESSION);
-    if (!bus)
-        return;
-    for (int question = 0; question < 2; ++question)
-        awaitAnswersOfAccessibilityBus(bus);
-    eldbus_connection_unref(bus);
+    if (++self->answers_ < questions)
+        self->ask();
+    else
+        std::exchange(self->then_, nullptr)();
 }
 
 } // namespace pelliko::platform

@@ -1,12 +1,39 @@
 // Screen readers and other assistive programs
 #pragma once
 
+#include <functional>
+
+struct _Eldbus_Connection;
+struct _Eldbus_Message;
+struct _Eldbus_Pending;
+
 namespace pelliko::platform
 {
 
-/// Lets the toolkit connect to the accessibility bus where it wants to, before anything keeps the
-/// main loop busy. Returns at once without such a bus, within a second at most. Main thread, after
-/// elm_init().
-void connectReaders();
+/// Tells when the toolkit has connected to the accessibility bus, if it wants to: nothing should
+/// keep the main loop busy before. Main thread, after elm_init().
+class Readers
+{
+public:
+    Readers() = default;
+    /// Nothing is told any more.
+    ~Readers();
+    Readers(const Readers &) = delete;
+    Readers &operator=(const Readers &) = delete;
+
+    /// Calls `then` once: at once where there are no readers, else from the loop, within a second
+    /// at most.
+    void whenConnected(std::function<void()> then);
+
+private:
+    void ask();
+    static void onAnswer(void *data, const struct _Eldbus_Message *answer,
+                         struct _Eldbus_Pending *pending);
+
+    std::function<void()> then_;
+    struct _Eldbus_Connection *bus_ = nullptr;
+    struct _Eldbus_Pending *pending_ = nullptr;
+    int answers_ = 0;
+};
 
 } // namespace pelliko::platform

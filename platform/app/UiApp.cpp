@@ -118,12 +118,15 @@ Role findRole(RequestReceiver &receiver, const Start &start)
 void runLoop(RequestReceiver &receiver, const Start &start,
              const ui_app_lifecycle_callback_s &callbacks, void *userData)
 {
-    receiver.deliver(
-        [&](app_control_h request) {
-            if (callbacks.app_control)
-                callbacks.app_control(request, userData);
-        },
-        requestForFiles(start.files), !start.files.empty());
+    Readers readers;
+    readers.whenConnected([&] {
+        receiver.deliver(
+            [&](app_control_h request) {
+                if (callbacks.app_control)
+                    callbacks.app_control(request, userData);
+            },
+            requestForFiles(start.files), !start.files.empty());
+    });
     watchLanguage();
     elm_run();
     unwatchLanguage();
@@ -146,7 +149,6 @@ int ui_app_main(int argc, char **argv, ui_app_lifecycle_callback_s *callback, vo
         return role == Role::HandedOver ? APP_ERROR_NONE : APP_ERROR_INVALID_CONTEXT;
     if (receiver.onlyPassedOn())
         return APP_ERROR_NONE;
-    connectReaders();
     if (callback->create && !callback->create(user_data))
         return APP_ERROR_INVALID_CONTEXT;
     runLoop(receiver, start, *callback, user_data);
