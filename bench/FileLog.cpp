@@ -5,6 +5,7 @@
 #include <fcntl.h>
 #include <filesystem>
 #include <fstream>
+#include <mutex>
 #include <string>
 #include <thread>
 #include <unistd.h>
@@ -54,6 +55,14 @@ void appendPlainLine(int)
         giveUp("cannot write " + path);
 }
 
+// The log's lines stand in the order of their times, so two are never written at once.
+void appendPlainLineAlone(int number)
+{
+    static std::mutex one;
+    const std::lock_guard lock(one);
+    appendPlainLine(number);
+}
+
 // Microseconds per line on the clock, when so many threads write at once.
 double perLine(void (*writeOne)(int), int threads)
 {
@@ -74,6 +83,16 @@ double perLine(void (*writeOne)(int), int threads)
     return 1e6 * seconds / linesOfRound;
 }
 
+// A log that has become full over days is on the disk, and so are its archives.
+void settle()
+{
+    for (const auto &entry : std::filesystem::directory_iterator(folder)) {
+        const int file = open(entry.path().c_str(), O_RDONLY | O_CLOEXEC);
+        if (file < 0 || fsync(file) != 0 || close(file) != 0)
+            giveUp("cannot write " + entry.path().string());
+    }
+}
+
 // Different lines, as packing equal ones would be too easy.
 void fill(const std::string &name)
 {
@@ -84,6 +103,8 @@ void fill(const std::string &name)
         line.resize(std::min(line.size(), almostFull - static_cast<size_t>(file.tellp())));
         file << line;
     }
+    file.close();
+    settle();
 }
 
 double rotation()
@@ -109,12 +130,17 @@ double tarAlone()
 bool compareLines(int rounds, int threads)
 {
     const std::string who = std::to_string(threads) + (threads == 1 ? " thread" : " threads");
-    const auto medians = mediansInTurns(
-        rounds,
-        {{"a line of the log, " + who, [=] { return perLine(writeLogLine, threads); }},
-         {"open, write, close, " + who, [=] { return perLine(appendPlainLine, threads); }}},
-        "µs");
+    std::vector<Side> sides = {
+        {"a line of the log, " + who, [=] { return perLine(writeLogLine, threads); }},
+        {"open, write, close, " + who, [=] { return perLine(appendPlainLine, threads); }}};
+    if (threads > 1)
+        sides.push_back({"the same, one thread at a time",
+                         [=] { return perLine(appendPlainLineAlone, threads); }});
+    const auto medians = mediansInTurns(rounds, sides, "µs");
     std::printf("%.0f against %.0f lines a second\n", 1e6 / medians[0], 1e6 / medians[1]);
+    if (threads > 1)
+        std::printf("a line, %s / one thread at a time = %.2f\n", who.c_str(),
+                    medians[0] / medians[2]);
     return judge("a line, " + who, medians[0], medians[1], mostPerLine);
 }
 

@@ -19,9 +19,13 @@ constexpr const char *pictures = "res/images/sender-images/WVGA/";
 constexpr double appScale = 1.8;
 constexpr int badgeSize = 30;
 
+constexpr int margin = 24; ///< beside the popup's contents
+
 struct Shown {
-    std::string person;  ///< name of the one recipient
-    std::string summary; ///< number and size of the files
+    std::string person;   ///< name of the one recipient
+    std::string initials; ///< what stands for their picture
+    std::string ground;   ///< the number of its colour
+    std::string summary;  ///< number and size of the files
 };
 
 std::string path(const char *name)
@@ -81,12 +85,14 @@ Evas_Object *addPicture(Evas_Object *item, const char *name, const char *colorCl
     return image;
 }
 
-Evas_Object *addPerson(Evas_Object *box, Elm_Theme *theme, const std::string &name)
+Evas_Object *addPerson(Evas_Object *box, Elm_Theme *theme, const Shown &shown)
 {
     Evas_Object *item = addLayout(box, theme, "1icon.1text.remoteshare");
-    elm_object_part_text_set(item, "elm.text", name.c_str());
+    elm_object_part_text_set(item, "elm.text", shown.person.c_str());
     elm_object_part_content_set(item, "elm.swallow.icon",
                                 addPicture(item, "pk_caller_id_default.png", "AO003L1"));
+    edje_object_part_text_set(elm_layout_edje_get(item), "initials", shown.initials.c_str());
+    elm_object_signal_emit(item, ("pelliko,initials," + shown.ground).c_str(), "pelliko");
     Evas_Object *badge = addPicture(item, "pk_badge_ic_sms.png", "AO004");
     const double scale = elm_config_scale_get() / elm_app_base_scale_get();
     const int size = static_cast<int>(std::lround(badgeSize * scale));
@@ -99,7 +105,7 @@ Evas_Object *addPerson(Evas_Object *box, Elm_Theme *theme, const std::string &na
     return item;
 }
 
-void addRow(Evas_Object *layout, Elm_Theme *theme, const std::string &name)
+void addRow(Evas_Object *layout, Elm_Theme *theme, const Shown &shown)
 {
     Evas_Object *row = addLayout(layout, theme, "scroller.swallow");
     Evas_Object *scroller = elm_scroller_add(row);
@@ -115,7 +121,7 @@ void addRow(Evas_Object *layout, Elm_Theme *theme, const std::string &name)
     evas_object_size_hint_align_set(box, EVAS_HINT_FILL, EVAS_HINT_FILL);
     elm_box_align_set(box, 0.5, 0.0);
     elm_object_content_set(scroller, box);
-    elm_box_pack_end(box, addPerson(box, theme, name));
+    elm_box_pack_end(box, addPerson(box, theme, shown));
     elm_object_part_content_set(row, "elm.swallow.content", scroller);
     elm_object_part_content_set(layout, "elm.swallow.scroller", row);
 }
@@ -143,6 +149,50 @@ void addButton(Evas_Object *popup, const char *part, const char *style, const ch
     elm_object_style_set(button, style);
 }
 
+// What the popup's middle takes; nobody sees it.
+Evas_Object *addStrut(Evas_Object *parent, int width)
+{
+    Evas_Object *strut = evas_object_rectangle_add(evas_object_evas_get(parent));
+    evas_object_color_set(strut, 0, 0, 0, 0);
+    evas_object_size_hint_min_set(strut, width, 0);
+    return strut;
+}
+
+void fitHeight(void *data, Evas *, Evas_Object *layout, void *)
+{
+    auto *room = static_cast<Evas_Object *>(data);
+    int width = 0, height = 0;
+    evas_object_size_hint_min_get(room, &width, nullptr);
+    edje_object_size_min_restricted_calc(elm_layout_edje_get(layout), nullptr, &height, width, 0);
+    evas_object_size_hint_min_set(room, width, height);
+}
+
+// As wide as the screen but for the margins, as high as its texts are then, and scrolled where the
+// window is lower.
+void putContents(Evas_Object *win, Evas_Object *popup, Elm_Theme *theme, Evas_Object *layout)
+{
+    int width = 0;
+    elm_win_screen_size_get(win, nullptr, nullptr, &width, nullptr);
+    width -= 2 * static_cast<int>(std::lround(margin * elm_config_scale_get()));
+    Evas_Object *room = addStrut(popup, width);
+    elm_object_part_content_set(layout, "pelliko.width", addStrut(layout, width));
+    Evas_Object *scroller = elm_scroller_add(popup);
+    elm_object_theme_set(scroller, theme);
+    elm_object_style_set(scroller, "pelliko/middle");
+    elm_scroller_policy_set(scroller, ELM_SCROLLER_POLICY_OFF, ELM_SCROLLER_POLICY_AUTO);
+    elm_object_focus_allow_set(scroller, EINA_FALSE);
+    evas_object_size_hint_weight_set(scroller, EVAS_HINT_EXPAND, EVAS_HINT_EXPAND);
+    evas_object_size_hint_align_set(scroller, EVAS_HINT_FILL, EVAS_HINT_FILL);
+    elm_object_content_set(scroller, layout);
+    evas_object_show(scroller);
+    Evas_Object *cell = elm_table_add(popup);
+    elm_table_pack(cell, room, 0, 0, 1, 1);
+    elm_table_pack(cell, scroller, 0, 0, 1, 1);
+    elm_object_content_set(popup, cell);
+    evas_object_event_callback_add(layout, EVAS_CALLBACK_CHANGED_SIZE_HINTS, fitHeight, room);
+    fitHeight(room, nullptr, layout, nullptr);
+}
+
 void showPopup(Evas_Object *win, const Shown &shown)
 {
     Elm_Theme *theme = makeTheme();
@@ -154,10 +204,10 @@ void showPopup(Evas_Object *win, const Shown &shown)
     elm_object_part_text_set(popup, "title,text", "Share files via Pelliko");
     Evas_Object *layout = addLayout(popup, theme, "confirmation_popup_share_view_single");
     addTexts(layout, theme, shown);
-    addRow(layout, theme, shown.person);
+    addRow(layout, theme, shown);
     addButton(popup, "button1", "popup", "Cancel");
     addButton(popup, "button2", "popup/primary", "Share");
-    elm_object_content_set(popup, layout);
+    putContents(win, popup, theme, layout);
     evas_object_show(popup);
     elm_win_raise(win);
     elm_win_activate(win);
@@ -168,9 +218,9 @@ void showPopup(Evas_Object *win, const Shown &shown)
 
 int main(int argc, char **argv)
 {
-    if (argc != 3) {
+    if (argc != 5) {
         std::printf(
-            "Usage: %s NAME SUMMARY\n"
+            "Usage: %s NAME INITIALS GROUND SUMMARY\n"
             "Shows a confirmation popup for one recipient and does nothing else, as the peer of "
             "bench/launch-to-popup.\n",
             argv[0]);
@@ -178,7 +228,7 @@ int main(int argc, char **argv)
     }
     elm_init(argc, argv);
     elm_app_base_scale_set(appScale);
-    showPopup(addWindow(), {argv[1], argv[2]});
+    showPopup(addWindow(), {argv[1], argv[2], argv[3], argv[4]});
     elm_run();
     return 0;
 }
