@@ -14,4 +14,9 @@ void setAccessibleName(Evas_Object *object, const char *name)
     efl_access_object_i18n_name_set(object, name);
 }
 
+void hideFromReaders(Evas_Object *object)
+{
+    efl_access_object_access_type_set(object, EFL_ACCESS_TYPE_DISABLED);
+}
+
 } // namespace pelliko::companion

@@ -6,13 +6,12 @@
 #include <ContactNames.h>
 #include <Language.h>
 #include <Theme.h>
+#include <Usage.h>
 #include <app.h>
 #include <dlog.h>
 #include <efl_extension.h>
 
-#include <cstdio>
 #include <cstdlib>
-#include <cstring>
 #include <utility>
 
 namespace pelliko::history
@@ -32,17 +31,11 @@ HistoryApp::~HistoryApp() = default;
 
 int HistoryApp::onStart(int argc, char **argv)
 {
-    if (argc > 1 && std::strcmp(argv[1], "--help") == 0) {
-        std::printf("Usage: %s\nShows what was shared and received, shares again, withdraws and "
-                    "removes.\n",
-                    argv[0]);
-        return 0;
-    }
-    if (argc > 1) {
-        std::fprintf(stderr, "pelliko-history: it takes no arguments, try --help.\n");
-        return 2;
-    }
-    return WApp::onStart(argc, argv);
+    const auto status =
+        answerArguments(argc, argv,
+                        "Shows what was shared and received, shares again, withdraws and "
+                        "removes.");
+    return status ? *status : WApp::onStart(argc, argv);
 }
 
 bool HistoryApp::onCreate()

@@ -115,6 +115,7 @@ Evas_Object *PersonList::contentOf(void *data, Evas_Object *list, const char *pa
     elm_check_state_set(check, row->chosen ? EINA_TRUE : EINA_FALSE);
     elm_object_focus_allow_set(check, EINA_FALSE);
     evas_object_pass_events_set(check, EINA_TRUE);
+    hideFromReaders(check); // the row's name says whether it is chosen
     return check;
 }
 

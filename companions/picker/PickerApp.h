@@ -3,11 +3,8 @@
 
 #include "PickWindow.h"
 
+#include <OpenWindows.h>
 #include <WApp.h>
-
-#include <map>
-#include <memory>
-#include <vector>
 
 namespace pelliko::picker
 {
@@ -22,14 +19,9 @@ protected:
     void onAppControl(app_control_h request, bool firstLaunch) override;
 
 private:
-    void closeLater(uint32_t key);
-    static void onClose(void *app);
     static void onLanguage(void *app);
 
-    std::map<uint32_t, std::unique_ptr<PickWindow>> windows_;
-    uint32_t lastKey_ = 0;
-    std::vector<uint32_t> closing_;
-    Ecore_Job *job_ = nullptr;
+    companion::OpenWindows<PickWindow> windows_;
 };
 
 } // namespace pelliko::picker

@@ -3,13 +3,11 @@
 #include "Language.h"
 #include "Texts.h"
 #include "Theme.h"
+#include "Usage.h"
 
 #include <app.h>
 #include <dlog.h>
 #include <efl_extension.h>
-
-#include <cstdio>
-#include <cstring>
 
 namespace pelliko::signin
 {
@@ -38,16 +36,9 @@ SignInApp::SignInApp()
 
 int SignInApp::onStart(int argc, char **argv)
 {
-    if (argc > 1 && std::strcmp(argv[1], "--help") == 0) {
-        std::printf("Usage: %s\nSigns in to a share server, or shows the account and signs out.\n",
-                    argv[0]);
-        return 0;
-    }
-    if (argc > 1) {
-        std::fprintf(stderr, "korrin: it takes no arguments, try --help.\n");
-        return 2;
-    }
-    return WApp::onStart(argc, argv);
+    const auto status = answerArguments(
+        argc, argv, "Signs in to a share server, or shows the account and signs out.");
+    return status ? *status : WApp::onStart(argc, argv);
 }
 
 bool SignInApp::onCreate()

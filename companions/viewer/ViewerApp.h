@@ -3,10 +3,8 @@
 
 #include "ShareWindow.h"
 
+#include <OpenWindows.h>
 #include <WApp.h>
-
-#include <memory>
-#include <vector>
 
 namespace pelliko::viewer
 {
@@ -21,14 +19,10 @@ protected:
     void onAppControl(app_control_h request, bool firstLaunch) override;
 
 private:
-    void closeLater(const std::string &token);
-    static void onClose(void *app);
     static void onLanguage(void *app);
     static void onChanged(void *app);
 
-    std::vector<std::unique_ptr<ShareWindow>> windows_;
-    std::vector<std::string> closing_;
-    Ecore_Job *job_ = nullptr;
+    companion::OpenWindows<ShareWindow> windows_;
 };
 
 } // namespace pelliko::viewer

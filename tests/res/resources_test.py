@@ -10,6 +10,10 @@ import xml.etree.ElementTree as xml
 from pathlib import Path
 
 SOURCE, BUILD = Path(sys.argv.pop(1)), Path(sys.argv.pop(1))
+sys.path.insert(0, str(SOURCE / "tests" / "support"))
+
+from contrast import contrast  # noqa: E402
+
 APP = BUILD / "app"
 FILES = [
     "res/edje/pelliko.edj",
@@ -35,6 +39,8 @@ PAIRS = [
     ("pelliko/button/text", "pelliko/button/pressed"),
     ("/fg/normal/popup/text", "pelliko/card"),
     ("AO004", "pelliko/card"),
+    ("pelliko/error", "pelliko/card"),
+    *(("pelliko/person/text", f"pelliko/person/{number}") for number in range(1, 6)),
 ]
 
 
@@ -42,19 +48,10 @@ def table(name):
     return xml.parse(SOURCE / f"res/tables/com.velmora.pelliko_{name}.xml").getroot()
 
 
-def colors():
-    return {color.get("class"): color.get("value") for color in table("ChangeableColorTable").iter("color")}
-
-
-def luminance(color):
-    channels = [int(color[i : i + 2], 16) / 255 for i in (1, 3, 5)]
-    linear = [c / 12.92 if c <= 0.04045 else ((c + 0.055) / 1.055) ** 2.4 for c in channels]
-    return 0.2126 * linear[0] + 0.7152 * linear[1] + 0.0722 * linear[2]
-
-
-def contrast(one, other):
-    light, dark = sorted((luminance(one), luminance(other)), reverse=True)
-    return (light + 0.05) / (dark + 0.05)
+def palettes():
+    """The colours of each palette by class."""
+    return {palette.get("name"): {color.get("class"): color.get("value") for color in palette.iter("color")}
+            for palette in table("ChangeableColorTable").iter("palette")}
 
 
 class Resources(unittest.TestCase):
@@ -77,16 +74,22 @@ class Resources(unittest.TestCase):
                 self.assertEqual(found, wanted, f"{entry}: {key}")
 
     def test_letters_can_be_told_from_their_ground(self):
-        classes = colors()
-        for letters, ground in PAIRS:
-            self.assertGreaterEqual(contrast(classes[letters], classes[ground]), 4.5, f"{letters} on {ground}")
+        self.assertEqual(["light", "dark"], list(palettes()))
+        for name, colors in palettes().items():
+            for letters, ground in PAIRS:
+                with self.subTest(f"{name}: {letters} on {ground}"):
+                    self.assertGreaterEqual(contrast(colors[letters], colors[ground]), 4.5)
+
+    def test_both_palettes_name_the_same_classes(self):
+        light, dark = palettes().values()
+        self.assertEqual(set(light), set(dark))
 
     def test_every_class_of_the_layouts_is_in_the_tables(self):
         layouts = "".join(path.read_text() for path in (SOURCE / "res/edje").glob("*.edc"))
         fonts = {font.get("class") for font in table("FontInfoTable").iter("font")}
         named = set(re.findall(r'"(pelliko/[a-z/]*[a-z])"', layouts))
         named |= {f"pelliko/person/{number}" for number in re.findall(r"\bGROUND\((\d)\)", layouts)}
-        self.assertEqual(named - set(colors()), set())
+        self.assertEqual(named - set(palettes()["light"]), set())
         self.assertIn("pelliko/person/5", named)
         self.assertEqual(set(re.findall(r"text_class[=: ]+\"?(pelliko_[a-z]+)", layouts)) - fonts, set())
 

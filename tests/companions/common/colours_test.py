@@ -2,10 +2,15 @@
 
 import pathlib
 import re
+import sys
 import unittest
 import xml.etree.ElementTree as ElementTree
 
 SOURCE = pathlib.Path(__file__).resolve().parents[3]
+sys.path.insert(0, str(SOURCE / "tests" / "support"))
+
+from contrast import contrast  # noqa: E402
+
 TABLE = SOURCE / "res" / "tables" / "com.velmora.pelliko_ChangeableColorTable.xml"
 LAYOUTS = SOURCE / "companions" / "common" / "edje"
 PAGE = "pelliko/card"  # what Widgets paints behind a page
@@ -26,21 +31,10 @@ def letters_and_grounds():
     pairs |= {(letters, ground) for letters in rows for ground in ("pelliko/row", "pelliko/row/pressed")}
     for kind in ("button", "primary"):
         pairs |= {(f"pelliko/{kind}/text", f"pelliko/{kind}{state}") for state in ("", "/pressed")}
-    pairs.add(("pelliko/person/text", "pelliko/person/1"))  # initials
+    pairs |= {("pelliko/person/text", f"pelliko/person/{number}") for number in range(1, 6)}  # initials
     for letters in ("/fg/normal/entry/text", "/fg/normal/entry/text/guide"):
         pairs.add((letters, "/bg/normal/entry"))
     return pairs
-
-
-def luminance(colour):
-    channels = [int(colour[place:place + 2], 16) / 255 for place in (1, 3, 5)]
-    red, green, blue = (c / 12.92 if c <= 0.04045 else ((c + 0.055) / 1.055) ** 2.4 for c in channels)
-    return 0.2126 * red + 0.7152 * green + 0.0722 * blue
-
-
-def contrast(one, other):
-    dark, light = sorted((luminance(one), luminance(other)))
-    return (light + 0.05) / (dark + 0.05)
 
 
 class Colours(unittest.TestCase):

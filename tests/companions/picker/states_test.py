@@ -12,6 +12,7 @@ sys.path.insert(0, os.path.join(os.path.dirname(os.path.abspath(__file__)), ".."
 
 import companion_case  # noqa: E402
 import doubles  # noqa: E402
+import reach  # noqa: E402
 import screen  # noqa: E402
 import world  # noqa: E402
 
@@ -119,6 +120,19 @@ class Requests(PickerCase):
         self.assertEqual([[str(self.ann)]], [request["extras"][TO] for request in self.pelliko.requests])
         self.assertEqual(contacts, world.contacts())
 
+    def test_a_sender_whose_picker_is_killed_is_told_and_asks_again(self):
+        request = ["app-launch", "--app", self.program, "--operation", "appcontrol/operation/share", "--uri",
+                   "/tmp/photo.jpg", "--extra-array", f"appcontrol/data/to={self.ann}"]
+        sender = subprocess.Popen([*request, "--wait-reply"], stdout=subprocess.PIPE)
+        self.see("1 person is chosen. At most 10 people at once.")
+        self.application.kill()
+        self.assertEqual(-2, json.loads(sender.communicate(timeout=world.LIMIT)[0])["result"])
+        self.assertEqual([], self.pelliko.requests)
+        world.run(*request)
+        self.see("1 person is chosen. At most 10 people at once.")
+        self.press("Share")
+        self.assertEqual([str(self.ann)], self.pelliko.wait_request()["extras"][TO])
+
     def test_each_request_has_its_window(self):
         self.share_photo()
         self.launch("share_text", "--extra", "appcontrol/data/text=Meet at 7\nat the harbour")
@@ -151,6 +165,11 @@ class Requests(PickerCase):
 
 
 class People(PickerCase):
+    def test_every_control_has_a_name_for_readers(self):
+        self.share_photo(*world.recipients_option([self.bo]))
+        self.row("Chosen: \u2068Bo Example")
+        self.assertEqual([], reach.unnamed())
+
     def test_the_keyboard_is_enough(self):
         self.share_photo()
         screen.wait_active("pelliko-picker")
