@@ -7,6 +7,7 @@
 #include <chrono>
 #include <cstdint>
 #include <string>
+#include <vector>
 
 namespace pelliko::server
 {
@@ -20,6 +21,8 @@ struct Config {
     std::string publicUrl;
     /// Where monitors ask, in the form of `listen`; empty for nowhere.
     std::string monitoring;
+    /// IP addresses of proxies on other machines that are believed on whom they ask for.
+    std::vector<std::string> trustedProxies;
     Limits limits;
     Timeouts timeouts;
     /// How long requests in hand may take to end once the server was asked to.

@@ -61,12 +61,16 @@ struct Server::State {
           room(io, asio::steady_timer::time_point::max())
     {
         context.levels = [this] { return levels(); };
+        for (const std::string &proxy : config.trustedProxies)
+            context.proxies.push_back(normalAddress(proxy));
     }
 
     [[nodiscard]] Peers::Ears ears();
     std::string listen(tcp::acceptor &on, const ListenAddress &address);
     [[nodiscard]] Levels levels() const;
     Task<void> acceptAll();
+    void admit(tcp::socket socket);
+    void takeWaiting();
     Task<void> serve(std::shared_ptr<Connection> connection);
     Task<void> acceptMonitors();
     Task<void> serveMonitor(std::shared_ptr<Connection> connection);
@@ -145,12 +149,37 @@ Levels Server::State::levels() const
 
 Task<void> Server::State::serve(std::shared_ptr<Connection> connection)
 {
-    connections.insert(connection);
     co_await connection->run();
     connections.erase(connection);
     room.cancel();
     if (stopping && connections.empty())
         stopTimer.cancel();
+}
+
+/// Takes a client in; one that comes while the server ends is answered once.
+void Server::State::admit(tcp::socket socket)
+{
+    auto connection = Connection::make(
+        std::move(socket), timeouts, pool,
+        [this](Exchange &exchange) { return handleRequest(exchange, context); }, refuseHead);
+    if (stopping)
+        connection->finish();
+    connections.insert(connection);
+    asio::co_spawn(io, serve(std::move(connection)), asio::detached);
+}
+
+/// The system has taken connections that it was not asked for yet. Who opened one may have sent a
+/// request, and could not tell whether it was dealt with when the connection is dropped.
+void Server::State::takeWaiting()
+{
+    boost::system::error_code error;
+    acceptor.non_blocking(true, error);
+    while (!error && connections.size() < capacity.connections) {
+        tcp::socket socket(io);
+        acceptor.accept(socket, error);
+        if (!error)
+            admit(std::move(socket));
+    }
 }
 
 Task<void> Server::State::acceptAll()
@@ -161,7 +190,7 @@ Task<void> Server::State::acceptAll()
             continue;
         }
         auto [error, socket] = co_await acceptor.async_accept(asTuple);
-        if (stopping)
+        if (error && stopping)
             co_return;
         if (error) {
             std::fprintf(stderr, "pelliko-server: accept: %s\n", error.message().c_str());
@@ -169,10 +198,7 @@ Task<void> Server::State::acceptAll()
             co_await stopTimer.async_wait(asTuple);
             continue;
         }
-        auto connection = Connection::make(
-            std::move(socket), timeouts, pool,
-            [this](Exchange &exchange) { return handleRequest(exchange, context); }, refuseHead);
-        asio::co_spawn(io, serve(std::move(connection)), asio::detached);
+        admit(std::move(socket));
     }
 }
 
@@ -223,6 +249,7 @@ void Server::State::stop()
 {
     if (std::exchange(stopping, true))
         return;
+    takeWaiting();
     boost::system::error_code ignored;
     acceptor.close(ignored);
     room.cancel();

@@ -145,6 +145,9 @@ void addServe(CLI::App &app, ServeOptions &options)
                      "Seconds that requests in hand get to end once the server is asked to")
         ->check(CLI::NonNegativeNumber)
         ->capture_default_str();
+    command->add_option(
+        "--trusted-proxy", options.config.trustedProxies,
+        "Address of a proxy on another machine that sets X-Forwarded-For; repeatable");
     command->add_option("--monitoring", options.config.monitoring,
                         "Address and port for /metrics, /readyz and /healthz; nowhere when absent");
     command->add_option(

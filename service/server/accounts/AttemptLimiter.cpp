@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <iterator>
+#include <stdexcept>
 
 namespace pelliko::server
 {
@@ -65,13 +66,23 @@ std::optional<Seconds> AttemptLimiter::attempt(const std::string &address, Secon
     return std::nullopt;
 }
 
-std::string addressOf(const Request &request)
+std::string normalAddress(const std::string &text)
+{
+    const auto address = parse(text);
+    if (!address)
+        throw std::invalid_argument("\"" + text + "\" is not an IP address");
+    return address->to_string();
+}
+
+std::string addressOf(const Request &request, const std::vector<std::string> &proxies)
 {
     const auto peer = parse(request.peer);
     if (!peer)
         return {};
     const std::string *forwarded = request.header("X-Forwarded-For");
-    if (!peer->is_loopback() || forwarded == nullptr)
+    const bool isProxy = peer->is_loopback() || std::find(proxies.begin(), proxies.end(),
+                                                          peer->to_string()) != proxies.end();
+    if (!isProxy || forwarded == nullptr)
         return homeOf(*peer);
     // What stands before the last comma came from outside and may say anything.
     const auto comma = forwarded->rfind(',');

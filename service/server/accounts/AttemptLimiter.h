@@ -7,6 +7,7 @@
 #include <map>
 #include <optional>
 #include <string>
+#include <vector>
 
 namespace pelliko::server
 {
@@ -34,8 +35,14 @@ private:
     std::map<std::string, Window> m_windows;
 };
 
-/// Whom an attempt is counted for: the peer, or whom a proxy on this machine names last in
-/// X-Forwarded-For. A home's IPv6 addresses count as one.
-[[nodiscard]] std::string addressOf(const Request &request);
+/// Whom an attempt is counted for: the peer, or whom a proxy names last in X-Forwarded-For. Proxies
+/// are those on this machine and those of `proxies`, in the form of normalAddress. A home's IPv6
+/// addresses count as one.
+[[nodiscard]] std::string addressOf(const Request &request,
+                                    const std::vector<std::string> &proxies = {});
+
+/// An IP address in the one form that it is compared in; throws std::invalid_argument with a
+/// sentence.
+[[nodiscard]] std::string normalAddress(const std::string &text);
 
 } // namespace pelliko::server

@@ -18,7 +18,8 @@ using Outcome = RegisterResult;
 
 void checkAttempts(const Request &request, Context &context)
 {
-    if (const auto wait = context.registrations.attempt(addressOf(request), context.now()))
+    const std::string address = addressOf(request, context.proxies);
+    if (const auto wait = context.registrations.attempt(address, context.now()))
         throw Refusal(Error::tooManyAttempts, {}, {{"Retry-After", std::to_string(*wait)}});
 }
 

@@ -89,6 +89,7 @@ private:
     std::function<void()> m_peerGone;
     bool m_idle = false;
     bool m_finishing = false;
+    bool m_served = false;
     Traffic m_traffic;
     bool m_keepAlive = true;
     bool m_chunked = false;
@@ -123,8 +124,14 @@ Task<void> ConnectionImpl::run()
 void ConnectionImpl::finish()
 {
     m_finishing = true;
-    if (m_idle)
+    boost::system::error_code ignored;
+    if (!m_idle || m_socket.available(ignored) > 0)
+        return;
+    // Who has just connected did so for a request, and could not tell whether it was dealt with.
+    if (m_served)
         cut();
+    else
+        m_watchdog.arm(m_timeouts.firstWords);
 }
 
 void ConnectionImpl::cut()
@@ -140,7 +147,7 @@ Task<bool> ConnectionImpl::waitForRequest()
     if (m_reader.hasBufferedBytes())
         co_return true;
     m_idle = true;
-    m_watchdog.arm(m_timeouts.idle);
+    m_watchdog.arm(m_finishing ? m_timeouts.firstWords : m_timeouts.idle);
     auto [error] = co_await m_socket.async_wait(tcp::socket::wait_read, asTuple);
     m_watchdog.disarm();
     m_idle = false;
@@ -150,8 +157,9 @@ Task<bool> ConnectionImpl::waitForRequest()
 Task<bool> ConnectionImpl::serveOne()
 {
     const bool arrived = co_await waitForRequest();
-    if (!arrived || m_finishing)
+    if (!arrived)
         co_return false;
+    m_served = true;
     m_traffic = {};
     m_chunked = false;
     m_keepAlive = true;

@@ -22,6 +22,8 @@ struct Timeouts {
     std::chrono::seconds progress{60};
     /// For what a peer still sends after its last answer.
     std::chrono::seconds linger{5};
+    /// For the first request on a connection once the server is about to end: it may be on its way.
+    std::chrono::seconds firstWords{1};
 };
 
 /// One client connection: reads heads, gives each request to the handler, keeps the order of
@@ -38,7 +40,8 @@ public:
     /// Serves until either side closes; keeps the connection alive meanwhile. Throws nothing.
     virtual Task<void> run() = 0;
 
-    /// Closes when the request in hand is answered; at once when there is none.
+    /// Closes when the request in hand, or the first that is on its way, is answered; soon when
+    /// there is none.
     virtual void finish() = 0;
     /// Closes now; a running body ends as with a lost peer.
     virtual void cut() = 0;

@@ -12,6 +12,7 @@
 
 #include <functional>
 #include <string>
+#include <vector>
 
 namespace pelliko::server
 {
@@ -29,6 +30,8 @@ struct Context {
     std::function<Seconds()> now;
     /// What links start with: scheme, host, no slash at the end.
     std::string publicUrl;
+    /// Addresses of proxies on other machines, whose word on whom they ask for is taken.
+    std::vector<std::string> proxies{};
     /// What is true of the server now.
     std::function<Levels()> levels{};
     Metrics metrics{};

@@ -58,6 +58,16 @@ TEST(AttemptLimiter, OnlyAProxyOnThisMachineSaysForWhomItAsks)
     EXPECT_EQ(addressOf(from("")), "");
 }
 
+TEST(AttemptLimiter, AProxyOnAnotherMachineIsBelievedWhenItIsNamed)
+{
+    const std::vector<std::string> proxies{normalAddress("10.0.0.5"), normalAddress("fd00:0::5")};
+    EXPECT_EQ(addressOf(from("10.0.0.5", "198.51.100.1"), proxies), "198.51.100.1");
+    EXPECT_EQ(addressOf(from("::ffff:10.0.0.5", "198.51.100.1"), proxies), "198.51.100.1");
+    EXPECT_EQ(addressOf(from("fd00::5", "198.51.100.1"), proxies), "198.51.100.1");
+    EXPECT_EQ(addressOf(from("10.0.0.6", "198.51.100.1"), proxies), "10.0.0.6");
+    EXPECT_THROW((void)normalAddress("proxy.example.org"), std::invalid_argument);
+}
+
 TEST(AttemptLimiter, OneHomeIsOneAddress)
 {
     EXPECT_EQ(addressOf(from("2001:db8:1:2:3:4:5:6")), addressOf(from("2001:db8:1:2::9")));

@@ -8,6 +8,8 @@ import time
 
 import harness
 
+TOP = os.path.join(os.path.dirname(os.path.abspath(__file__)), "..", "..", "..")
+
 
 class MonitoringCase(harness.ServerCase):
     options = ["--monitoring", "127.0.0.1:0"]
@@ -60,6 +62,19 @@ class Metrics(MonitoringCase):
         self.assertEqual(204, self.request("DELETE", f"/api/v1/shares/{share['share']}").status)
         self.wait_metric("pelliko_removed_blobs_total", 1)
 
+    def test_alerts_and_pages_name_only_what_is_told(self):
+        _, link = self.make_finished(b"x" * 1000)
+        self.get(link)
+        self.wait_metric('pelliko_requests_total{endpoint="page",status="2xx"}', 1)
+        told = set()
+        for name, kind in re.findall(r"^# TYPE (\S+) (\S+)$", self.monitor("/metrics").body.decode(), re.MULTILINE):
+            told |= {name + end for end in ("", "_bucket", "_count", "_sum")} if kind == "histogram" else {name}
+        for page in ("docs/operation.md", "docs/server-operation.md", "service/server/prometheus-rules.yml"):
+            with open(os.path.join(TOP, page), encoding="utf-8") as file:
+                named = set(re.findall(r"pelliko_[a-z_]+", file.read()))
+            self.assertTrue(named, page)
+            self.assertLessEqual(named, told, page)
+
     def test_clients_are_not_told(self):
         self.assertEqual(404, self.get("/metrics").status)
         self.assertEqual(200, self.get("/readyz").status)
@@ -109,6 +124,17 @@ class Draining(DrainingCase):
         self.wait_metric("pelliko_connections", 1)
         self.process.send_signal(signal.SIGTERM)
         self.assertEqual(b"", harness.read_until_closed(idle))
+        self.assertEqual(0, self.process.wait(30))
+
+    def test_who_connected_before_is_answered(self):
+        self.process.send_signal(signal.SIGSTOP)
+        connections = [self.connect() for _ in range(20)]
+        for connection in connections:
+            connection.sendall(b"GET /healthz HTTP/1.1\r\nHost: x\r\n\r\n")
+        self.process.send_signal(signal.SIGTERM)
+        self.process.send_signal(signal.SIGCONT)
+        for connection in connections:
+            self.assertRegex(harness.read_until_closed(connection), rb"^HTTP/1.1 200 (.|\r\n)*\r\nConnection: close\r\n")
         self.assertEqual(0, self.process.wait(30))
 
     def test_a_second_signal_ends_it_at_once_and_keeps_what_arrived(self):
