@@ -13,10 +13,10 @@ STRANGER = "+15555550199"
 
 
 class Stream:
-    """A push stream that is open once its head was read."""
+    """A push stream that is open once its head was read; by way of `client` where that is not the server's own port."""
 
-    def __init__(self, port, token, last=None):
-        self.client = http.client.HTTPConnection("127.0.0.1", port, timeout=30)
+    def __init__(self, port, token, last=None, client=None):
+        self.client = client or http.client.HTTPConnection("127.0.0.1", port, timeout=30)
         headers = {"Authorization": "Bearer " + token}
         if last is not None:
             headers["Last-Event-ID"] = str(last)
