@@ -33,21 +33,32 @@ fs::path blobsDirectory(const fs::path &directory)
     return directory / "blobs";
 }
 
-DataLock::DataLock(const fs::path &directory)
-    : m_file(open((directory / "lock").c_str(), O_RDWR | O_CREAT | O_CLOEXEC, 0600))
+std::shared_ptr<const void> tryLock(const fs::path &file)
 {
-    if (m_file < 0)
-        throw std::runtime_error("cannot open the lock in " + directory.string() + ": " +
+    struct Holder {
+        explicit Holder(int d) : descriptor(d) {}
+        ~Holder()
+        {
+            if (descriptor >= 0)
+                close(descriptor);
+        }
+        Holder(const Holder &) = delete;
+        Holder &operator=(const Holder &) = delete;
+        int descriptor;
+    };
+    auto holder =
+        std::make_shared<const Holder>(open(file.c_str(), O_RDWR | O_CREAT | O_CLOEXEC, 0600));
+    if (holder->descriptor < 0)
+        throw std::runtime_error("cannot open the lock " + file.string() + ": " +
                                  std::strerror(errno));
-    if (flock(m_file, LOCK_EX | LOCK_NB) != 0) {
-        close(m_file);
-        throw std::runtime_error("another server serves " + directory.string());
-    }
+    if (flock(holder->descriptor, LOCK_EX | LOCK_NB) != 0)
+        return nullptr;
+    return holder;
 }
 
-DataLock::~DataLock()
+fs::path serversLock(const fs::path &directory)
 {
-    close(m_file);
+    return directory / "lock";
 }
 
 } // namespace pelliko::server

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <filesystem>
+#include <memory>
 
 namespace pelliko::server
 {
@@ -11,18 +12,11 @@ void makeDataDirectory(const std::filesystem::path &directory);
 [[nodiscard]] std::filesystem::path metadataFile(const std::filesystem::path &directory);
 [[nodiscard]] std::filesystem::path blobsDirectory(const std::filesystem::path &directory);
 
-/// Held by the one server that serves a directory: two would not know of each other's writers.
-class DataLock
-{
-public:
-    /// Throws std::runtime_error when another server has the directory.
-    explicit DataLock(const std::filesystem::path &directory);
-    ~DataLock();
-    DataLock(const DataLock &) = delete;
-    DataLock &operator=(const DataLock &) = delete;
+/// Held until the result is gone, however its program ends; null when another program has it.
+[[nodiscard]] std::shared_ptr<const void> tryLock(const std::filesystem::path &file);
 
-private:
-    int m_file;
-};
+/// The file that the one server which serves a directory has locked: two would not know of each
+/// other's writers.
+[[nodiscard]] std::filesystem::path serversLock(const std::filesystem::path &directory);
 
 } // namespace pelliko::server

@@ -6,6 +6,7 @@
 #include <algorithm>
 #include <chrono>
 #include <cstdio>
+#include <string>
 #include <utility>
 #include <vector>
 
@@ -16,6 +17,20 @@ namespace
 
 /// After a failure of the store, which may pass.
 constexpr std::chrono::seconds retryDelay{60};
+/// A store of millions is looked through in pieces.
+constexpr std::size_t blobsAtOnce = 1000;
+
+std::size_t removeUnknown(const Context &context, const std::vector<StoredBlob> &blobs)
+{
+    std::vector<std::string> keys;
+    keys.reserve(blobs.size());
+    for (const StoredBlob &blob : blobs)
+        keys.push_back(blob.key);
+    const std::vector<std::string> unknown = context.metadata.unknownBlobs(keys);
+    for (const std::string &key : unknown)
+        context.blobs.remove(key);
+    return unknown.size();
+}
 
 } // namespace
 
@@ -78,19 +93,22 @@ Task<void> Sweeper::round()
 /// run meanwhile are safe. A database without accounts is rather one that still has to be put back.
 Task<void> Sweeper::removeStrays()
 {
-    const std::size_t removed = co_await m_context.pool.run([&]() -> std::size_t {
-        if (m_context.metadata.listAccounts().empty())
-            return 0;
-        std::size_t count = 0;
-        for (const std::string &key : m_context.blobs.keys()) {
-            if (!m_context.metadata.knowsBlob(key)) {
-                m_context.blobs.remove(key);
-                ++count;
-            }
-        }
-        return count;
-    });
-    m_context.metrics.blobsRemoved(removed);
+    const bool isEmpty =
+        co_await m_context.pool.run([&] { return !m_context.metadata.hasAccounts(); });
+    std::size_t removed = 0;
+    std::string last;
+    while (!isEmpty && !m_stopped) {
+        const std::size_t before = removed;
+        const bool ended = co_await m_context.pool.run([&] {
+            const auto blobs = m_context.blobs.list(last, blobsAtOnce);
+            removed += removeUnknown(m_context, blobs);
+            last = blobs.empty() ? last : blobs.back().key;
+            return blobs.empty();
+        });
+        m_context.metrics.blobsRemoved(removed - before);
+        if (ended)
+            break;
+    }
     if (removed > 0)
         std::fprintf(stderr, "pelliko-server: removed %zu stray blobs\n", removed);
 }

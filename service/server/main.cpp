@@ -1,6 +1,8 @@
 #include "AccountCommands.h"
 #include "Config.h"
 #include "Server.h"
+#include "checking/CheckCommand.h"
+#include "moving/MigrateCommand.h"
 #include "store/OpenStores.h"
 
 #include <CLI/CLI.hpp>
@@ -16,6 +18,7 @@
 #include <map>
 #include <string>
 #include <utility>
+#include <vector>
 
 namespace
 {
@@ -37,6 +40,16 @@ struct AccountOptions {
     server::InvitationOptions invitation;
     bool list = false;
     std::int64_t revoke = 0;
+};
+
+struct MigrateOptions {
+    std::vector<std::string> from;
+    std::vector<std::string> to;
+};
+
+struct CheckOptions {
+    StoreOptions stores;
+    bool mend = false;
 };
 
 struct ServeOptions {
@@ -215,11 +228,43 @@ void addAccount(CLI::App &app, AccountOptions &options)
     addInvite(*account, options);
 }
 
+void addMigrate(CLI::App &app, MigrateOptions &options)
+{
+    CLI::App *command = app.add_subcommand(
+        "migrate", "Move the data to other stores; may be interrupted and given again");
+    const std::string forms =
+        ": a data directory, or addresses as --metadata and --blobs take them";
+    command->add_option("--from", options.from, "Where the data are" + forms)->required();
+    command
+        ->add_option("--to", options.to,
+                     "Where they go" + forms + "; what has no address here stays where it is")
+        ->required();
+    command->footer(
+        "Files that are finished are copied while servers run. The rest needs them stopped: "
+        "until then the command ends with status 2 and has to be given again.");
+}
+
+void addCheck(CLI::App &app, CheckOptions &options)
+{
+    CLI::App *command = app.add_subcommand(
+        "check", "Compare what is known about files with the bytes that there are");
+    addStores(*command, options.stores);
+    command->add_flag("--mend", options.mend, "Put right what is found");
+    command->footer(
+        "Works beside servers that run. Ends with status 0 when everything is right or was "
+        "mended, 1 when not, 2 when it could not look.");
+}
+
 int runCommand(const CLI::App &app, const ServeOptions &serveOptions,
-               const AccountOptions &accountOptions)
+               const AccountOptions &accountOptions, const MigrateOptions &migrateOptions,
+               const CheckOptions &checkOptions)
 {
     if (app.got_subcommand("serve"))
         return serve(serveOptions);
+    if (app.got_subcommand("migrate"))
+        return server::migrateCommand(migrateOptions.from, migrateOptions.to);
+    if (app.got_subcommand("check"))
+        return server::checkCommand(checkOptions.stores.stores(), checkOptions.mend);
     const CLI::App *account = app.get_subcommand("account");
     if (account->got_subcommand("add"))
         return server::addAccountCommand(accountOptions.stores.stores(), accountOptions.number,
@@ -241,9 +286,13 @@ int runProgram(int argc, char **argv)
     ServeOptions serveOptions;
     AccountOptions accountOptions;
     addServe(app, serveOptions);
+    MigrateOptions migrateOptions;
+    CheckOptions checkOptions;
     addAccount(app, accountOptions);
+    addMigrate(app, migrateOptions);
+    addCheck(app, checkOptions);
     CLI11_PARSE(app, argc, argv);
-    return runCommand(app, serveOptions, accountOptions);
+    return runCommand(app, serveOptions, accountOptions, migrateOptions, checkOptions);
 }
 
 } // namespace

@@ -21,6 +21,8 @@ enum class Error {
     /// The same over the wire; pages tell them apart.
     expired,
     withdrawn,
+    /// Of a share that goes on otherwise.
+    fileLost,
     unsupportedTusVersion,
     tooManyFiles,
     shareTooLarge,

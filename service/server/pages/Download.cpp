@@ -40,6 +40,8 @@ Task<LinkRecord> findLiveLink(Context &context, std::string token)
 
 Task<std::shared_ptr<BlobReader>> openBlob(Context &context, std::string key)
 {
+    if (key.empty())
+        throw Refusal(Error::fileLost);
     std::shared_ptr<BlobReader> reader = co_await context.pool.run(
         [&]() -> std::shared_ptr<BlobReader> { return context.blobs.openForReading(key); });
     if (!reader)
@@ -114,7 +116,7 @@ std::optional<std::string> addressOf(const Request &request, Context &context,
 {
     const bool wantsAll = request.method == "GET" && request.header("Range") == nullptr &&
                           request.header("If-None-Match") == nullptr;
-    if (!wantsAll || file.size == 0)
+    if (!wantsAll || file.size == 0 || file.blob.empty())
         return std::nullopt;
     return context.blobs.addressOf(
         file.blob, {share.deadline - context.now(), attachmentDisposition(file.name), file.type});
@@ -214,6 +216,11 @@ Task<void> downloadAll(Exchange &exchange, Context &context, std::string token)
     for (const FileRecord &file : link.share.files)
         names.push_back(file.name);
     names = uniqueNames(names);
+    // Nobody notices what is missing from an archive.
+    for (const FileRecord &file : link.share.files) {
+        if (file.blob.empty())
+            throw Refusal(Error::fileLost);
+    }
     Response head =
         makeResponse(Status::ok, {{"Content-Type", "application/zip"},
                                   {"Content-Disposition", attachmentDisposition("pelliko.zip")},

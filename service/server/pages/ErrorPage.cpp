@@ -53,6 +53,10 @@ ErrorWords wordsOf(const ErrorEntry &entry)
                 "The sender has taken this share back, so it cannot be downloaded any more. If you "
                 "still need it, ask the sender.",
                 false};
+    case Error::fileLost:
+        return {Mark::trouble, "This file is lost",
+                "The server does not have this file any more. Ask the sender to share it again.",
+                false};
     case Error::busy:
         return {Mark::clock, "The server is busy",
                 "It has more to do than it can manage at the moment. Wait a few minutes, then open "

@@ -219,6 +219,20 @@ std::vector<Object> Client::objects(const std::string &namesBeginWith)
     return found;
 }
 
+Page<Object> Client::objectsAfter(const std::string &name, std::size_t most)
+{
+    Call call{"GET"};
+    call.ofBucket = true;
+    call.query = {
+        {"list-type", "2"}, {"prefix", m_address.prefix}, {"max-keys", std::to_string(most)}};
+    if (!name.empty())
+        call.query.emplace_back("start-after", m_address.prefix + name);
+    Page<Object> page = objectsIn(need(call).wire.body);
+    for (Object &object : page.entries)
+        object.name.erase(0, m_address.prefix.size());
+    return page;
+}
+
 std::string Client::presigned(const std::string &name, long seconds, const std::string &disposition,
                               const std::string &type) const
 {

@@ -50,9 +50,14 @@ public:
     std::string get(const std::string &name, std::uint64_t offset, std::uint64_t length);
     void remove(const std::string &name);
     std::vector<Object> objects(const std::string &namesBeginWith);
+    /// Those whose names follow `name` in the order of their bytes, `most` at a time.
+    Page<Object> objectsAfter(const std::string &name, std::size_t most);
 
     OpenUpload beginUpload(const std::string &name);
     std::vector<OpenUpload> openUploads(const std::string &namesBeginWith);
+    /// Those that follow this one, `most` at a time; the store may count those of the same name in
+    /// when the id is empty.
+    Page<OpenUpload> uploadsAfter(const OpenUpload &upload, std::size_t most);
     /// In the order of their numbers; nothing for an upload that is not open.
     std::vector<Part> parts(const OpenUpload &upload);
     Part putPart(const OpenUpload &upload, int number, std::string_view bytes);

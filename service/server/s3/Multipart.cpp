@@ -33,6 +33,22 @@ std::vector<OpenUpload> Client::openUploads(const std::string &namesBeginWith)
     return found;
 }
 
+Page<OpenUpload> Client::uploadsAfter(const OpenUpload &upload, std::size_t most)
+{
+    Call call{"GET"};
+    call.ofBucket = true;
+    call.query = {
+        {"uploads", ""}, {"prefix", m_address.prefix}, {"max-uploads", std::to_string(most)}};
+    if (!upload.name.empty())
+        call.query.emplace_back("key-marker", m_address.prefix + upload.name);
+    if (!upload.id.empty())
+        call.query.emplace_back("upload-id-marker", upload.id);
+    Page<OpenUpload> page = uploadsIn(need(call).wire.body);
+    for (OpenUpload &entry : page.entries)
+        entry.name.erase(0, m_address.prefix.size());
+    return page;
+}
+
 std::vector<Part> Client::parts(const OpenUpload &upload)
 {
     Call call{"GET", upload.name};

@@ -1,5 +1,7 @@
 #pragma once
 
+#include "store/StoreMark.h"
+
 #include <cstddef>
 #include <cstdint>
 #include <memory>
@@ -62,6 +64,15 @@ struct BlobVisit {
     std::string type;
 };
 
+/// A blob as a list of what there is shows it.
+struct StoredBlob {
+    std::string key;
+    /// How many bytes an upload can go on from, or a reader get; nothing when only `sizeOf` tells.
+    std::optional<std::uint64_t> size;
+    /// Something of its making stands beside the whole blob.
+    bool hasLeftovers = false;
+};
+
 /// Where the bytes of files are. Keys are tokens (see looksLikeToken). Thread-safe; calls may
 /// block; every call throws StorageFailure when the store fails.
 class Blobs
@@ -76,11 +87,25 @@ public:
     /// so only its writer's process looks into it before it is whole.
     virtual std::unique_ptr<BlobReader> openForReading(const std::string &key) = 0;
 
-    /// The keys of all blobs that there are.
-    virtual std::vector<std::string> keys() = 0;
+    /// What there is, `most` blobs or a little more at a time, in the order of the keys' bytes:
+    /// those that follow `after`. Nothing at the end. Blobs that come or go meanwhile may be
+    /// missed.
+    virtual std::vector<StoredBlob> list(const std::string &after, std::size_t most) = 0;
+
+    /// How many bytes of the blob an upload can go on from, or a reader get; nothing when it is
+    /// absent. Changes nothing of it.
+    virtual std::optional<std::uint64_t> sizeOf(const std::string &key) = 0;
 
     /// Removes the blob; one that is absent is as good as removed.
     virtual void remove(const std::string &key) = 0;
+
+    /// Removes what is left of the making of a blob that is whole, to which nothing is written.
+    virtual void removeLeftovers(const std::string & /*key*/) {}
+
+    /// Where this store stands in a move of data; nothing in none. It has room for one such mark
+    /// beside the blobs.
+    virtual std::optional<StoreMark> mark() = 0;
+    virtual void setMark(const std::optional<StoreMark> &mark) = 0;
 
     /// An address that everybody may get the finished blob from; nothing where there is none, or
     /// where the operator does not want it.

@@ -7,9 +7,12 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <atomic>
 #include <cerrno>
+#include <cstdio>
 #include <cstring>
+#include <fstream>
 #include <utility>
 
 namespace pelliko::server
@@ -58,6 +61,21 @@ void syncDirectory(const fs::path &path)
     File directory(open(path.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC), path);
     if (directory.get() < 0 || fsync(directory.get()) != 0)
         fail("cannot sync", path);
+}
+
+/// Of the sub-directories: the first characters of a key.
+constexpr std::size_t folderName = 2;
+
+/// In the order of their bytes.
+std::vector<std::string> namesIn(const fs::path &directory)
+{
+    std::vector<std::string> names;
+    if (!fs::is_directory(directory))
+        return names;
+    for (const auto &entry : fs::directory_iterator(directory))
+        names.push_back(entry.path().filename().string());
+    std::sort(names.begin(), names.end());
+    return names;
 }
 
 void makeDirectory(const fs::path &path)
@@ -143,7 +161,7 @@ fs::path DirectoryBlobs::pathOf(const std::string &key) const
 {
     if (!looksLikeToken(key))
         throw StorageFailure(StorageFailure::Kind::broken, "not a blob's key");
-    return m_root / key.substr(0, 2) / key;
+    return m_root / key.substr(0, folderName) / key;
 }
 
 std::unique_ptr<BlobWriter> DirectoryBlobs::openForWriting(const std::string &key)
@@ -172,15 +190,22 @@ std::unique_ptr<BlobReader> DirectoryBlobs::openForReading(const std::string &ke
     return std::make_unique<FileReader>(std::move(file));
 }
 
-std::vector<std::string> DirectoryBlobs::keys()
+std::vector<StoredBlob> DirectoryBlobs::list(const std::string &after, std::size_t most)
 {
-    std::vector<std::string> found;
+    std::vector<StoredBlob> found;
     try {
-        for (const auto &entry : fs::recursive_directory_iterator(m_root)) {
-            std::string name = entry.path().filename().string();
-            // What stands elsewhere, or is named otherwise, was put there by somebody else.
-            if (looksLikeToken(name) && entry.path() == pathOf(name))
-                found.push_back(std::move(name));
+        for (const std::string &folder : namesIn(m_root)) {
+            if (folder.size() != folderName || folder < after.substr(0, folderName))
+                continue;
+            if (found.size() >= most)
+                break;
+            for (const std::string &name : namesIn(m_root / folder)) {
+                // What stands elsewhere, or is named otherwise, was put there by somebody else.
+                const bool isBlob = looksLikeToken(name) && name.substr(0, folderName) == folder;
+                const auto size = isBlob && name > after ? sizeOf(name) : std::nullopt;
+                if (size)
+                    found.push_back({name, size});
+            }
         }
     } catch (const fs::filesystem_error &error) {
         throw StorageFailure(StorageFailure::Kind::broken, error.what());
@@ -188,11 +213,50 @@ std::vector<std::string> DirectoryBlobs::keys()
     return found;
 }
 
+std::optional<std::uint64_t> DirectoryBlobs::sizeOf(const std::string &key)
+{
+    const fs::path path = pathOf(key);
+    struct stat info {
+    };
+    if (lstat(path.c_str(), &info) == 0)
+        return S_ISREG(info.st_mode) ? std::optional(static_cast<std::uint64_t>(info.st_size))
+                                     : std::nullopt;
+    if (errno != ENOENT && errno != ENOTDIR)
+        fail("cannot look at", path);
+    return std::nullopt;
+}
+
 void DirectoryBlobs::remove(const std::string &key)
 {
     const fs::path path = pathOf(key);
     if (unlink(path.c_str()) != 0 && errno != ENOENT)
         fail("cannot remove", path);
+}
+
+std::optional<StoreMark> DirectoryBlobs::mark()
+{
+    std::ifstream file(markFile());
+    std::string text;
+    std::getline(file, text);
+    return markOf(text);
+}
+
+void DirectoryBlobs::setMark(const std::optional<StoreMark> &mark)
+{
+    if (mark) {
+        const fs::path fresh = m_root / "migration.new";
+        FileWriter writer(
+            File(open(fresh.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_CLOEXEC | O_NOFOLLOW, 0600),
+                 fresh),
+            false);
+        writer.write(0, textOf(*mark) + "\n");
+        writer.sync();
+        if (rename(fresh.c_str(), markFile().c_str()) != 0)
+            fail("cannot name", markFile());
+    } else if (unlink(markFile().c_str()) != 0 && errno != ENOENT) {
+        fail("cannot remove", markFile());
+    }
+    syncDirectory(m_root);
 }
 
 } // namespace pelliko::server

@@ -204,6 +204,7 @@ public:
     /// Removes the account with all its shares; false when there is none. Bytes become doomed.
     virtual bool removeAccount(const std::string &number) = 0;
     virtual std::vector<Account> listAccounts() = 0;
+    virtual bool hasAccounts() = 0;
     virtual std::optional<Account> findAccount(const std::string &tokenHash) = 0;
     /// Bytes that the account announced after `since`.
     virtual std::uint64_t usedBytes(std::int64_t account, Seconds since) = 0;
@@ -278,8 +279,8 @@ public:
     virtual std::optional<Seconds> earliestEnd() = 0;
     /// Keys of blobs that no live share needs, some of them, oldest first.
     virtual std::vector<std::string> doomedBlobs() = 0;
-    /// Whether the blob is needed, or doomed and not yet forgotten.
-    virtual bool knowsBlob(const std::string &blob) = 0;
+    /// Those of the keys that are no blob's: neither needed, nor doomed and not yet forgotten.
+    virtual std::vector<std::string> unknownBlobs(const std::vector<std::string> &keys) = 0;
     /// The blob's bytes are gone: forgets its key.
     virtual void forgetBlob(const std::string &blob) = 0;
 

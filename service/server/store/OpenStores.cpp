@@ -5,8 +5,10 @@
 #include "store/PostgresClock.h"
 #include "store/PostgresMetadata.h"
 #include "store/PostgresPeers.h"
+#include "store/PostgresTables.h"
 #include "store/S3Blobs.h"
 #include "store/SqliteMetadata.h"
+#include "store/SqliteTables.h"
 
 #include <ctime>
 #include <optional>
@@ -59,9 +61,19 @@ fs::path sqliteFile(const std::string &url, Absent absent)
     return file;
 }
 
+void refuseUnserved(const std::string &metadataUrl)
+{
+    const auto tables = isPostgres(metadataUrl)
+                            ? openPostgresTables(metadataUrl)
+                            : openSqliteTables(sqliteFile(metadataUrl, Absent::fails));
+    server::refuseUnserved(markOf(*tables), "metadata");
+}
+
 void openSqlite(Stores &stores, const fs::path &file)
 {
-    stores.lock = std::make_shared<DataLock>(file.parent_path());
+    stores.lock = tryLock(serversLock(file.parent_path()));
+    if (!stores.lock)
+        throw std::runtime_error("another server serves " + file.parent_path().string());
     auto metadata = std::make_unique<SqliteMetadata>(file);
     metadata->verify();
     stores.metadata = std::move(metadata);
@@ -71,6 +83,9 @@ void openSqlite(Stores &stores, const fs::path &file)
 
 void openPostgres(Stores &stores, const std::string &url, std::size_t threads)
 {
+    stores.lock = takePartInServing(url);
+    if (!stores.lock)
+        throw std::runtime_error("the metadata are being moved to another place");
     auto metadata = std::make_unique<PostgresMetadata>(url, threads);
     const std::shared_ptr<PostgresClock> clock = metadata->clock();
     stores.peers = std::make_unique<PostgresPeers>(url, clock);
@@ -92,11 +107,38 @@ StoreUrls storeUrls(const fs::path &data, const StoreUrls &given)
     return urls;
 }
 
+bool isMetadataUrl(const std::string &url)
+{
+    return isPostgres(url) || after(url, sqlite);
+}
+
+bool isBlobsUrl(const std::string &url)
+{
+    return after(url, "s3:") || after(url, directory);
+}
+
 std::unique_ptr<Metadata> openMetadata(const std::string &url, Absent absent)
 {
+    std::unique_ptr<Metadata> metadata;
     if (isPostgres(url))
-        return std::make_unique<PostgresMetadata>(url, 1);
-    return std::make_unique<SqliteMetadata>(sqliteFile(url, absent));
+        metadata = std::make_unique<PostgresMetadata>(url, 1);
+    else
+        metadata = std::make_unique<SqliteMetadata>(sqliteFile(url, absent));
+    refuseUnserved(url);
+    return metadata;
+}
+
+std::unique_ptr<TableSession> openTables(const std::string &url, Absent absent)
+{
+    if (isPostgres(url)) {
+        const PostgresMetadata upToDate(url, 1);
+        return openPostgresTables(url);
+    }
+    const fs::path file = sqliteFile(url, absent);
+    if (absent == Absent::fails && !fs::exists(file))
+        throw std::runtime_error("there are no metadata at " + file.string());
+    const SqliteMetadata upToDate(file);
+    return openSqliteTables(file);
 }
 
 std::unique_ptr<Blobs> openBlobs(const std::string &url)
@@ -118,7 +160,9 @@ Stores openStores(const StoreUrls &urls, std::size_t threads)
         openPostgres(stores, urls.metadata, threads);
     else
         openSqlite(stores, sqliteFile(urls.metadata, Absent::isMade));
+    refuseUnserved(urls.metadata);
     stores.blobs = openBlobs(urls.blobs);
+    refuseUnserved(stores.blobs->mark(), "blobs");
     return stores;
 }
 

@@ -3,6 +3,7 @@
 #include "store/Blobs.h"
 #include "store/Metadata.h"
 #include "store/Peers.h"
+#include "store/TableSession.h"
 
 #include <filesystem>
 #include <functional>
@@ -26,8 +27,16 @@ struct StoreUrls {
 enum class Absent { fails, isMade };
 
 /// Opens the metadata for a command, beside servers that may run. Throws std::exception with a
-/// sentence for an address that means nothing.
+/// sentence for an address that means nothing, and for data that were moved elsewhere.
 [[nodiscard]] std::unique_ptr<Metadata> openMetadata(const std::string &url, Absent absent);
+
+/// Which half of the data an address is for; that it is right otherwise is not looked at.
+[[nodiscard]] bool isMetadataUrl(const std::string &url);
+[[nodiscard]] bool isBlobsUrl(const std::string &url);
+
+/// Opens the rows of the metadata, beside servers that may run and wherever they stand in a move of
+/// data. With `isMade` also brings the tables up to date.
+[[nodiscard]] std::unique_ptr<TableSession> openTables(const std::string &url, Absent absent);
 
 /// Opens the blobs; makes their place when it is absent.
 [[nodiscard]] std::unique_ptr<Blobs> openBlobs(const std::string &url);

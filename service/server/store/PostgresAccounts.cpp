@@ -71,6 +71,12 @@ std::vector<Account> PostgresMetadata::listAccounts()
     });
 }
 
+bool PostgresMetadata::hasAccounts()
+{
+    return m_pool->single(
+        [](PostgresConnection &db) { return db.query("SELECT 1 FROM accounts LIMIT 1").next(); });
+}
+
 std::optional<Account> PostgresMetadata::findAccount(const std::string &tokenHash)
 {
     return m_pool->single([&](PostgresConnection &db) -> std::optional<Account> {

@@ -257,19 +257,60 @@ const std::string &PostgresConnection::prepared(const char *sql, const PostgresV
     return m_statements.emplace(sql, std::move(name)).first->second;
 }
 
-PostgresRows PostgresConnection::run(const char *sql, const PostgresValues &values)
+namespace
 {
-    const std::string &name = prepared(sql, values);
+
+/// Values as libpq wants them; valid as long as they are.
+struct Sent {
+    std::vector<Oid> types;
     std::vector<const char *> data;
     std::vector<int> lengths;
     std::vector<int> formats;
-    for (const PostgresValues::Value &value : values.m_values) {
-        data.push_back(value.isNull ? nullptr : value.data.c_str());
-        lengths.push_back(static_cast<int>(value.data.size()));
-        formats.push_back(value.isBinary ? 1 : 0);
+
+    [[nodiscard]] int count() const { return static_cast<int>(data.size()); }
+};
+
+template <class Values> Sent sentOf(const Values &values)
+{
+    Sent sent;
+    for (const auto &value : values) {
+        sent.types.push_back(value.type);
+        sent.data.push_back(value.isNull ? nullptr : value.data.c_str());
+        sent.lengths.push_back(static_cast<int>(value.data.size()));
+        sent.formats.push_back(value.isBinary ? 1 : 0);
     }
-    return answer(PQsendQueryPrepared(get(), name.c_str(), static_cast<int>(data.size()),
-                                      data.data(), lengths.data(), formats.data(), 0));
+    return sent;
+}
+
+} // namespace
+
+PostgresRows PostgresConnection::run(const char *sql, const PostgresValues &values)
+{
+    const std::string &name = prepared(sql, values);
+    const Sent sent = sentOf(values.m_values);
+    return answer(PQsendQueryPrepared(get(), name.c_str(), sent.count(), sent.data.data(),
+                                      sent.lengths.data(), sent.formats.data(), 0));
+}
+
+PostgresRows PostgresConnection::once(const std::string &sql, const PostgresValues &values)
+{
+    const Sent sent = sentOf(values.m_values);
+    return answer(PQsendQueryParams(get(), sql.c_str(), sent.count(), sent.types.data(),
+                                    sent.data.data(), sent.lengths.data(), sent.formats.data(), 0));
+}
+
+void PostgresConnection::copyIn(const std::string &sql, const std::string &lines)
+{
+    PGresult *begun = PQexec(get(), sql.c_str());
+    if (PQresultStatus(begun) != PGRES_COPY_IN) {
+        checked(begun);
+        throw PostgresFailure(Kind::broken, Remedy::none, "metadata: this is no COPY");
+    }
+    PQclear(begun);
+    // What goes wrong is told by the answer.
+    PQputCopyData(get(), lines.data(), static_cast<int>(lines.size()));
+    PQputCopyEnd(get(), nullptr);
+    answer(1);
 }
 
 } // namespace pelliko::server

@@ -51,6 +51,15 @@ public:
         (add(values), ...);
     }
 
+    void add(std::int64_t value);
+    void add(std::uint64_t value) { add(static_cast<std::int64_t>(value)); }
+    void add(int value) { add(std::int64_t{value}); }
+    void add(const std::string &value);
+    void add(const Bytes &bytes);
+    void add(const std::optional<std::string> &value);
+    void add(const std::vector<std::string> &values);
+    void add(const std::vector<std::int64_t> &values);
+
 private:
     friend class PostgresConnection;
     struct Value {
@@ -60,15 +69,6 @@ private:
         bool isBinary = false;
         std::string data;
     };
-
-    void add(std::int64_t value);
-    void add(std::uint64_t value) { add(static_cast<std::int64_t>(value)); }
-    void add(int value) { add(std::int64_t{value}); }
-    void add(const std::string &value);
-    void add(const Bytes &bytes);
-    void add(const std::optional<std::string> &value);
-    void add(const std::vector<std::string> &values);
-    void add(const std::vector<std::int64_t> &values);
 
     std::vector<Value> m_values;
 };
@@ -114,6 +114,12 @@ public:
     {
         return run(sql, PostgresValues(values...));
     }
+
+    /// Runs a statement that is not worth preparing.
+    PostgresRows once(const std::string &sql, const PostgresValues &values);
+
+    /// Runs a COPY FROM STDIN of these lines.
+    void copyIn(const std::string &sql, const std::string &lines);
 
     /// Runs commands without values; returns the last one's rows.
     PostgresRows command(const std::string &sql);

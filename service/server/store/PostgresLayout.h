@@ -14,6 +14,9 @@ void migrate(PostgresConnection &db);
 inline constexpr int lockGroup = 0x50656c6b;
 inline constexpr int lockOfLayout = 1;
 inline constexpr int lockOfSweeper = 2;
+/// Servers have it together; who needs the store without any has it alone.
+inline constexpr int lockOfServing = 3;
+inline constexpr int lockOfMoving = 4;
 
 /// Where servers tell each other of what is in the tables: "push ACCOUNT…", "stop BLOB…", "sweep".
 #define PELLIKO_CHANNEL "pelliko"

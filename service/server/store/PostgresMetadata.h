@@ -26,6 +26,7 @@ public:
                     const std::string &tokenHash, Seconds now) override;
     bool removeAccount(const std::string &number) override;
     std::vector<Account> listAccounts() override;
+    bool hasAccounts() override;
     std::optional<Account> findAccount(const std::string &tokenHash) override;
     std::uint64_t usedBytes(std::int64_t account, Seconds since) override;
 
@@ -65,7 +66,7 @@ public:
     void forgetEnded(Seconds ended, Seconds used) override;
     std::optional<Seconds> earliestEnd() override;
     std::vector<std::string> doomedBlobs() override;
-    bool knowsBlob(const std::string &blob) override;
+    std::vector<std::string> unknownBlobs(const std::vector<std::string> &keys) override;
     void forgetBlob(const std::string &blob) override;
     void ping() override;
 

@@ -109,6 +109,8 @@ CreateResult reshare(PostgresConnection &db, const NewShare &share, std::optiona
     if (source->record.state != ShareState::finished)
         return {Outcome::sourceGone, {}, 0};
     addParts(db, *source);
+    if (hasLostFile(source->record))
+        return {Outcome::sourceGone, {}, 0};
     const std::int64_t id = addShareRow(db, share);
     copyFiles(db, id, *source);
     return {Outcome::created, shareById(db, id, share.now).record, 0};

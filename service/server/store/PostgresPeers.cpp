@@ -3,6 +3,7 @@
 #include "store/PostgresClock.h"
 #include "store/PostgresLayout.h"
 #include "store/PostgresRights.h"
+#include "store/PostgresTables.h"
 
 #include <libpq-fe.h>
 #include <poll.h>
@@ -196,6 +197,9 @@ void PostgresPeers::Thread::connect()
     // Who writes a blob is forgotten with the sessions when the database falls.
     session->command(
         "SET synchronous_commit = off; SET lock_timeout = '2s'; LISTEN " PELLIKO_CHANNEL);
+    // Ends with the session, so that it is known as long as this server runs.
+    if (!takePartInServing(*session))
+        throw PostgresFailure(Kind::unavailable, Remedy::none, "the data are being moved");
     auto election = std::make_unique<PostgresConnection>(m_url);
     election->command(waitForever);
     const std::string lock = "SELECT pg_advisory_lock(" + std::to_string(lockGroup) + ", " +

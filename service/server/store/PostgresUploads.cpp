@@ -126,10 +126,16 @@ std::optional<Seconds> PostgresMetadata::earliestEnd()
     });
 }
 
-bool PostgresMetadata::knowsBlob(const std::string &blob)
+std::vector<std::string> PostgresMetadata::unknownBlobs(const std::vector<std::string> &keys)
 {
     return m_pool->single([&](PostgresConnection &db) {
-        return db.query("SELECT 1 FROM blobs WHERE key = $1", blob).next();
+        PostgresRows rows = db.query("SELECT k FROM unnest($1) AS k WHERE NOT EXISTS"
+                                     " (SELECT 1 FROM blobs b WHERE b.key = k)",
+                                     keys);
+        std::vector<std::string> unknown;
+        while (rows.next())
+            unknown.push_back(rows.text(0));
+        return unknown;
     });
 }
 

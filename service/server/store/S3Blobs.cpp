@@ -1,5 +1,6 @@
 #include "store/S3Blobs.h"
 
+#include "store/S3Listing.h"
 #include "store/S3Reader.h"
 #include "store/S3Writing.h"
 #include "store/StorageFailure.h"
@@ -8,9 +9,9 @@
 #include <malloc.h>
 
 #include <algorithm>
+#include <array>
 #include <map>
 #include <mutex>
-#include <set>
 #include <utility>
 
 namespace pelliko::server
@@ -26,6 +27,8 @@ constexpr std::int64_t longestVisit = 604800;
 constexpr int largeBuffer = 1024 * 1024;
 /// A part that was on its way may come after the end of its upload.
 constexpr int mostAborts = 5;
+/// No blob's key.
+constexpr const char *markName = "migration";
 
 class S3Writer final : public BlobWriter
 {
@@ -49,6 +52,16 @@ void checkKey(const std::string &key)
 {
     if (!looksLikeToken(key))
         throw StorageFailure(StorageFailure::Kind::broken, "not a blob's key");
+}
+
+void abortUploads(s3::Client &client, const std::string &key)
+{
+    auto uploads = client.openUploads(key);
+    for (int aborts = 0; !uploads.empty() && aborts < mostAborts; ++aborts) {
+        for (const s3::OpenUpload &upload : uploads)
+            client.abortUpload(upload);
+        uploads = client.openUploads(key);
+    }
 }
 
 } // namespace
@@ -112,27 +125,47 @@ std::unique_ptr<BlobReader> S3Blobs::openForReading(const std::string &key)
     return S3Reader::open(m_state->client, key);
 }
 
-std::vector<std::string> S3Blobs::keys()
+std::vector<StoredBlob> S3Blobs::list(const std::string &after, std::size_t most)
 {
-    std::set<std::string> found;
-    for (const s3::Object &object : m_state->client.objects(""))
-        found.insert(s3KeyOf(object.name));
-    for (const s3::OpenUpload &upload : m_state->client.openUploads(""))
-        found.insert(s3KeyOf(upload.name));
-    // What is named otherwise was put there by somebody else.
-    found.erase("");
-    return {found.begin(), found.end()};
+    return S3Listing(m_state->client, after, most).next();
+}
+
+std::optional<std::uint64_t> S3Blobs::sizeOf(const std::string &key)
+{
+    checkKey(key);
+    const S3Parts parts = loadS3Parts(m_state->client, key);
+    return parts.empty() ? std::nullopt : std::optional(parts.end());
+}
+
+void S3Blobs::removeLeftovers(const std::string &key)
+{
+    checkKey(key);
+    abortUploads(m_state->client, key);
+    for (const s3::Object &object : m_state->client.objects(key + "/"))
+        m_state->client.remove(object.name);
+}
+
+std::optional<StoreMark> S3Blobs::mark()
+{
+    const auto reader = S3Reader::open(m_state->client, markName);
+    if (!reader)
+        return std::nullopt;
+    std::array<char, 100> text{};
+    return markOf({text.data(), reader->read(0, text)});
+}
+
+void S3Blobs::setMark(const std::optional<StoreMark> &mark)
+{
+    if (mark)
+        m_state->client.put(markName, textOf(*mark));
+    else
+        m_state->client.remove(markName);
 }
 
 void S3Blobs::remove(const std::string &key)
 {
     checkKey(key);
-    auto uploads = m_state->client.openUploads(key);
-    for (int aborts = 0; !uploads.empty() && aborts < mostAborts; ++aborts) {
-        for (const s3::OpenUpload &upload : uploads)
-            m_state->client.abortUpload(upload);
-        uploads = m_state->client.openUploads(key);
-    }
+    abortUploads(m_state->client, key);
     for (const s3::Object &object : m_state->client.objects(key))
         m_state->client.remove(object.name);
 }

@@ -20,8 +20,13 @@ public:
 
     std::unique_ptr<BlobWriter> openForWriting(const std::string &key) override;
     std::unique_ptr<BlobReader> openForReading(const std::string &key) override;
-    std::vector<std::string> keys() override;
+    std::vector<StoredBlob> list(const std::string &after, std::size_t most) override;
+    std::optional<std::uint64_t> sizeOf(const std::string &key) override;
     void remove(const std::string &key) override;
+    void removeLeftovers(const std::string &key) override;
+    /// In the object "migration" below the address's prefix.
+    std::optional<StoreMark> mark() override;
+    void setMark(const std::optional<StoreMark> &mark) override;
     std::optional<std::string> addressOf(const std::string &key, const BlobVisit &visit) override;
     [[nodiscard]] std::size_t callsAtOnce() const override;
 

@@ -18,6 +18,12 @@ ShareState stateAt(ShareState stored, Seconds deadline, Seconds now)
     return live && deadline <= now ? ShareState::expired : stored;
 }
 
+bool hasLostFile(const ShareRecord &share)
+{
+    return std::any_of(share.files.begin(), share.files.end(),
+                       [](const FileRecord &file) { return file.blob.empty(); });
+}
+
 std::uint64_t announcedBytes(const NewShare &share)
 {
     std::uint64_t sum = 0;

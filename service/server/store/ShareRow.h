@@ -71,6 +71,9 @@ enum class PushState {
 /// Bounds what a stream holds of pushes in memory; it asks again for the rest.
 inline constexpr int pushesAtOnce = 64;
 
+/// True when bytes of one of its files are gone, though the share has not ended.
+[[nodiscard]] bool hasLostFile(const ShareRecord &share);
+
 /// All that a share's files are to have.
 [[nodiscard]] std::uint64_t announcedBytes(const NewShare &share);
 

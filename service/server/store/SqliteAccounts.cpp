@@ -49,6 +49,12 @@ std::vector<Account> SqliteMetadata::listAccounts()
     });
 }
 
+bool SqliteMetadata::hasAccounts()
+{
+    auto &db = *m_connection;
+    return db.read([&] { return db.query("SELECT 1 FROM accounts LIMIT 1").next(); });
+}
+
 std::optional<Account> SqliteMetadata::findAccount(const std::string &tokenHash)
 {
     auto &db = *m_connection;

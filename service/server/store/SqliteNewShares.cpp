@@ -102,7 +102,7 @@ CreateResult SqliteMetadata::Connection::reshare(const NewShare &share)
         return {Outcome::sourceMissing, {}, 0};
     if (source->record.state == ShareState::uploading)
         return {Outcome::sourceUnfinished, {}, 0};
-    if (source->record.state != ShareState::finished)
+    if (source->record.state != ShareState::finished || hasLostFile(source->record))
         return {Outcome::sourceGone, {}, 0};
     return {Outcome::created, shareById(copyShare(share, *source), share.now).record, 0};
 }

@@ -123,10 +123,17 @@ std::optional<Seconds> SqliteMetadata::earliestEnd()
     });
 }
 
-bool SqliteMetadata::knowsBlob(const std::string &blob)
+std::vector<std::string> SqliteMetadata::unknownBlobs(const std::vector<std::string> &keys)
 {
     auto &db = *m_connection;
-    return db.read([&] { return db.query("SELECT 1 FROM blobs WHERE key = ?", blob).next(); });
+    return db.read([&] {
+        std::vector<std::string> unknown;
+        for (const std::string &key : keys) {
+            if (!db.query("SELECT 1 FROM blobs WHERE key = ?", key).next())
+                unknown.push_back(key);
+        }
+        return unknown;
+    });
 }
 
 std::vector<std::string> SqliteMetadata::doomedBlobs()

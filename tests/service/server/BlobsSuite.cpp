@@ -21,6 +21,17 @@ std::string BlobsSuite::contentOf(Blobs &blobs, const std::string &key)
     return content;
 }
 
+std::vector<std::string> keysOf(Blobs &blobs, std::size_t atOnce)
+{
+    std::vector<std::string> keys;
+    for (auto some = blobs.list("", atOnce); !some.empty();
+         some = blobs.list(keys.back(), atOnce)) {
+        for (const StoredBlob &blob : some)
+            keys.push_back(blob.key);
+    }
+    return keys;
+}
+
 TEST_P(BlobsSuite, WhatWasWrittenIsReadAlsoAfterARestart)
 {
     const std::string key = randomToken();
@@ -91,18 +102,54 @@ TEST_P(BlobsSuite, AShortenedBlobGoesOnFromThere)
     EXPECT_EQ(contentOf(*m_store, key), "hello world");
 }
 
-TEST_P(BlobsSuite, TellsWhichBlobsThereAre)
+TEST_P(BlobsSuite, TellsWhichBlobsThereAreInTheOrderOfTheirKeys)
 {
-    EXPECT_TRUE(m_store->keys().empty());
-    std::vector<std::string> made{randomToken(), randomToken(), randomToken()};
+    EXPECT_TRUE(keysOf(*m_store).empty());
+    std::vector<std::string> made;
+    for (int count = 0; count < 9; ++count)
+        made.push_back(randomToken());
+    // Keys that differ late, and in characters that languages sort otherwise.
+    const std::string start = randomToken().substr(0, 20);
+    for (const char *end : {"aa", "AA", "-_", "_-", "99"})
+        made.push_back(start + end);
     for (const std::string &key : made)
         m_store->openForWriting(key)->sync();
     m_store->remove(made.back());
     made.pop_back();
-    std::vector<std::string> found = m_store->keys();
-    std::sort(found.begin(), found.end());
     std::sort(made.begin(), made.end());
-    EXPECT_EQ(found, made);
+    for (const std::size_t atOnce : {1UL, 3UL, 1000UL})
+        EXPECT_EQ(keysOf(*m_store, atOnce), made) << atOnce;
+    EXPECT_TRUE(m_store->list(made.back(), 1).empty());
+}
+
+TEST_P(BlobsSuite, TellsHowFarABlobGoesWithoutPuttingAnEndToIt)
+{
+    const std::string key = randomToken();
+    EXPECT_EQ(m_store->sizeOf(key), std::nullopt);
+    const auto writer = m_store->openForWriting(key);
+    writer->write(0, "hello ");
+    writer->sync();
+    EXPECT_EQ(m_store->sizeOf(key), 6U);
+    writer->write(6, "world");
+    writer->finish();
+    EXPECT_EQ(GetParam().again()->sizeOf(key), 11U);
+    const auto list = m_store->list("", 10);
+    ASSERT_EQ(list.size(), 1U);
+    EXPECT_EQ(list.front().size, 11U);
+    EXPECT_FALSE(list.front().hasLeftovers);
+}
+
+TEST_P(BlobsSuite, AMarkStaysUntilItIsTakenAway)
+{
+    EXPECT_EQ(m_store->mark(), std::nullopt);
+    const StoreMark mark{"abc", StoreMark::State::arriving};
+    m_store->setMark(StoreMark{"abc", StoreMark::State::leaving});
+    m_store->setMark(mark);
+    EXPECT_EQ(GetParam().again()->mark(), mark);
+    EXPECT_TRUE(keysOf(*m_store).empty());
+    m_store->setMark(std::nullopt);
+    m_store->setMark(std::nullopt);
+    EXPECT_EQ(m_store->mark(), std::nullopt);
 }
 
 TEST_P(BlobsSuite, KeysAreNoPaths)

@@ -7,6 +7,7 @@
 #include <functional>
 #include <memory>
 #include <string>
+#include <vector>
 
 namespace pelliko::server
 {
@@ -16,6 +17,9 @@ struct BlobsMaker {
     std::function<std::unique_ptr<Blobs>()> fresh;
     std::function<std::unique_ptr<Blobs>()> again;
 };
+
+/// The keys of all blobs that there are, looked for so many at a time.
+std::vector<std::string> keysOf(Blobs &blobs, std::size_t atOnce = 1000);
 
 /// What every blob store has to do. A new implementation instantiates this suite with a maker.
 class BlobsSuite : public testing::TestWithParam<BlobsMaker>

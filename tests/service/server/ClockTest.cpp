@@ -34,7 +34,16 @@ public:
     {
         return m_blobs.openForReading(key);
     }
-    std::vector<std::string> keys() override { return m_blobs.keys(); }
+    std::vector<StoredBlob> list(const std::string &after, std::size_t most) override
+    {
+        return m_blobs.list(after, most);
+    }
+    std::optional<std::uint64_t> sizeOf(const std::string &key) override
+    {
+        return m_blobs.sizeOf(key);
+    }
+    std::optional<StoreMark> mark() override { return m_blobs.mark(); }
+    void setMark(const std::optional<StoreMark> &mark) override { m_blobs.setMark(mark); }
     void remove(const std::string &key) override
     {
         m_blobs.remove(key);

@@ -373,12 +373,13 @@ TEST_P(MetadataSuite, ABlobIsKnownUntilItIsForgotten)
 {
     const ShareRecord share = make({10});
     const std::string blob = share.files[0].blob;
-    EXPECT_TRUE(m_store->knowsBlob(blob));
-    EXPECT_FALSE(m_store->knowsBlob(std::string(22, 'A')));
+    EXPECT_THAT(m_store->unknownBlobs({blob}), IsEmpty());
+    const std::string other(22, 'A');
+    EXPECT_THAT(m_store->unknownBlobs({other, blob}), ElementsAre(other));
     m_store->withdrawShare(m_account, share.key, 1000);
-    EXPECT_TRUE(m_store->knowsBlob(blob));
+    EXPECT_THAT(m_store->unknownBlobs({blob}), IsEmpty());
     m_store->forgetBlob(blob);
-    EXPECT_FALSE(m_store->knowsBlob(blob));
+    EXPECT_THAT(m_store->unknownBlobs({blob, other}), ElementsAre(blob, other));
 }
 
 } // namespace pelliko::server

@@ -88,7 +88,7 @@ class Commands(ServerCase):
 
     def test_help_everywhere(self):
         for words in [[], ["serve"], ["account"], ["account", "add"], ["account", "list"],
-                      ["account", "remove"], ["account", "invite"], ["account", "renew"]]:
+                      ["account", "remove"], ["account", "invite"], ["account", "renew"], ["migrate"], ["check"]]:
             done = run(*words, "--help")
             self.assertEqual(done.returncode, 0)
             self.assertIn("Usage:", done.stdout)

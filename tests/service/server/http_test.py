@@ -13,7 +13,7 @@ if __name__ == "__main__":
     harness.PROGRAM = sys.argv.pop(1)
     suites = ["refusals_suite", "shares_suite", "joined_suite", "uploads_suite", "downloads_suite",
               "connections_suite", "expiry_suite", "commands_suite",
-              "space_suite", "registration_suite", "monitoring_suite"]
+              "space_suite", "registration_suite", "monitoring_suite", "checking_suite", "moving_suite.Moving"]
     names = sys.argv[1:] or suites
     tests = unittest.defaultTestLoader.loadTestsFromNames(names)
     result = unittest.TextTestRunner(verbosity=2).run(tests)
