@@ -36,9 +36,10 @@ set(pelliko_session_display --no-server)
 set(pelliko_session_server --no-display)
 set(pelliko_session_modem --no-display --no-server --modem ofono:262011234567890,310150123456789)
 set(pelliko_session_phone --modem ofono)
+set(pelliko_session_cluster --no-server --modem ofono:234159900000100)
 set(pelliko_session_full)
 
-# pelliko_test(NAME SOURCES... [LIBS libs...] [SESSION none|bus|display|server|modem|phone|full] [TIMEOUT seconds]
+# pelliko_test(NAME SOURCES... [LIBS libs...] [SESSION none|bus|display|server|modem|phone|cluster|full] [TIMEOUT seconds]
 #              [PRECOMPILED headers])
 # One GoogleTest program; NAME names the module under test.
 function(pelliko_test name)
