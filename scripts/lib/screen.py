@@ -15,12 +15,13 @@ import Xlib.ext.damage
 import pyatspi
 from gi.repository import Gio, GLib
 
-from world import LIMIT, WorldError, run, wait_for
+from world import LIMIT, WorldError, let_pass, run, wait_for
 
 _EVENTS = ("object:state-changed:showing", "object:state-changed:visible", "object:children-changed",
            "object:bounds-changed", "window:create", "window:activate", "object:state-changed:focused",
            "object:text-changed:insert", "object:text-changed:delete")
 _CURSOR_WIDTH, _CURSOR_HEIGHT = 16, 64  # what is drawn anew when a text cursor blinks, in whole tiles
+_STEP = 0.1  # seconds between two looks at something that may move
 
 
 def _no_matter(_event):
@@ -85,6 +86,25 @@ def find(label, role=None):
     """The extents of the control with this label, or None."""
     for name, found_role, extents, _enabled in controls():
         if name == label and (role is None or role in found_role) and extents.width > 1 and extents.height > 1:
+            return extents
+    return None
+
+
+def at_rest(label, role=None):
+    """The extents of the control with this label once it stands: popups slide in. None when it went away."""
+    for node in nodes():
+        try:
+            if node.name != label or not (role is None or role in node.getRoleName()):
+                continue
+            if not node.getState().contains(pyatspi.STATE_SHOWING):
+                continue
+            component, before = node.queryComponent(), None
+            while before != (extents := component.getExtents(pyatspi.DESKTOP_COORDS)):
+                before = extents
+                let_pass(_STEP)
+        except Exception:  # the object went away while it was looked at
+            continue
+        if extents.width > 1 and extents.height > 1:
             return extents
     return None
 
@@ -202,6 +222,7 @@ def wait_active(name, active=True, limit=LIMIT):
 def press(label, role=None, limit=LIMIT):
     """Waits for a control and presses it with the pointer."""
     extents = wait_for_control(label, role, limit)
+    extents = at_rest(label, role) or extents
     x, y = extents.x + extents.width // 2, extents.y + extents.height // 2
     run("xdotool", "mousemove", str(x), str(y), "click", "1")
 

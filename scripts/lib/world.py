@@ -62,6 +62,13 @@ def wait_for(condition, what, limit=LIMIT):
         GLib.source_remove(timer)
 
 
+def let_pass(seconds):
+    """Turns the main loop for so long."""
+    over = []
+    GLib.timeout_add(int(seconds * 1000), lambda: over.append(True))
+    wait_for(lambda: over, "time to pass", seconds + LIMIT)
+
+
 class Follower:
     """Hands out the complete lines of a file that others append to, as they come."""
 

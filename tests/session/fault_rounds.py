@@ -75,7 +75,7 @@ class Stage:
 
     @staticmethod
     def place_of(label):
-        extents = screen.find(label, "button")
+        extents = screen.at_rest(label, "button")
         return extents and (extents.x + extents.width // 2, extents.y + extents.height // 2)
 
     def learn_button(self):

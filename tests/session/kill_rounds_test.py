@@ -19,7 +19,7 @@ import unittest
 import share_case
 import screen
 import world
-from gi.repository import Gio, GLib
+from gi.repository import Gio
 
 VICTIMS = ["application", "service", "quickpanel", "server"]
 NAMES = {"application": world.APP, "service": world.SERVICE, "quickpanel": "com.velmora.quickpanel"}
@@ -158,17 +158,11 @@ class KillRounds(Killing):
         if among_messages:
             world.wait_for(lambda: self.changes[JOURNAL] > changes and len(self.states()) > known,
                            "the first message to be begun")
-        self.let_pass(moment)
+        world.let_pass(moment)
         self.kill(victim)
         self.bring_back(victim)
         self.wait_over(sent_before + len(people))
         self.check(f"round{number}.bin.mp4", data, sent_before, len(people))
-
-    @staticmethod
-    def let_pass(seconds):
-        over = []
-        GLib.timeout_add(int(seconds * 1000), lambda: over.append(True))
-        world.wait_for(lambda: over, "the moment of the kill")
 
 
 class BetweenTwoSteps(Killing):
