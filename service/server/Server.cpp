@@ -52,10 +52,10 @@ struct Server::State {
     State(const Config &config, Metadata &metadata, Blobs &blobs, std::function<Seconds()> now,
           std::unique_ptr<Peers> others)
         : timeouts(config.timeouts), drain(config.drain), peers(std::move(others)),
-          pool(std::max(storageThreads, blobs.callsAtOnce())), writes(*peers),
+          blobPool(std::max(storageThreads, blobs.callsAtOnce())), writes(*peers),
           pushes(io.get_executor(), limitsOf(config, capacity)),
-          context{metadata,      blobs,          *peers,          pool, writes, pushes,
-                  config.limits, std::move(now), config.publicUrl},
+          context{metadata, blobs,  *peers,        pool,           blobPool,
+                  writes,   pushes, config.limits, std::move(now), config.publicUrl},
           sweeper(io.get_executor(), context), acceptor(io), monitorAcceptor(io),
           signals(io, SIGTERM, SIGINT), stopTimer(io),
           room(io, asio::steady_timer::time_point::max())
@@ -84,7 +84,8 @@ struct Server::State {
     std::chrono::seconds drain;
     asio::io_context io{1};
     std::unique_ptr<Peers> peers;
-    StoragePool pool;
+    StoragePool pool{storageThreads};
+    StoragePool blobPool;
     ActiveWrites writes;
     PushHub pushes;
     Context context;
@@ -144,7 +145,8 @@ std::string Server::State::listen(tcp::acceptor &on, const ListenAddress &addres
 
 Levels Server::State::levels() const
 {
-    return {connections.size(), pushes.count(), writes.count(), pool.inHand(), stopping};
+    return {connections.size(), pushes.count(), writes.count(), pool.inHand() + blobPool.inHand(),
+            stopping};
 }
 
 Task<void> Server::State::serve(std::shared_ptr<Connection> connection)
@@ -160,7 +162,7 @@ Task<void> Server::State::serve(std::shared_ptr<Connection> connection)
 void Server::State::admit(tcp::socket socket)
 {
     auto connection = Connection::make(
-        std::move(socket), timeouts, pool,
+        std::move(socket), timeouts, blobPool,
         [this](Exchange &exchange) { return handleRequest(exchange, context); }, refuseHead);
     if (stopping)
         connection->finish();
@@ -221,7 +223,7 @@ Task<void> Server::State::acceptMonitors()
         if (error)
             co_return;
         auto connection = Connection::make(
-            std::move(socket), timeouts, pool,
+            std::move(socket), timeouts, blobPool,
             [this](Exchange &exchange) { return handleMonitoring(exchange, context); }, refuseHead);
         asio::co_spawn(io, serveMonitor(std::move(connection)), asio::detached);
     }
@@ -302,6 +304,7 @@ Server::~Server()
 {
     m_state->peers->close();
     m_state->pool.join();
+    m_state->blobPool.join();
 }
 
 std::string Server::url() const

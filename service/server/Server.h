@@ -16,7 +16,7 @@ namespace pelliko::server
 class Server
 {
 public:
-    /// How many calls of the stores it makes at once.
+    /// How many calls of the metadata it makes at once, and the least that it makes of the blobs.
     static constexpr std::size_t storageThreads = 8;
 
     /// Starts to listen; throws std::exception with a sentence when that fails. The stores outlive

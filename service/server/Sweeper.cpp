@@ -20,16 +20,13 @@ constexpr std::chrono::seconds retryDelay{60};
 /// A store of millions is looked through in pieces.
 constexpr std::size_t blobsAtOnce = 1000;
 
-std::size_t removeUnknown(const Context &context, const std::vector<StoredBlob> &blobs)
+std::vector<std::string> keysOf(const std::vector<StoredBlob> &blobs)
 {
     std::vector<std::string> keys;
     keys.reserve(blobs.size());
     for (const StoredBlob &blob : blobs)
         keys.push_back(blob.key);
-    const std::vector<std::string> unknown = context.metadata.unknownBlobs(keys);
-    for (const std::string &key : unknown)
-        context.blobs.remove(key);
-    return unknown.size();
+    return keys;
 }
 
 } // namespace
@@ -98,16 +95,19 @@ Task<void> Sweeper::removeStrays()
     std::size_t removed = 0;
     std::string last;
     while (!isEmpty && !m_stopped) {
-        const std::size_t before = removed;
-        const bool ended = co_await m_context.pool.run([&] {
-            const auto blobs = m_context.blobs.list(last, blobsAtOnce);
-            removed += removeUnknown(m_context, blobs);
-            last = blobs.empty() ? last : blobs.back().key;
-            return blobs.empty();
-        });
-        m_context.metrics.blobsRemoved(removed - before);
-        if (ended)
+        const std::vector<std::string> keys = co_await m_context.blobPool.run(
+            [&] { return keysOf(m_context.blobs.list(last, blobsAtOnce)); });
+        if (keys.empty())
             break;
+        last = keys.back();
+        const std::vector<std::string> unknown =
+            co_await m_context.pool.run([&] { return m_context.metadata.unknownBlobs(keys); });
+        co_await m_context.blobPool.run([&] {
+            for (const std::string &key : unknown)
+                m_context.blobs.remove(key);
+        });
+        removed += unknown.size();
+        m_context.metrics.blobsRemoved(unknown.size());
     }
     if (removed > 0)
         std::fprintf(stderr, "pelliko-server: removed %zu stray blobs\n", removed);
@@ -138,10 +138,8 @@ Task<void> Sweeper::removeDoomed()
         for (const std::string &key : keys) {
             // Under the lease nobody can make the blob again after it was removed.
             const ActiveWrites::Lease lease = co_await m_context.writes.take(key, [] {});
-            co_await m_context.pool.run([&] {
-                m_context.blobs.remove(key);
-                m_context.metadata.forgetBlob(key);
-            });
+            co_await m_context.blobPool.run([&] { m_context.blobs.remove(key); });
+            co_await m_context.pool.run([&] { m_context.metadata.forgetBlob(key); });
             m_context.metrics.blobsRemoved(1);
         }
     }

@@ -22,7 +22,11 @@ struct Context {
     Metadata &metadata;
     Blobs &blobs;
     Peers &peers;
+    /// For calls of the metadata; as many threads as the database has sessions for, so that none
+    /// waits for one.
     StoragePool &pool;
+    /// For calls of the blobs, which may take long: nobody who only asks the metadata waits behind.
+    StoragePool &blobPool;
     ActiveWrites &writes;
     PushHub &pushes;
     Limits limits;

@@ -42,7 +42,7 @@ Task<std::shared_ptr<BlobReader>> openBlob(Context &context, std::string key)
 {
     if (key.empty())
         throw Refusal(Error::fileLost);
-    std::shared_ptr<BlobReader> reader = co_await context.pool.run(
+    std::shared_ptr<BlobReader> reader = co_await context.blobPool.run(
         [&]() -> std::shared_ptr<BlobReader> { return context.blobs.openForReading(key); });
     if (!reader)
         throw StorageFailure(StorageFailure::Kind::broken, "blob " + key + " is absent");
@@ -100,7 +100,7 @@ Task<void> sendBlob(Exchange &exchange, Context &context, std::shared_ptr<BlobRe
         const std::span<char> part(buffer.data(),
                                    std::min<std::uint64_t>(buffer.size(), range.length));
         const std::size_t count =
-            co_await context.pool.run([&] { return blob->read(range.offset, part); });
+            co_await context.blobPool.run([&] { return blob->read(range.offset, part); });
         if (count == 0)
             throw StorageFailure(StorageFailure::Kind::broken, "a blob is shorter than its file");
         co_await exchange.write({buffer.data(), count});
@@ -131,7 +131,7 @@ Task<void> zipFile(Exchange &exchange, Context &context, ZipWriter &zip, FileRec
     const auto blob = co_await openBlob(context, file.blob);
     std::vector<char> buffer(bufferSize);
     for (std::uint64_t offset = 0; offset < file.size;) {
-        const std::size_t count = co_await context.pool.run([&] {
+        const std::size_t count = co_await context.blobPool.run([&] {
             const std::size_t read = blob->read(offset, buffer);
             zip.add({buffer.data(), read});
             return read;
@@ -151,7 +151,7 @@ Task<std::string> readWhole(Context &context, FileRecord file)
     for (std::size_t offset = 0; offset < bytes.size();) {
         const std::span<char> rest = std::span(bytes).subspan(offset);
         const std::size_t count =
-            co_await context.pool.run([&] { return blob->read(offset, rest); });
+            co_await context.blobPool.run([&] { return blob->read(offset, rest); });
         if (count == 0)
             throw StorageFailure(StorageFailure::Kind::broken, "a blob is shorter than its file");
         offset += count;

@@ -54,13 +54,13 @@ Task<void> checkpoint(Context &context, std::shared_ptr<ActiveWrite> write)
     if (!write->writer)
         co_return;
     const std::uint64_t upTo = write->kept = write->written;
-    co_await context.pool.run([&] {
+    co_await context.blobPool.run([&] {
         if (upTo == write->size)
             write->writer->finish();
         else
             write->writer->sync();
-        noteOffset(context.metadata, *write, upTo);
     });
+    co_await context.pool.run([&] { noteOffset(context.metadata, *write, upTo); });
 }
 
 /// A checkpoint while more is coming: as far as the store has got by itself.
@@ -69,7 +69,7 @@ Task<void> Checkpoints::note(std::shared_ptr<Running> running)
     const std::shared_ptr<ActiveWrite> write = m_write;
     const std::uint64_t written = write->written;
     running->notedUpTo =
-        co_await m_context.pool.run([&] { return write->writer->settle(written); });
+        co_await m_context.blobPool.run([&] { return write->writer->settle(written); });
     // The whole file is noted only when its blob is whole.
     if (running->notedUpTo <= write->kept || running->notedUpTo >= write->size)
         co_return;

@@ -23,7 +23,7 @@ constexpr std::size_t stepSize = 1024 * 1024;
 
 Task<void> openWriter(Context &context, ActiveWrite &write)
 {
-    write.writer = co_await context.pool.run(
+    write.writer = co_await context.blobPool.run(
         [&]() -> std::shared_ptr<BlobWriter> { return context.blobs.openForWriting(write.key); });
 }
 
@@ -81,11 +81,13 @@ Task<void> dropUnnoted(Context &context, std::shared_ptr<ActiveWrite> write)
     write->written = write->kept;
     if (!write->writer)
         co_return;
-    co_await context.pool.run([&] {
-        // What another server has stored since is not this one's to drop.
-        if (write->right == 0 || context.metadata.recordOffset(write->key, 0, write->right))
-            write->writer->truncate(write->kept);
-    });
+    bool isOurs = write->right == 0;
+    // What another server has stored since is not this one's to drop.
+    if (!isOurs)
+        isOurs = co_await context.pool.run(
+            [&] { return context.metadata.recordOffset(write->key, 0, write->right); });
+    if (isOurs)
+        co_await context.blobPool.run([&] { write->writer->truncate(write->kept); });
 }
 
 void checkAppend(const Request &request, const UploadRecord &upload, std::uint64_t offset)

@@ -155,9 +155,9 @@ std::string answersTo(std::string_view bytes)
     NoPeers peers;
     ActiveWrites writes(peers);
     PushHub pushes(io.get_executor(), world().limits);
-    Context context{world().metadata, world().blobs, peers,          world().pool,
-                    writes,           pushes,        world().limits, [] { return now; },
-                    "https://host"};
+    Context context{world().metadata,   world().blobs, peers,  world().pool,
+                    world().pool,       writes,        pushes, world().limits,
+                    [] { return now; }, "https://host"};
     Peers::Ears ears;
     ears.pushes = [&](const auto &accounts) { pushes.announce(accounts); };
     peers.listen(ears);
