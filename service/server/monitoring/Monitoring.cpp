@@ -31,16 +31,27 @@ Response notReady(const char *reason)
     return response;
 }
 
-/// Whether the metadata store answers; a failure is logged, since the answer does not say why.
-bool storeAnswers(Context &context)
+/// Whether a store answers; a failure is logged, since the answer does not say why.
+template <class Store> bool answers(Store &store)
 {
     try {
-        context.metadata.ping();
+        store.ping();
         return true;
     } catch (const StorageFailure &failure) {
         std::fprintf(stderr, "pelliko-server: not ready: %s\n", failure.what());
         return false;
     }
+}
+
+Task<bool> storesAnswer(Context &context)
+{
+    const bool known = co_await context.pool.run([&] { return answers(context.metadata); });
+    // One that could be reached just now is not asked: it counts requests, and its threads may be
+    // busy with what is only slow.
+    if (!known || context.blobs.wasReached())
+        co_return known;
+    const bool stored = co_await context.blobPool.run([&] { return answers(context.blobs); });
+    co_return stored;
 }
 
 Task<void> showMetrics(Exchange &exchange, Context &context)
@@ -88,8 +99,8 @@ Task<void> showReadiness(Exchange &exchange, Context &context)
         co_await exchange.respond(std::move(response));
         co_return;
     }
-    const bool answers = co_await context.pool.run([&] { return storeAnswers(context); });
-    Response response = answers ? plainText("ok\n") : notReady("the store does not answer\n");
+    const bool ready = co_await storesAnswer(context);
+    Response response = ready ? plainText("ok\n") : notReady("the store does not answer\n");
     co_await exchange.respond(std::move(response));
 }
 

@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <array>
 #include <chrono>
+#include <cstdlib>
 #include <random>
 #include <thread>
 #include <utility>
@@ -14,8 +15,19 @@ namespace pelliko::server::s3
 namespace
 {
 
+using Clock = std::chrono::steady_clock;
+
 constexpr int mostTries = 7;
+/// A connection that was kept may have died unnoticed: one try more, however long the first took.
+constexpr int leastTries = 2;
+/// After which no further try begins.
+constexpr std::chrono::seconds tryingTime{10};
 constexpr std::chrono::milliseconds firstPause{50};
+/// Stores refuse what was signed a quarter of an hour before or after their own time.
+constexpr std::time_t toleratedSeconds = 600;
+/// A store counts as away only when a call has tried for some seconds.
+constexpr std::chrono::seconds firstDistance{1};
+
 /// An empty body's, which most calls have.
 const std::string &emptyHash()
 {
@@ -37,6 +49,8 @@ bool mayPass(const Client::Answer &answer)
     static const std::array<std::string_view, 6> passing{
         "InternalError", "SlowDown",       "ServiceUnavailable",
         "BadDigest",     "RequestTimeout", "XAmzContentSHA256Mismatch"};
+    if (answer.wasMistimed)
+        return true;
     const int status = answer.wire.status;
     return status >= 500 ? status != 501 && status != 507
                          : status == 429 || std::find(passing.begin(), passing.end(),
@@ -71,9 +85,9 @@ std::uint64_t wholeSize(const WireAnswer &answer)
 
 } // namespace
 
-Client::Client(Address address)
-    : m_address(std::move(address)), m_credentials(readCredentials(m_address)),
-      m_wires(std::make_shared<Wires>(m_address.caFile))
+Client::Client(Address address, Now now)
+    : m_address(std::move(address)), m_now(now), m_credentials(readCredentials(m_address)),
+      m_wires(std::make_shared<Wires>(m_address.caFile)), m_backOff(firstDistance)
 {
 }
 
@@ -93,18 +107,25 @@ WireRequest Client::prepare(const Call &call, const std::string &payloadHash) co
 {
     Signable request = signable(call);
     const std::string host = request.headers.back().second;
-    sign(request, payloadHash, {m_credentials, m_address.region, std::time(nullptr)});
+    sign(request, payloadHash, {m_credentials, m_address.region, storesTime()});
     std::string url = (m_address.tls ? "https://" : "http://") + host + request.path;
     if (!request.query.empty())
         url += "?" + encodedQuery(request.query);
     return {call.method, std::move(url), std::move(request.headers), call.body};
 }
 
-Client::Answer Client::askOnce(const Call &call, const std::string &payloadHash, Wire &wire) const
+Client::Answer Client::askOnce(const Call &call, const std::string &payloadHash, Wire &wire)
 {
     const WireRequest request = prepare(call, payloadHash);
+    const std::time_t signedAhead = m_ahead;
     Answer answer;
     answer.wire = call.streamed ? wire.begin(request) : wire.run(request);
+    m_backOff.reached();
+    if (const auto time = answer.wire.time())
+        m_ahead = *time - m_now();
+    // Not every refusal has a body that says why.
+    answer.wasMistimed =
+        answer.wire.status == 403 && std::abs(m_ahead - signedAhead) >= toleratedSeconds;
     // Also an answer that began well may end in an error.
     if (answer.wire.body.find("<Error>") != std::string::npos)
         answer.errorCode = errorCode(answer.wire.body);
@@ -113,19 +134,28 @@ Client::Answer Client::askOnce(const Call &call, const std::string &payloadHash,
 
 Client::Answer Client::ask(const Call &call, std::shared_ptr<Wire> wire)
 {
+    if (!m_backOff.mayTry())
+        throw StorageFailure(StorageFailure::Kind::unavailable,
+                             "the store " + m_address.host + " could not be reached a moment ago");
     const std::string payloadHash = call.body.empty() ? emptyHash() : hexSha256(call.body);
     if (!wire)
         wire = m_wires->take();
+    const auto end = Clock::now() + tryingTime;
+    const auto isLast = [end](int tries) {
+        return tries >= mostTries || (tries >= leastTries && Clock::now() >= end);
+    };
     for (int tries = 1;; ++tries) {
         try {
             Answer answer = askOnce(call, payloadHash, *wire);
-            if (!mayPass(answer) || tries == mostTries)
+            if (!mayPass(answer) || isLast(tries))
                 return answer;
         } catch (const TransportFailure &failure) {
-            if (tries == mostTries)
+            if (isLast(tries)) {
+                m_backOff.missed();
                 throw StorageFailure(StorageFailure::Kind::unavailable,
                                      "the store " + m_address.host +
                                          " cannot be reached: " + failure.what());
+            }
         }
         std::this_thread::sleep_for(pauseAfter(tries));
     }
@@ -243,7 +273,7 @@ std::string Client::presigned(const std::string &name, long seconds, const std::
     const std::string path = request.path;
     return (m_address.tls ? "https://" : "http://") + host + path + "?" +
            presignedQuery(std::move(request), seconds,
-                          {m_credentials, m_address.region, std::time(nullptr)});
+                          {m_credentials, m_address.region, storesTime()});
 }
 
 } // namespace pelliko::server::s3

@@ -3,8 +3,11 @@
 #include "s3/Address.h"
 #include "s3/Answers.h"
 #include "s3/Wire.h"
+#include "store/BackOff.h"
 
+#include <atomic>
 #include <cstdint>
+#include <ctime>
 #include <memory>
 #include <optional>
 #include <string>
@@ -14,19 +17,27 @@ namespace pelliko::server::s3
 {
 
 /// The calls of an S3 store. Names of objects are without the address's prefix. Each call is
-/// repeated with growing pauses as long as the store is away, busy or failing, for some seconds;
-/// then, and for every refusal that another try would not change, it throws StorageFailure. Each
-/// body that is sent is hashed and the store refuses one that arrives changed. Thread-safe.
+/// repeated with growing pauses as long as the store is away, busy or failing, for some seconds, or
+/// once when it is silent; then, and for every refusal that another try would not change, it throws
+/// StorageFailure. While the store cannot be reached, calls fail at once but for one that tries.
+/// Each body that is sent is hashed and the store refuses one that arrives changed. Requests are
+/// signed with the store's time, as far as it has told that. Thread-safe.
 class Client
 {
 public:
+    /// Seconds since the epoch, as this machine knows them.
+    using Now = std::time_t (*)();
+
     /// Throws std::runtime_error when there are no credentials.
-    explicit Client(Address address);
+    explicit Client(
+        Address address, Now now = [] { return std::time(nullptr); });
 
     /// What the store has said to a call.
     struct Answer {
         WireAnswer wire;
         std::string errorCode;
+        /// Refused, having been signed with a time that is far from the store's: known by now.
+        bool wasMistimed = false;
 
         [[nodiscard]] bool good() const { return wire.status < 300 && errorCode.empty(); }
     };
@@ -73,6 +84,9 @@ public:
     std::string presigned(const std::string &name, long seconds, const std::string &disposition,
                           const std::string &type) const;
 
+    /// False when the store could not be reached the last time.
+    [[nodiscard]] bool wasReached() const { return !m_backOff.isAway(); }
+
     [[nodiscard]] const Address &address() const { return m_address; }
 
 private:
@@ -90,12 +104,17 @@ private:
     WireRequest prepare(const Call &call, const std::string &payloadHash) const;
     Signable signable(const Call &call) const;
     Answer ask(const Call &call, std::shared_ptr<Wire> wire = nullptr);
-    Answer askOnce(const Call &call, const std::string &payloadHash, Wire &wire) const;
+    Answer askOnce(const Call &call, const std::string &payloadHash, Wire &wire);
+    [[nodiscard]] std::time_t storesTime() const { return m_now() + m_ahead; }
     Answer need(const Call &call);
 
     Address m_address;
+    Now m_now;
     Credentials m_credentials;
     std::shared_ptr<Wires> m_wires;
+    BackOff m_backOff;
+    /// Seconds by which the store's clock is ahead of this one.
+    std::atomic<std::time_t> m_ahead{0};
 };
 
 } // namespace pelliko::server::s3

@@ -14,7 +14,7 @@ namespace
 
 constexpr long connectSeconds = 5;
 /// A store that sends and takes nothing for so long is as good as gone.
-constexpr long silentSeconds = 30;
+constexpr long silentSeconds = 15;
 constexpr long bufferBytes = 512L * 1024;
 /// Of a streamed body; the rest waits in the network.
 constexpr std::size_t mostWaiting = 512UL * 1024;
@@ -46,6 +46,13 @@ std::string WireAnswer::header(std::string_view name) const
     const auto found = std::find_if(headers.begin(), headers.end(),
                                     [&](const auto &pair) { return pair.first == name; });
     return found == headers.end() ? std::string() : found->second;
+}
+
+std::optional<std::time_t> WireAnswer::time() const
+{
+    const std::string date = header("date");
+    const std::time_t sent = date.empty() ? -1 : curl_getdate(date.c_str(), nullptr);
+    return sent < 0 ? std::nullopt : std::optional(sent);
 }
 
 struct Wire::State {

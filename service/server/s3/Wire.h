@@ -3,8 +3,10 @@
 #include "s3/Signature.h"
 
 #include <cstddef>
+#include <ctime>
 #include <memory>
 #include <mutex>
+#include <optional>
 #include <span>
 #include <stdexcept>
 #include <string>
@@ -37,6 +39,8 @@ struct WireAnswer {
 
     /// The header's value, or an empty text.
     [[nodiscard]] std::string header(std::string_view name) const;
+    /// When the other side says it was sent, in seconds since the epoch.
+    [[nodiscard]] std::optional<std::time_t> time() const;
 };
 
 /// A connection to the store that is kept from one request to the next. One thread at a time.

@@ -114,6 +114,12 @@ public:
         return std::nullopt;
     }
 
+    /// False when the store could not be reached the last time. Does not wait.
+    [[nodiscard]] virtual bool wasReached() const { return true; }
+
+    /// Asks the store for a sign of life.
+    virtual void ping() {}
+
     /// How many calls may wait for the store at the same time without one keeping it busy.
     [[nodiscard]] virtual std::size_t callsAtOnce() const { return 8; }
 };

@@ -8,6 +8,7 @@
 #include <cerrno>
 #include <charconv>
 #include <cstring>
+#include <sstream>
 #include <string_view>
 #include <utility>
 
@@ -29,13 +30,31 @@ constexpr std::uint32_t typeBigintArray = 1016;
 /// Beyond what the database itself grants a statement: it hangs, or somebody in between does.
 constexpr std::chrono::seconds answersPatience{13};
 /// A statement that takes longer waits for something that will not come; its request is told to
-/// come again. A peer that is silent for the connection's own limits is taken for dead.
+/// come again. A peer that is silent for the connection's own limits is taken for dead, by either
+/// side: a lock whose holder was cut off must not outlive it by the hours that are the system's.
 constexpr const char *sessionSettings = "SET client_min_messages = warning;"
                                         "SET client_encoding = 'UTF8';"
                                         "SET statement_timeout = '10s';"
                                         "SET lock_timeout = '8s';"
                                         "SET idle_in_transaction_session_timeout = '15s';"
+                                        "SET tcp_keepalives_idle = 2;"
+                                        "SET tcp_keepalives_interval = 1;"
+                                        "SET tcp_keepalives_count = 3;"
+                                        "SET tcp_user_timeout = 5000;"
                                         "SET standard_conforming_strings = on";
+
+/// What the library says of each of the hosts that it tried, without its questions.
+std::string sentencesOf(const char *message)
+{
+    std::istringstream lines(message == nullptr ? "" : message);
+    std::string all;
+    for (std::string line; std::getline(lines, line);) {
+        if (line.empty() || line.front() == '\t')
+            continue;
+        all += (all.empty() ? "" : "; ") + line;
+    }
+    return all;
+}
 
 std::string firstLineOf(const char *message)
 {
@@ -172,7 +191,7 @@ PostgresConnection::PostgresConnection(const std::string &url)
     m_connection.reset(PQconnectdbParams(names.data(), values.data(), 1));
     if (!isAlive())
         throw PostgresFailure(Kind::unavailable, Remedy::none,
-                              "metadata: " + firstLineOf(PQerrorMessage(get())));
+                              "metadata: " + sentencesOf(PQerrorMessage(get())));
     m_patience = answersPatience;
     PQsetNoticeProcessor(
         get(), [](void *, const char *) {}, nullptr);

@@ -1,6 +1,5 @@
 #include "store/PostgresPool.h"
 
-#include <algorithm>
 #include <thread>
 #include <utility>
 
@@ -13,8 +12,6 @@ using namespace std::chrono_literals;
 using Kind = StorageFailure::Kind;
 using Remedy = PostgresFailure::Remedy;
 
-constexpr auto firstBackOff = 100ms;
-constexpr auto longestBackOff = 2s;
 /// How long a call waits for a session that others have.
 constexpr auto patience = 15s;
 /// More in a row is no chance any more.
@@ -32,34 +29,16 @@ PostgresPool::PostgresPool(std::string url, std::size_t connections)
 {
 }
 
-void PostgresPool::checkBackOff()
-{
-    const std::lock_guard lock(m_mutex);
-    const auto now = Clock::now();
-    if (now < m_notBefore)
-        throw unavailable("metadata: the database could not be reached a moment ago");
-    // Whoever comes while this one tries is told at once instead of waiting as well.
-    if (m_backOff > Clock::duration::zero())
-        m_notBefore = now + m_backOff;
-}
-
-void PostgresPool::noteOpened(bool success)
-{
-    const std::lock_guard lock(m_mutex);
-    m_backOff = success ? Clock::duration::zero()
-                        : std::clamp<Clock::duration>(2 * m_backOff, firstBackOff, longestBackOff);
-    m_notBefore = Clock::now() + m_backOff;
-}
-
 std::unique_ptr<PostgresConnection> PostgresPool::open()
 {
-    checkBackOff();
+    if (!m_backOff.mayTry())
+        throw unavailable("metadata: the database could not be reached a moment ago");
     try {
         auto connection = std::make_unique<PostgresConnection>(m_url);
-        noteOpened(true);
+        m_backOff.reached();
         return connection;
     } catch (const PostgresFailure &) {
-        noteOpened(false);
+        m_backOff.missed();
         throw;
     }
 }
@@ -100,7 +79,17 @@ void PostgresPool::giveBack(std::unique_ptr<PostgresConnection> connection, bool
     m_returned.notify_one();
 }
 
-bool PostgresPool::hasCommitted(const std::string &transaction)
+PostgresPool::Mark PostgresPool::begin(PostgresConnection &db)
+{
+    PostgresRows row =
+        db.command("BEGIN ISOLATION LEVEL READ COMMITTED; SELECT pg_current_xact_id(),"
+                   " extract(epoch FROM pg_postmaster_start_time())");
+    if (!row.next())
+        return {};
+    return {row.text(0), row.text(1)};
+}
+
+bool PostgresPool::hasCommitted(const Mark &mark)
 {
     // A session that is about to end still commits what it was told to: a moment is given to it.
     constexpr int mostLooks = 50;
@@ -108,22 +97,26 @@ bool PostgresPool::hasCommitted(const std::string &transaction)
         auto db = borrow();
         std::string status;
         try {
-            PostgresRows row = db->query("SELECT coalesce(pg_xact_status($1::text::xid8), '')"
-                                         " FROM pg_sleep(CASE WHEN $2 > 0 THEN 0.1 ELSE 0 END)",
-                                         transaction, look);
+            PostgresRows row =
+                db->query("SELECT CASE extract(epoch FROM pg_postmaster_start_time())::text WHEN $3"
+                          " THEN coalesce(pg_xact_status($1::text::xid8), '') ELSE 'elsewhere' END"
+                          " FROM pg_sleep(CASE WHEN $2 > 0 THEN 0.1 ELSE 0 END)",
+                          mark.transaction, look, mark.start);
             status = row.next() ? row.text(0) : std::string();
         } catch (...) {
             giveBack(std::move(db), false);
             throw;
         }
         giveBack(std::move(db), true);
+        if (status == "elsewhere")
+            throw unavailable("metadata: another database has taken over in mid-transaction");
         if (status != "in progress")
             return status == "committed";
     }
     throw unavailable("metadata: the database does not tell whether a transaction has happened");
 }
 
-void PostgresPool::commit(std::unique_ptr<PostgresConnection> &db, const std::string &transaction)
+void PostgresPool::commit(std::unique_ptr<PostgresConnection> &db, const Mark &mark)
 {
     try {
         db->command("COMMIT");
@@ -131,7 +124,7 @@ void PostgresPool::commit(std::unique_ptr<PostgresConnection> &db, const std::st
         if (failure.remedy() != Remedy::reconnect)
             throw;
         giveBack(std::exchange(db, nullptr), false);
-        if (!hasCommitted(transaction))
+        if (!hasCommitted(mark))
             throw;
     }
 }
@@ -140,17 +133,14 @@ void PostgresPool::attempt(const Body &body, Mode mode)
 {
     auto db = borrow();
     try {
-        std::string transaction;
-        if (mode == Mode::write) {
-            PostgresRows row =
-                db->command("BEGIN ISOLATION LEVEL READ COMMITTED; SELECT pg_current_xact_id()");
-            transaction = row.next() ? row.text(0) : std::string();
-        } else if (mode == Mode::read) {
+        Mark mark;
+        if (mode == Mode::write)
+            mark = begin(*db);
+        else if (mode == Mode::read)
             db->command("BEGIN ISOLATION LEVEL REPEATABLE READ READ ONLY");
-        }
         body(*db);
         if (mode == Mode::write)
-            commit(db, transaction);
+            commit(db, mark);
         else if (mode == Mode::read)
             db->command("COMMIT");
     } catch (...) {

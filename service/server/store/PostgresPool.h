@@ -1,5 +1,6 @@
 #pragma once
 
+#include "store/BackOff.h"
 #include "store/PostgresConnection.h"
 
 #include <chrono>
@@ -44,7 +45,6 @@ public:
 
 private:
     using Body = std::function<void(PostgresConnection &)>;
-    using Clock = std::chrono::steady_clock;
     enum class Mode { write, read, single };
 
     template <class Work, class Run> static auto withResult(Work &work, Run run)
@@ -63,22 +63,27 @@ private:
     std::unique_ptr<PostgresConnection> borrow();
     void giveBack(std::unique_ptr<PostgresConnection> connection, bool sound);
     std::unique_ptr<PostgresConnection> open();
-    void checkBackOff();
-    void noteOpened(bool success);
 
     void transact(const Body &body, Mode mode);
     void attempt(const Body &body, Mode mode);
-    void commit(std::unique_ptr<PostgresConnection> &db, const std::string &transaction);
-    /// Whether a transaction whose commit was not answered has happened.
-    bool hasCommitted(const std::string &transaction);
+    /// By what a transaction is found again from another session.
+    struct Mark {
+        std::string transaction;
+        /// The database's start: another one, or one that came back after a crash, gives the same
+        /// numbers to other transactions.
+        std::string start;
+    };
+    static Mark begin(PostgresConnection &db);
+    void commit(std::unique_ptr<PostgresConnection> &db, const Mark &mark);
+    /// Whether a transaction whose commit was not answered has happened. Throws when nobody knows.
+    bool hasCommitted(const Mark &mark);
 
     const std::string m_url;
     std::mutex m_mutex;
     std::condition_variable m_returned;
     std::vector<std::unique_ptr<PostgresConnection>> m_idle;
     std::size_t m_free;
-    Clock::time_point m_notBefore{};
-    Clock::duration m_backOff{};
+    BackOff m_backOff{std::chrono::milliseconds(100)};
 };
 
 } // namespace pelliko::server

@@ -94,6 +94,17 @@ S3Blobs::S3Blobs(s3::Address address) : m_state(std::make_unique<State>(std::mov
 
 S3Blobs::~S3Blobs() = default;
 
+bool S3Blobs::wasReached() const
+{
+    return m_state->client.wasReached();
+}
+
+void S3Blobs::ping()
+{
+    // Nobody's key: that it is not there is an answer like any other.
+    m_state->client.sizeOf("ping");
+}
+
 std::size_t S3Blobs::callsAtOnce() const
 {
     return atOnce;

@@ -28,6 +28,8 @@ public:
     std::optional<StoreMark> mark() override;
     void setMark(const std::optional<StoreMark> &mark) override;
     std::optional<std::string> addressOf(const std::string &key, const BlobVisit &visit) override;
+    [[nodiscard]] bool wasReached() const override;
+    void ping() override;
     [[nodiscard]] std::size_t callsAtOnce() const override;
 
 private:

@@ -282,6 +282,20 @@ TEST_F(S3Store, AWrongKeyIsAClearRefusal)
     }
 }
 
+/// Stores put up with a quarter of an hour.
+TEST_F(S3Store, AServerWhoseClockIsWrongSignsWithTheStoresTime)
+{
+    s3::Client ahead(s3::parseAddress(m_url), [] { return std::time(nullptr) + 1200; });
+    ahead.put(m_key, "hello");
+    s3::Client behind(s3::parseAddress(m_url), [] { return std::time(nullptr) - 1200; });
+    EXPECT_EQ(behind.sizeOf(m_key), 5U);
+    s3::Wire wire("");
+    for (const s3::Client *client : {&ahead, &behind}) {
+        const std::string address = client->presigned(m_key, 60, "attachment", "text/plain");
+        EXPECT_EQ(wire.run({"GET", address, {}, {}}).body, "hello");
+    }
+}
+
 TEST_F(S3Store, WithTlsTheStoresCertificateCounts)
 {
     const std::string url =
