@@ -1,6 +1,7 @@
 """A PostgreSQL server of one's own: in a folder that is removed at the end, as a user without rights, reached by a
 socket in that folder and by nothing else unless asked for."""
 
+import contextlib
 import os
 import pwd
 import shutil
@@ -24,9 +25,9 @@ def unprivileged():
 
 class PostgresEngine:
     """`settings` are the server's own, as texts; `clock` are seconds by which its clock is ahead; with `room` its
-    folder `small` holds only so many bytes."""
+    folder `small` holds only so many bytes; as `standby_of` another engine it follows that and takes no writes."""
 
-    def __init__(self, settings=None, clock=0, room=0):
+    def __init__(self, settings=None, clock=0, room=0, standby_of=None):
         self.directory = tempfile.mkdtemp(prefix="pg-", dir="/tmp")
         self.settings = {"listen_addresses": "", "unix_socket_directories": self.directory, "fsync": "off",
                          "shared_buffers": "16MB", "max_connections": "200", "logging_collector": "off",
@@ -40,10 +41,15 @@ class PostgresEngine:
             os.chown(self.directory, user.pw_uid, user.pw_gid)
         # Also who starts it as root has to be let through to the socket.
         os.chmod(self.directory, 0o755)
-        self.run(BIN + "/initdb", "--pgdata", self.data, "--username", "pelliko", "--auth", "trust", "--no-sync",
-                 "--no-locale", "--encoding", "UTF8")
-        self.start()
-        self.sql("CREATE DATABASE pelliko", database="postgres")
+        if standby_of:
+            self.run(BIN + "/pg_basebackup", "--pgdata", self.data, "--dbname", standby_of.url(), "--no-sync",
+                     "--checkpoint", "fast", "--write-recovery-conf")
+            self.start()
+        else:
+            self.run(BIN + "/initdb", "--pgdata", self.data, "--username", "pelliko", "--auth", "trust", "--no-sync",
+                     "--no-locale", "--encoding", "UTF8")
+            self.start()
+            self.sql("CREATE DATABASE pelliko", database="postgres")
 
     def __enter__(self):
         return self
@@ -94,7 +100,8 @@ class PostgresEngine:
         with open(f"/proc/{first}/task/{first}/children", encoding="ascii") as file:
             children = [int(word) for word in file.read().split()]
         for process in [first, *children]:
-            os.kill(process, number)
+            with contextlib.suppress(ProcessLookupError):
+                os.kill(process, number)
 
     def small_place(self):
         """A folder for a tablespace in `small`, made by the server itself since nobody else sees it."""
@@ -112,6 +119,36 @@ class PostgresEngine:
         self.process.wait(PATIENCE)
         self.process = None
 
+    def kill(self):
+        """Ends it as a machine ends that loses its power."""
+        if self.process is None:
+            return
+        self.signal_all(signal.SIGKILL)
+        self.process.wait(PATIENCE)
+        self.process = None
+
+    def commit_at_standby_first(self):
+        """From here on a commit is answered when a standby has it."""
+        self.sql("ALTER SYSTEM SET synchronous_standby_names = '*'")
+        self.sql("SELECT pg_reload_conf()")
+        self.wait_until("SELECT FROM pg_stat_replication WHERE sync_state = 'sync'")
+
+    def promote(self):
+        """Makes a standby take writes."""
+        if self.sql("SELECT pg_promote()") != "t":
+            raise RuntimeError("the standby was not promoted")
+
+    def start_read_only(self):
+        """Starts it as a former primary comes back."""
+        with open(self.data + "/standby.signal", "w", encoding="ascii"):
+            pass
+        self.start()
+
+    def wait_until(self, query):
+        """Returns once the query finds something."""
+        self.sql(f"""DO $$ BEGIN LOOP EXIT WHEN EXISTS ({query});
+            PERFORM pg_stat_clear_snapshot(), pg_sleep(0.02); END LOOP; END $$""")
+
     def restart(self, how=signal.SIGINT):
         self.stop(how)
         self.start()
@@ -122,6 +159,23 @@ class PostgresEngine:
 
     def url(self, database="pelliko", more=""):
         return f"postgresql:///{database}?host={self.directory}&user=pelliko{more}"
+
+    def tcp_url(self, more=""):
+        """The same over the network, which `listen_addresses` has to allow."""
+        return f"postgresql://pelliko@127.0.0.1/pelliko?sslmode=disable{more}"
+
+    @contextlib.contextmanager
+    def session(self):
+        """A session that stays open, for what holds locks: a function that runs a statement in it."""
+        with subprocess.Popen([BIN + "/psql", "-XqAt", "-d", self.url()], stdin=subprocess.PIPE, stdout=subprocess.PIPE,
+                              text=True) as psql:
+            def run(statement):
+                psql.stdin.write(statement + ";\n\\echo done\n")
+                psql.stdin.flush()
+                while psql.stdout.readline() not in ("done\n", ""):
+                    pass
+
+            yield run
 
     def sql(self, statement, database="pelliko"):
         """What the statement gives, as text."""

@@ -1,12 +1,13 @@
 """Several servers on one database and one directory of blobs."""
 
 import contextlib
+import http.client
 import os
 import sys
+import threading
 import time
 
 from harness import ServerCase
-from watch import MODIFIED, Watch, wait_for_size
 
 sys.path.insert(0, os.path.join(os.path.dirname(os.path.abspath(__file__)), "../../../scripts/lib"))
 from postgres_engine import PostgresEngine  # noqa: E402
@@ -68,16 +69,29 @@ class ClusterCase(ServerCase):
         finally:
             self.port, self.url = former
 
-    def begin_upload(self, upload, content, until):
-        """Sends content[:until] of a request for all of it; returns its connection once the server has stored that
-        much."""
-        self.assertEqual(self.patch(upload, 0, content[:1]).status, 204)
-        (path,) = self.blob_files()
-        with Watch(path, MODIFIED) as watch:
-            connection = self.connect()
-            connection.sendall(self.patch_head(upload, 1, len(content) - 1) + content[1:until])
-            wait_for_size(watch, path, until)
-        return connection
+    def append_everywhere(self, upload, content):
+        """The same append at every server at once; the answers' statuses."""
+        statuses = []
+
+        def write(node):
+            client = http.client.HTTPConnection("127.0.0.1", node.port, timeout=60)
+            try:
+                statuses.append(self.request_on(client, "PATCH", upload, content, self.tus_headers(0)).status)
+            except ConnectionError:
+                statuses.append(409)  # told while the body was still on its way
+            finally:
+                client.close()
+
+        self.all_at_once(write, self.nodes)
+        return statuses
+
+    def all_at_once(self, work, things):
+        """Does the work with each of the things on a thread of its own; returns when all is done."""
+        threads = [threading.Thread(target=work, args=[thing]) for thing in things]
+        for thread in threads:
+            thread.start()
+        for thread in threads:
+            thread.join()
 
     def go_on(self, upload, content):
         """Uploads what is missing, as a client does that was cut off or told to come again."""
@@ -91,15 +105,13 @@ class ClusterCase(ServerCase):
             time.sleep(0.2)
         self.fail("the upload does not get on")
 
-    def when_back(self, *request, **named):
-        """The first answer of a server that can reach its database again."""
-        deadline = time.monotonic() + PATIENCE
-        while time.monotonic() < deadline:
-            answer = self.request(*request, **named)
-            if answer.status != 503:
-                return answer
-            time.sleep(0.2)
-        self.fail("the server does not find its database again")
+    def assert_nothing_is_left(self):
+        """After a sweep the files are those that the database knows, as long as it says."""
+        self.engine.wait_until("SELECT WHERE NOT EXISTS (SELECT FROM blobs WHERE doomed)")
+        known = self.engine.sql("SELECT key, received FROM blobs WHERE received > 0").splitlines()
+        found = {path: os.path.getsize(path) for path in self.blob_files()}
+        self.assertEqual(sorted(f"{os.path.basename(path)}|{size}" for path, size in found.items() if size),
+                         sorted(known))
 
     def assert_content(self, share, content):
         link = self.finish(share)["url"][len(self.url):]

@@ -1,9 +1,7 @@
 """Several servers at once: writers, pushes, sweeping and deaths."""
 
-import http.client
 import os
 import signal
-import threading
 
 from cluster_case import MIB, ClusterCase
 from harness import read_until_closed
@@ -29,6 +27,7 @@ class Writers(ClusterCase):
         self.assertGreaterEqual(kept, told)
         self.assertEqual(self.patch(upload, kept, content[kept:]).status, 204)
         self.assert_content(share, content)
+        self.assert_nothing_is_left()
 
     def test_a_server_that_hangs_is_replaced_and_cannot_go_on_unnoticed(self):
         content = os.urandom(4 * MIB)
@@ -61,23 +60,7 @@ class Writers(ClusterCase):
             content = os.urandom(MIB)
             share = self.make_share(len(content))
             upload = share["files"][0]["upload"]
-            statuses = []
-
-            def write(node):
-                client = http.client.HTTPConnection("127.0.0.1", node.port, timeout=30)
-                try:
-                    statuses.append(self.request_on(client, "PATCH", upload, content, self.tus_headers(0)).status)
-                except ConnectionError:
-                    statuses.append(409)  # told while the body was still on its way
-                finally:
-                    client.close()
-
-            writers = [threading.Thread(target=write, args=[node]) for node in self.nodes]
-            for writer in writers:
-                writer.start()
-            for writer in writers:
-                writer.join()
-            self.assertIn(sorted(statuses), ([204, 409], [409, 409]))
+            self.assertIn(sorted(self.append_everywhere(upload, content)), ([204, 409], [409, 409]))
             self.go_on(upload, content)
             self.assert_content(share, content)
 
@@ -171,3 +154,33 @@ class Sweeping(ClusterCase):
             self.assertEqual(self.get(link + "/0").status, 200)
             deletion.wait()
         self.assertEqual(self.get(link + "/0").status, 410)
+
+
+class Draining(ClusterCase):
+    options = ["--drain", "5"]
+
+    def test_a_server_that_is_asked_to_end_loses_nothing_and_others_go_on(self):
+        second = self.another()
+        berta = self.run_account("add", "--number", BERTA).strip()
+        contents = [os.urandom(2 * MIB), os.urandom(2 * MIB)]
+        share = self.make_share(*map(len, contents))
+        ending, cut = [file["upload"] for file in share["files"]]
+        with self.at(self.first):
+            ends = self.begin_upload(ending, contents[0], MIB)
+            is_cut = self.begin_upload(cut, contents[1], MIB)
+            stream = Stream(self.port, berta)
+        self.addCleanup(stream.close)
+        self.first.process.send_signal(signal.SIGTERM)
+        self.assertIsNone(stream.next())
+        ends.sendall(contents[0][MIB:])
+        self.assertIn(b" 204 ", read_until_closed(ends))
+        self.assertIn(b" 409 ", read_until_closed(is_cut))
+        self.assertEqual(self.first.process.wait(30), 0)
+        self.assertEqual([self.offset(ending), self.offset(cut)], [2 * MIB, MIB])
+        self.go_on(cut, contents[1])
+        link = self.finish(share)["url"][len(self.url):]
+        self.assertEqual([self.get(link + "/0").body, self.get(link + "/1").body], contents)
+        again = Stream(second.port, berta)
+        self.addCleanup(again.close)
+        self.assertEqual(again.response.status, 200)
+        self.assert_nothing_is_left()

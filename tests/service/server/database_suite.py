@@ -3,13 +3,11 @@
 import json
 import os
 import signal
-import subprocess
 import threading
 import time
 
 from cluster_case import MIB, ClusterCase
 from harness import read_until_closed
-from postgres_engine import BIN
 from push_case import BERTA, Stream
 from watch import DELETED, Watch
 
@@ -29,6 +27,17 @@ class Restarts(ClusterCase):
         self.engine.start()
         self.assertEqual(self.when_back("GET", "/api/v1/account").json()["used_bytes"], 5)
         self.assertEqual(self.get(link + "/0").body, b"12345")
+        self.make_finished(b"abc")
+
+    def test_a_database_that_refuses_connections_is_found_again(self):
+        self.make_finished(b"12345")
+        self.engine.sql("ALTER DATABASE pelliko ALLOW_CONNECTIONS false", database="postgres")
+        self.engine.sql("SELECT pg_terminate_backend(pid, 10000) FROM pg_stat_activity WHERE datname = 'pelliko'",
+                        database="postgres")
+        self.assert_refused(self.request("GET", "/api/v1/account"), 503, "unavailable")
+        self.assertEqual(self.get("/readyz").status, 503)
+        self.engine.sql("ALTER DATABASE pelliko ALLOW_CONNECTIONS true", database="postgres")
+        self.assertEqual(self.when_back("GET", "/api/v1/account").json()["used_bytes"], 5)
         self.make_finished(b"abc")
 
     def test_a_database_that_is_silent_is_given_up_and_found_again(self):
@@ -66,11 +75,8 @@ class Restarts(ClusterCase):
 
     def test_a_cancelled_statement_leaves_nothing_behind(self):
         self.make_share(1)
-        with subprocess.Popen([BIN + "/psql", "-XqAt", "-d", self.engine.url()], stdin=subprocess.PIPE,
-                              stdout=subprocess.PIPE, text=True) as session:
-            session.stdin.write("BEGIN; LOCK TABLE usage IN ACCESS EXCLUSIVE MODE; SELECT 'locked';\n")
-            session.stdin.flush()
-            self.assertEqual(session.stdout.readline(), "locked\n")
+        with self.engine.session() as run:
+            run("BEGIN; LOCK TABLE usage IN ACCESS EXCLUSIVE MODE")
             answers = []
             body = {"files": [{"name": "a", "size": 7}], "recipients": [{"number": BERTA}]}
             thread = threading.Thread(target=lambda: answers.append(self.post_share(body)))

@@ -9,7 +9,10 @@ import socket
 import sqlite3
 import subprocess
 import tempfile
+import time
 import unittest
+
+from watch import MODIFIED, Watch, wait_for_size
 
 PROGRAM = None  # set by http_test.py
 POSTGRES = os.environ.get("PELLIKO_POSTGRES")  # by scripts/with-postgres
@@ -31,6 +34,7 @@ class ServerCase(unittest.TestCase):
 
     options = []
     wrapper = []  # a command that the server is started by
+    patience = 30  # seconds for an answer
 
     def setUp(self):
         self.directory = tempfile.mkdtemp(prefix="pelliko-server-")
@@ -96,12 +100,12 @@ class ServerCase(unittest.TestCase):
 
     def connect(self):
         """A raw socket, for what no client library would send."""
-        connection = socket.create_connection(("127.0.0.1", self.port), timeout=30)
+        connection = socket.create_connection(("127.0.0.1", self.port), timeout=self.patience)
         self.addCleanup(connection.close)
         return connection
 
     def request(self, method, path, body=None, headers=None, token=True):
-        client = http.client.HTTPConnection("127.0.0.1", self.port, timeout=30)
+        client = http.client.HTTPConnection("127.0.0.1", self.port, timeout=self.patience)
         try:
             return self.request_on(client, method, path, body, headers, token)
         finally:
@@ -114,6 +118,16 @@ class ServerCase(unittest.TestCase):
         client.request(method, path, body, headers)
         response = client.getresponse()
         return Answer(response, response.read())
+
+    def when_back(self, *request, **named):
+        """The first answer of a server that can reach its stores again."""
+        deadline = time.monotonic() + 30
+        while time.monotonic() < deadline:
+            answer = self.request(*request, **named)
+            if answer.status != 503:
+                return answer
+            time.sleep(0.2)
+        self.fail("the server does not find its stores again")
 
     def get(self, path, **headers):
         headers = {name.replace("_", "-"): value for name, value in headers.items()}
@@ -150,6 +164,18 @@ class ServerCase(unittest.TestCase):
                  f"Content-Length: {length}"]
         lines += [f"{name}: {value}" for name, value in self.tus_headers(offset).items()]
         return "\r\n".join(lines + ["", ""]).encode()
+
+    def begin_upload(self, upload, content, until):
+        """Sends content[:until] of a request for all of it; returns its connection once the server has stored that
+        much. For blobs in a directory."""
+        others = set(self.blob_files())
+        self.assertEqual(self.patch(upload, 0, content[:1]).status, 204)
+        (path,) = set(self.blob_files()) - others
+        with Watch(path, MODIFIED) as watch:
+            connection = self.connect()
+            connection.sendall(self.patch_head(upload, 1, len(content) - 1) + content[1:until])
+            wait_for_size(watch, path, until)
+        return connection
 
     def finish(self, share):
         answer = self.request("POST", f"/api/v1/shares/{share['share']}/finish")

@@ -1,21 +1,25 @@
 """Several servers on one database and one S3 store."""
 
-import http.client
 import os
+import signal
 import threading
 
 from cluster_case import ClusterCase
 from harness import read_until_closed
-from s3_suite import PART, S3Case
+from partition import Partition
+from s3_suite import PART, STORE, S3Case, fetch, signed
 
 
-class S3Cluster(S3Case, ClusterCase):
+class S3ClusterCase(S3Case, ClusterCase):
     go_on = ClusterCase.go_on
+    patience = 90
 
     def setUp(self):
         super().setUp()
         self.second = self.another()
 
+
+class S3Cluster(S3ClusterCase):
     def test_after_kill_9_the_other_server_goes_on(self):
         content, share, upload = self.one_file(5 * PART)
         with self.at(self.first):
@@ -41,21 +45,7 @@ class S3Cluster(S3Case, ClusterCase):
     def test_the_same_append_at_two_servers_at_once(self):
         for _ in range(3):
             content, share, upload = self.one_file(PART + 1000)
-
-            def write(node, upload=upload, content=content):
-                client = http.client.HTTPConnection("127.0.0.1", node.port, timeout=60)
-                try:
-                    self.request_on(client, "PATCH", upload, content, self.tus_headers(0))
-                except ConnectionError:
-                    pass  # told while the body was still on its way
-                finally:
-                    client.close()
-
-            writers = [threading.Thread(target=write, args=[node]) for node in self.nodes]
-            for writer in writers:
-                writer.start()
-            for writer in writers:
-                writer.join()
+            self.append_everywhere(upload, content)
             self.go_on(upload, content)
             self.assert_shared(share, content)
             self.withdraw(share)
@@ -77,4 +67,113 @@ class S3Cluster(S3Case, ClusterCase):
         head, body = received.split(b"\r\n\r\n", 1)
         self.assertIn(f"Content-Length: {len(content)}".encode(), head)
         self.assertTrue(content.startswith(body))
+        self.assert_stored()
+
+
+class CutOff(S3ClusterCase):
+    """The first server is behind a network that can be cut; the second has another way to the store."""
+
+    def another(self, *more):
+        self.stores = [word.replace(f"127.0.0.1:{self.proxy.port}", STORE) for word in self.stores]
+        return super().another(*more)
+
+    def test_it_says_so_and_is_replaced_and_comes_back(self):
+        network = Partition()
+        self.addCleanup(network.mend)
+        content, share, upload = self.one_file(4 * PART)
+        small, small_share, small_upload = self.one_file(1000)
+        with self.at(self.first):
+            connection = self.begin_patch(upload, 0, content, 2 * PART + 1000)
+            self.proxy.wait_for("part", 2)
+            told = self.offset(upload)
+        network.cut(self.proxy.port)
+        with self.at(self.first):
+            answer = self.patch(small_upload, 0, small)
+            self.assert_refused(answer, 503, "unavailable")
+            self.assertEqual(answer.headers["Retry-After"], "5")
+            self.assertEqual(self.get("/readyz").status, 503)
+            self.assertEqual(self.request("GET", "/api/v1/account").status, 200)
+        self.assertEqual(self.get("/readyz").status, 200)
+        self.assertGreaterEqual(self.offset(upload), told)
+        self.go_on(upload, content)
+        self.assertRegex(read_until_closed(connection), b"^(HTTP/1.1 (409|503) |$)")
+        self.assert_shared(share, content)
+
+        network.mend()
+        with self.at(self.first):
+            self.assertEqual(self.when_back("GET", "/readyz", token=False).status, 200)
+            self.go_on(small_upload, small)
+            self.assert_shared(small_share, small)
+        self.assert_stored(content, small)
+
+
+class SlowStore(S3ClusterCase):
+    def test_it_holds_nobody_up_who_does_not_need_it(self):
+        _, link = self.make_finished(b"12345", names=["a.bin"])
+        share = self.make_share(*[1000] * 60)
+        self.proxy.fault("hold", "put", times=60)
+        self.addCleanup(self.proxy.release)
+        answers = []
+        uploads = [file["upload"] for file in share["files"]]
+        sender = threading.Thread(target=self.all_at_once, args=[
+            lambda upload: answers.append(self.patch(upload, 0, bytes(1000)).status), uploads])
+        sender.start()
+        # As many as the server asks of the store at once; the rest of the uploads waits for them.
+        self.proxy.wait_held(48)
+        for path in ["/api/v1/account", "/api/v1/shares/" + share["share"], link, "/readyz", "/healthz"]:
+            self.assertEqual(self.request("GET", path).status, 200)
+        self.make_share(1)
+        self.assertEqual(answers, [])
+        self.proxy.release()
+        sender.join()
+        self.assertEqual(answers, [204] * 60)
+
+
+class Draining(S3ClusterCase):
+    options = ["--drain", "1"]
+
+    def test_what_has_arrived_is_in_the_store_when_the_server_has_ended(self):
+        content, share, upload = self.one_file(4 * PART)
+        with self.at(self.first):
+            connection = self.begin_patch(upload, 0, content, 2 * PART + 1000)
+            self.proxy.wait_for("part", 2)
+            told = self.offset(upload)
+        self.first.process.send_signal(signal.SIGTERM)
+        self.assertIn(b" 409 ", read_until_closed(connection))
+        self.assertEqual(self.first.process.wait(30), 0)
+        self.assertGreaterEqual(self.offset(upload), told)
+        self.go_on(upload, content)
+        self.assert_shared(share, content)
+        self.assert_stored(content)
+
+
+class DatabasesClock(S3ClusterCase):
+    """The database is a minute ahead of the servers and of the store."""
+
+    engine_options = {"clock": 60}
+    options = ["--share-lifetime", "6"]
+    store_options = "&redirect=on"
+
+    def test_nothing_is_served_anywhere_that_has_expired(self):
+        content = os.urandom(3 * PART)
+        share, link = self.make_finished(content)
+        expires = self.request("GET", "/api/v1/shares/" + share["share"]).json()["expires"]
+        with self.at(self.first):
+            address = self.get(link + "/0").headers["Location"]
+            running = self.connect()
+            running.sendall(f"GET {link}/0 HTTP/1.1\r\nHost: x\r\nRange: bytes=1-\r\n"
+                            "Connection: close\r\n\r\n".encode())
+            received = running.recv(4096)
+        self.assertLessEqual(signed(address)[1], 6)
+        self.assertEqual(fetch(address)[0], 200)
+        self.proxy.wait_for("delete", 1)
+        self.assertGreaterEqual(float(self.engine.sql("SELECT extract(epoch FROM clock_timestamp())")), expires)
+        for node in self.nodes:
+            with self.at(node):
+                for path in [link + "/0", link + "/all.zip", link]:
+                    self.assertEqual(self.get(path).status, 410)
+        self.assertIn(fetch(address)[0], (403, 404))
+        # What runs already ends, or is cut: nobody takes half of it for the whole.
+        received += read_until_closed(running)
+        self.assertTrue(content[1:].startswith(received.split(b"\r\n\r\n", 1)[1]))
         self.assert_stored()

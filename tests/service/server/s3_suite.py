@@ -1,5 +1,6 @@
 """The server on an S3 store: what stands there, and what becomes of uploads when the store fails or a server dies."""
 
+import calendar
 import contextlib
 import http.client
 import os
@@ -7,6 +8,7 @@ import shutil
 import subprocess
 import tempfile
 import threading
+import time
 import urllib.parse
 
 from harness import ServerCase
@@ -17,6 +19,25 @@ PART = 8 * MIB
 TUS = {"Tus-Resumable": "1.0.0"}
 STORE = os.environ["PELLIKO_S3_HOST"]
 BUCKET = os.environ["PELLIKO_S3_BUCKET"]
+
+
+def fetch(address):
+    """What an address of the store gives: the status, the body, and the Content-Disposition."""
+    where = urllib.parse.urlsplit(address)
+    client = http.client.HTTPConnection(where.netloc)
+    try:
+        client.request("GET", where.path + "?" + where.query)
+        answer = client.getresponse()
+        return answer.status, answer.read(), answer.getheader("Content-Disposition")
+    finally:
+        client.close()
+
+
+def signed(address):
+    """When an address was signed, and for how many seconds."""
+    query = urllib.parse.parse_qs(urllib.parse.urlsplit(address).query)
+    date = time.strptime(query["X-Amz-Date"][0], "%Y%m%dT%H%M%SZ")
+    return calendar.timegm(date), int(query["X-Amz-Expires"][0])
 
 
 def s3cmd(*arguments):
@@ -73,6 +94,11 @@ class S3Case(ServerCase):
         answer = self.patch(upload, offset, content[offset:])
         self.assertEqual(answer.status, 204, answer.body)
         return offset
+
+    def come_back(self):
+        """Returns when the server has found the store again."""
+        self.proxy.restore()
+        self.assertEqual(self.when_back("GET", "/readyz", token=False).status, 200)
 
     def one_file(self, size):
         content = os.urandom(size)
@@ -208,7 +234,7 @@ class Faults(S3Case):
         self.assert_refused(self.patch(upload, 1000, content[1000:]), 503, "unavailable")
         self.assertEqual(self.get("/healthz").status, 200)
         self.assertEqual(self.offset(upload), 1000)
-        self.proxy.restore()
+        self.come_back()
         self.go_on(upload, content)
         self.assert_shared(share, content)
         self.assert_stored(content)
@@ -223,7 +249,7 @@ class Faults(S3Case):
         with contextlib.suppress(ConnectionError):
             connection.sendall(content[told:])
             self.assertIn(b" 503 ", read_head(connection))
-        self.proxy.restore()
+        self.come_back()
         self.assertGreaterEqual(self.go_on(upload, content), told)
         self.assert_shared(share, content)
         self.assert_stored(content)
@@ -274,15 +300,12 @@ class Redirects(S3Case):
         _, link = self.make_finished(content, b"", names=["grüße.bin", "empty"])
         answer = self.get(link + "/0")
         self.assertEqual((answer.status, answer.body), (307, b""))
-        where = urllib.parse.urlsplit(answer.headers["Location"])
-        lifetime = int(urllib.parse.parse_qs(where.query)["X-Amz-Expires"][0])
+        address = answer.headers["Location"]
+        _, lifetime = signed(address)
         self.assertTrue(0 < lifetime <= 172800, lifetime)
-        client = http.client.HTTPConnection(where.netloc)
-        client.request("GET", where.path + "?" + where.query)
-        stored = client.getresponse()
-        self.assertEqual((stored.status, stored.read()), (200, content))
-        self.assertIn("filename*=UTF-8''gr%C3%BC%C3%9Fe.bin", stored.getheader("Content-Disposition"))
-        client.close()
+        status, body, disposition = fetch(address)
+        self.assertEqual((status, body), (200, content))
+        self.assertIn("filename*=UTF-8''gr%C3%BC%C3%9Fe.bin", disposition)
         # What the store cannot know is answered here.
         self.assertEqual(self.get(link + "/1").status, 200)
         self.assertEqual(self.get(link + "/0", Range="bytes=5-9").body, content[5:10])

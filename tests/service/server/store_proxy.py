@@ -39,6 +39,8 @@ class Handler(http.server.BaseHTTPRequestHandler):
         call = Call(kind_of(self.command, self.path), urllib.parse.urlsplit(self.path).path)
         body = self.rfile.read(int(self.headers.get("Content-Length", 0)))
         fault = proxy.fault_for(call)
+        if fault == "hold":
+            proxy.hold()
         if fault == "slow_down":
             self.answer(503, SLOW_DOWN)
         elif fault == "failed_late":
@@ -100,6 +102,8 @@ class StoreProxy:
         self.changed = threading.Condition()
         self.faults = []
         self.seen = collections.Counter()
+        self.held = 0
+        self.holding = True
         self.connections = set()
         self.port = 0
         self.listener = None
@@ -149,7 +153,8 @@ class StoreProxy:
 
     def fault(self, name, *kinds, times=1, each=1):
         """From now on, `times` times, each `each`-th call of these kinds meets the fault: "slow_down", "lose_answer",
-        "failed_late" (status 200 and an error), "cut" (an end in mid-body) or so many seconds."""
+        "failed_late" (status 200 and an error), "cut" (an end in mid-body), "hold" (until the release) or so many
+        seconds."""
         with self.changed:
             self.faults.append({"name": name, "kinds": kinds, "times": times, "each": each, "calls": 0})
 
@@ -163,6 +168,23 @@ class StoreProxy:
                     fault["times"] -= 1
                     return fault["name"]
         return None
+
+    def hold(self):
+        with self.changed:
+            self.held += 1
+            self.changed.notify_all()
+            self.changed.wait_for(lambda: not self.holding)
+
+    def wait_held(self, count, seconds=60):
+        """Returns once so many calls are being held."""
+        with self.changed:
+            assert self.changed.wait_for(lambda: self.held >= count, seconds), f"{self.held} are held"
+
+    def release(self):
+        """Lets those go that are held, and all to come."""
+        with self.changed:
+            self.holding = False
+            self.changed.notify_all()
 
     def met(self):
         """Whether every fault was met as often as it was asked for: otherwise a test tested nothing."""

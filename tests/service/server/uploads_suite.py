@@ -7,7 +7,6 @@ import socket
 import threading
 
 from harness import ServerCase, read_until_closed
-from watch import MODIFIED, Watch, wait_for_size
 
 TUS = {"Tus-Resumable": "1.0.0"}
 MIB = 1024 * 1024
@@ -18,17 +17,6 @@ def metadata(**pairs):
 
 
 class Uploads(ServerCase):
-    def begin_upload(self, upload, content, until):
-        """Sends content[:until] of a request for all of it; returns its connection once the server
-        has stored that much."""
-        self.assertEqual(self.patch(upload, 0, content[:1]).status, 204)
-        (path,) = self.blob_files()
-        with Watch(path, MODIFIED) as watch:
-            connection = self.connect()
-            connection.sendall(self.patch_head(upload, 1, len(content) - 1) + content[1:until])
-            wait_for_size(watch, path, until)
-        return connection
-
     def test_options_tell_what_the_server_can(self):
         answer = self.request("OPTIONS", "/api/v1/uploads", token=False)
         self.assertEqual(answer.status, 204)
