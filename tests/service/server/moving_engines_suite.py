@@ -24,6 +24,9 @@ class Engines(MovingCase):
         blobs = f"s3://{STORE}/{BUCKET}/{self.prefix}?tls=off"
         return ["--metadata", self.engine.url(), "--blobs", blobs], [self.engine.url(), blobs]
 
+    def ask_target(self, statement):
+        return int(self.engine.sql(statement))
+
     def sizes(self):
         return [1000, 9 * MIB, 300 * 1024, 2 * PART + 1, PART, *[5000] * 40]
 
@@ -45,7 +48,7 @@ class Engines(MovingCase):
     def test_there_and_back_killed_at_any_moment(self):
         self.sent = self.offset(self.upload)
         self.stop()
-        self.move_while_it_is_killed(seed=11, longest=1.5, least_kills=3)
+        self.move_while_it_is_killed(seed=11, first=0.1)
         self.assert_refuses_to_serve(self.stores, "moved elsewhere")
         self.serve_target()
         # One object of each file, one of the upload that goes on, and no mark.
@@ -55,7 +58,7 @@ class Engines(MovingCase):
         self.stop()
         there, self.place = self.place, [self.directory + "/back"]
         self.source = lambda: there
-        self.move_while_it_is_killed(seed=12, longest=1.5, least_kills=3)
+        self.move_while_it_is_killed(seed=12, first=0.1)
         self.assert_refuses_to_serve(self.stores, "moved elsewhere")
         self.served = ["--data", *self.place]
         self.serve_target()
@@ -94,11 +97,11 @@ class Engines(MovingCase):
         everything = self.place
         blobs = "dir:" + self.data + "/blobs"
         self.place = everything[:1]
-        self.move_while_it_is_killed(seed=13, longest=0.5, least_kills=1)
+        self.move_while_it_is_killed(seed=13, first=0.1)
         self.assert_refuses_to_serve(self.stores, "moved elsewhere")
         self.source = lambda: [everything[0], blobs]
         self.place = everything[1:]
-        self.move_while_it_is_killed(seed=14, longest=1.5, least_kills=2)
+        self.move_while_it_is_killed(seed=14, first=0.1)
         self.assert_refuses_to_serve(["--metadata", everything[0], "--blobs", blobs], "moved elsewhere")
         self.serve_target()
         self.assert_everything_is_there()
