@@ -243,6 +243,37 @@ TEST_F(S3Store, NothingIsLeftOfARemovedBlob)
     EXPECT_TRUE(keysOf(*m_blobs).empty());
 }
 
+TEST_F(S3Store, AListBringsObjectsAndUploadsTogether)
+{
+    const auto keyOf = [](char c) { return std::string(21, 'k') + c; };
+    // In turns: whole, whole with leftovers, an upload, a tail.
+    for (const char c : {'a', 'b', 'e', 'f'})
+        m_client->put(keyOf(c), "hello");
+    for (const char c : {'b', 'c', 'f', 'g'})
+        m_client->beginUpload(keyOf(c));
+    for (const char c : {'b', 'd', 'h'})
+        m_client->put(s3TailName(keyOf(c), 0), "he");
+    m_client->put("somebody-elses", "hello");
+    for (const std::size_t atOnce : {1UL, 2UL, 1000UL}) {
+        std::string found;
+        std::string last;
+        for (auto some = m_blobs->list("", atOnce); !some.empty();
+             some = m_blobs->list(last, atOnce)) {
+            for (const StoredBlob &blob : some) {
+                last = blob.key;
+                found += blob.key.back();
+                found += blob.size ? "5" : "";
+                found += blob.hasLeftovers ? "+" : "";
+            }
+        }
+        EXPECT_EQ(found, "a5b5+cde5f5+gh") << atOnce;
+    }
+    m_blobs->removeLeftovers(keyOf('b'));
+    EXPECT_FALSE(m_blobs->list(keyOf('a'), 1).front().hasLeftovers);
+    EXPECT_EQ(m_blobs->sizeOf(keyOf('b')), 5U);
+    EXPECT_EQ(m_blobs->sizeOf(keyOf('d')), 2U);
+}
+
 TEST_F(S3Store, AStrayUploadEndsWithTheBlobsMaking)
 {
     m_client->beginUpload(m_key);
