@@ -61,12 +61,15 @@ fs::path sqliteFile(const std::string &url, Absent absent)
     return file;
 }
 
-void refuseUnserved(const std::string &metadataUrl)
+/// False when the data never moved.
+bool refuseUnserved(const std::string &metadataUrl)
 {
     const auto tables = isPostgres(metadataUrl)
                             ? openPostgresTables(metadataUrl)
                             : openSqliteTables(sqliteFile(metadataUrl, Absent::fails));
-    server::refuseUnserved(markOf(*tables), "metadata");
+    const auto mark = markOf(*tables);
+    server::refuseUnserved(mark, "metadata");
+    return mark.has_value();
 }
 
 void openSqlite(Stores &stores, const fs::path &file)
@@ -160,9 +163,11 @@ Stores openStores(const StoreUrls &urls, std::size_t threads)
         openPostgres(stores, urls.metadata, threads);
     else
         openSqlite(stores, sqliteFile(urls.metadata, Absent::isMade));
-    refuseUnserved(urls.metadata);
+    const bool hasMoved = refuseUnserved(urls.metadata);
     stores.blobs = openBlobs(urls.blobs);
-    refuseUnserved(stores.blobs->mark(), "blobs");
+    // Otherwise a start does not need a store that is away for a while.
+    if (hasMoved)
+        refuseUnserved(stores.blobs->mark(), "blobs");
     return stores;
 }
 
