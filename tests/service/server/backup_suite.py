@@ -5,6 +5,7 @@ import shutil
 import signal
 import subprocess
 
+import harness
 from cluster_case import ClusterCase
 from postgres_engine import BIN
 from s3_suite import BUCKET, PART, STORE, S3Case, s3cmd
@@ -32,6 +33,9 @@ class BackupCase(S3Case, ClusterCase):
         self.assertEqual(self.request("DELETE", "/api/v1/shares/" + share["share"]).status, 204)
         self.proxy.wait_for("delete", deleted)
 
+    def check(self, *more):
+        return subprocess.run([harness.PROGRAM, "check", *self.stores, *more]).returncode
+
     def lose_objects(self):
         s3cmd("del", "--recursive", "--force", f"s3://{BUCKET}/{self.prefix}/")
         for name, number in self.open_uploads():
@@ -58,16 +62,19 @@ class EachNight(BackupCase):
         self.engine.sql("DROP SCHEMA public CASCADE; CREATE SCHEMA public")
         subprocess.run([BIN + "/pg_restore", "--dbname=" + self.engine.url(), "--no-owner", dump], check=True)
         rclone("sync", self.copy, self.bucket)
+        self.assertEqual(self.check(), 1)
+        self.assertEqual(self.check("--mend"), 0)
         self.start()
         self.assertEqual(self.get(link + "/0").body, content)
         self.assertEqual(self.get(late_link + "/0").status, 404)
-        self.assertNotEqual(self.get(gone_link + "/0").status, 200)
+        self.assertEqual(self.get(gone_link + "/0").status, 410)
         # Its parts were not in the copy: it begins again.
         answer = self.patch(upload, PART + 1000, half[PART + 1000:])
         self.assertEqual((answer.status, answer.headers["Upload-Offset"]), (409, "0"))
         self.go_on(upload, half)
         self.assert_shared(unfinished, half)
         self.make_finished(b"and it goes on")
+        self.assertEqual(self.check(), 0)
 
 
 class ToAnyMoment(BackupCase):
@@ -105,7 +112,7 @@ class ToAnyMoment(BackupCase):
         self.engine.settings.update(restore_command=f"cp {self.wal}/%f %p", recovery_target_time=moment,
                                     recovery_target_action="promote")
         self.engine.start()
-        self.engine.sql("DO $$ BEGIN WHILE pg_is_in_recovery() LOOP PERFORM pg_sleep(0.05); END LOOP; END $$")
+        self.engine.wait_until("SELECT WHERE NOT pg_is_in_recovery()")
         rclone("sync", self.copy, self.bucket)
         self.start()
         self.assertEqual(self.get(link + "/0").body, content)

@@ -9,6 +9,7 @@ import time
 import harness
 from push_case import BERTA, Stream
 from cluster_case import MIB, PostgresEngine
+from watch import MODIFIED, Watch
 from server_cluster import PLAIN_PORT, ServerCluster, store_address
 
 PATIENCE = 60
@@ -200,6 +201,20 @@ class Upgrade:
         self.cluster.nodes[1].kill()
         self.assertEqual(self.get(link + "/0").body, b"hello")
         self.make_finished(b"abc")
+
+    def test_that_the_database_is_away_is_told_in_the_servers_words(self):
+        with Watch(str(self.cluster.balancer.log), MODIFIED) as watch:
+            self.engine.stop()
+            self.addCleanup(self.engine.restart)
+            while self.balancer == "haproxy" and self.cluster.balancer.log.read_bytes().count(b" is DOWN") < 3:
+                watch.wait()
+        answer = self.request("GET", "/api/v1/account")
+        self.assert_refused(answer, 503, "unavailable")
+        self.assertEqual(answer.headers["Retry-After"], "5")
+        self.engine.start()
+        deadline = time.monotonic() + PATIENCE
+        while self.request("GET", "/api/v1/account").status != 200:
+            self.assertLess(time.monotonic(), deadline, "the database is not found again")
 
     def test_what_only_monitors_may_know_stays_inside(self):
         for path, status in [("/metrics", 404), ("/readyz", 404), ("/healthz", 200), ("/", 200)]:
