@@ -1,33 +1,25 @@
 """The parts that transfer-times measures: share server, background service, nginx, curl and tus-js-client, each with
 the same few calls."""
 
-import http.client
 import json
 import os
 import pathlib
-import pwd
-import shutil
-import socket
 import subprocess
-import sys
 import time
-import uuid
 
 import gi
 
 gi.require_version("Gio", "2.0")
 from gi.repository import Gio, GLib  # noqa: E402
 
-ROOT = pathlib.Path(__file__).resolve().parent.parent
-sys.path.insert(0, str(ROOT / "tests" / "service" / "server"))
+import nginx  # noqa: E402
+import share_server  # noqa: E402
 import watch  # noqa: E402
+from share_server import RECIPIENT, ROOT, SENDER  # noqa: E402
 
-SENDER, RECIPIENT = "+447700900100", "+447700900199"
 SERVICE, SERVICE_PATH = "com.velmora.pelliko.Service", "/com/velmora/pelliko/Service"
 UPLOADED = 3  # the service's report that a share is ready for its recipients
 ENDS = (4, 5, 7)  # failed, cancelled, shared
-NGINX = shutil.which("nginx", path=os.environ["PATH"] + ":/usr/sbin")
-CREATED = 0x100  # of inotify
 LARGE = 32 * 1024 * 1024  # files whose removal takes the disk a while
 
 
@@ -38,69 +30,36 @@ def seconds_of(command, **options):
     return time.monotonic() - begin
 
 
-def processor_seconds(pid):
-    with open(f"/proc/{pid}/stat", encoding="ascii") as stat:
-        fields = stat.read().rsplit(")", 1)[1].split()
-    return (int(fields[11]) + int(fields[12])) / os.sysconf("SC_CLK_TCK")
-
-
-class ShareServer:
-    """pelliko-server with one account that sends and one that receives, without a daily limit."""
+class ShareServer(share_server.ShareServer):
+    """One account that sends and one that receives, all on one disk."""
 
     def __init__(self, build, directory):
-        self.program = os.path.join(build, "bin", "pelliko-server")
         self.data = os.path.join(directory, "server")
-        self.token = self.account(SENDER)
-        self.account(RECIPIENT)
-        reading, writing = os.pipe()
-        self.process = subprocess.Popen(
-            [self.program, "serve", "--data", self.data, "--listen", "127.0.0.1:0", "--ready-fd", str(writing),
-             "--daily-limit", str(2**50), "--share-limit", str(2**50)], pass_fds=[writing], stderr=subprocess.DEVNULL)
-        os.close(writing)
-        with os.fdopen(reading) as ready:
-            self.url = ready.readline().strip()
-        self.port = int(self.url.rsplit(":", 1)[1])
-
-    def account(self, number):
-        return subprocess.run([self.program, "account", "add", "--data", self.data, "--number", number],
-                              check=True, capture_output=True, text=True).stdout.strip()
-
-    def ask(self, method, path, body=None):
-        client = http.client.HTTPConnection("127.0.0.1", self.port, timeout=60)
-        client.request(method, "/api/v1/shares" + path, json.dumps(body) if body else None,
-                       {"Authorization": f"Bearer {self.token}", "Idempotency-Key": uuid.uuid4().hex})
-        answer = client.getresponse()
-        content = answer.read()
-        client.close()
-        if answer.status not in (200, 201, 204):
-            raise RuntimeError(f"the server refused {method} {path}: {content.decode()}")
-        return json.loads(content) if content else None
+        super().__init__(share_server.program_of(build), ["--data", self.data])
+        self.sender = self.client(SENDER)
+        self.token = self.sender.token
+        self.account("add", "--number", RECIPIENT)
 
     def make_share(self, files):
-        """The share's id, and where each of the files goes."""
-        entries = [{"name": os.path.basename(file), "size": os.path.getsize(file)} for file in files]
-        share = self.ask("POST", "", {"files": entries, "recipients": [{"number": RECIPIENT}]})
-        return share["share"], [self.url + entry["upload"] for entry in share["files"]]
+        """The share's record, and where each of the files goes."""
+        share = self.sender.share([(os.path.basename(file), os.path.getsize(file)) for file in files])
+        return share, [self.url + entry["upload"] for entry in share["files"]]
 
     def finish(self, share):
         """Ends the upload; returns the share's link."""
-        return self.ask("POST", f"/{share}/finish")["url"]
+        return self.sender.finish(share)
 
     def clear(self):
         """Withdraws all shares and returns when no large file is left on the disk."""
         blobs = [path for path in pathlib.Path(self.data, "blobs").glob("*/*") if path.stat().st_size >= LARGE]
         watches = [watch.Watch(str(path.parent), watch.DELETED) for path in blobs]
-        for share in self.ask("GET", "")["shares"]:
+        for share in self.sender.ask("GET", "shares")["shares"]:
             if share["state"] in ("uploading", "finished"):
-                self.ask("DELETE", "/" + share["share"])
+                self.sender.ask("DELETE", "shares/" + share["share"])
         for path, seen in zip(blobs, watches):
             with seen:
                 while path.exists():
                     seen.wait()
-
-    def stop(self):
-        self.process.terminate()
-        self.process.wait()
 
 
 class Service:
@@ -170,38 +129,21 @@ class Service:
             process.wait()
 
 
-class Nginx:
-    """nginx with what Debian sets (sendfile, tcp_nopush), and PUT into a folder on the same disk."""
+class Nginx(nginx.Nginx):
+    """PUT into a folder on the same disk."""
 
     def __init__(self, directory):
-        self.home = os.path.join(directory, "nginx")
-        self.root = self.home + "/root"
+        home = os.path.join(directory, "nginx")
+        self.root = home + "/root"
         os.makedirs(self.root)
-        with socket.create_server(("127.0.0.1", 0)) as free:
-            self.url = f"http://127.0.0.1:{free.getsockname()[1]}"
-        user = f"user {pwd.getpwuid(0).pw_name};" if os.geteuid() == 0 else ""
-        pathlib.Path(self.home, "nginx.conf").write_text(f"""
-            {user} daemon off; worker_processes auto; pid {self.home}/pid; error_log {self.home}/error;
-            events {{}}
-            http {{
-              access_log off; sendfile on; tcp_nopush on;
-              client_body_temp_path {self.home}/body; proxy_temp_path {self.home}/t1; fastcgi_temp_path {self.home}/t2;
-              uwsgi_temp_path {self.home}/t3; scgi_temp_path {self.home}/t4;
-              server {{ listen {self.url[7:]}; root {self.root}; client_max_body_size 0; dav_methods PUT; }}
-            }}""", encoding="ascii")
-        with watch.Watch(self.home, CREATED) as seen:
-            # It writes its process id when it listens.
-            self.process = subprocess.Popen([NGINX, "-e", self.home + "/error", "-c", self.home + "/nginx.conf"])
-            while not os.path.exists(self.home + "/pid"):
-                seen.wait()
+        listen = f"127.0.0.1:{nginx.free_port()}"
+        self.url = "http://" + listen
+        super().__init__(home, f"server {{ listen {listen}; root {self.root}; client_max_body_size 0;"
+                               " dav_methods PUT; }")
 
     def clear(self):
         for path in pathlib.Path(self.root).iterdir():
             path.unlink()
-
-    def stop(self):
-        self.process.terminate()
-        self.process.wait()
 
 
 def curl_append(server, file, upload):
@@ -242,6 +184,6 @@ def versions(build):
     package = json.loads(pathlib.Path(build, "browser", "node_modules", "tus-js-client", "package.json").read_text(
         encoding="utf-8"))
     return "; ".join([" ".join(first("curl", "--version").split()[:2]),
-                      first(NGINX, "-v").removeprefix("nginx version: "),
+                      nginx.version(),
                       f"tus-js-client {package['version']} on Node.js {first('node', '--version')}",
                       f"Linux {os.uname().release}, {os.cpu_count()} processors"])
