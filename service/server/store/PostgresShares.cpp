@@ -14,6 +14,34 @@ namespace
 /// What one notification carries at most is 8000 bytes: so many numbers always fit.
 constexpr std::size_t numbersAtOnce = 300;
 
+/// Files and then recipients of the shares that fit the condition, as addPart reads them.
+#define PELLIKO_PARTS(condition)                                                                   \
+    "SELECT f.share, f.position, 0 AS kind, f.name, f.type, f.size,"                               \
+    " coalesce(b.received, 0) AS received, f.upload, coalesce(b.key, '') AS blob"                  \
+    " FROM files f LEFT JOIN blobs b ON b.id = f.blob WHERE f.share " condition                    \
+    " UNION ALL SELECT r.share, r.position, 1, r.number, r.ccc, 0, 0, '', ''"                      \
+    " FROM recipients r WHERE r.share " condition
+
+/// One statement, for nothing is asked more often and each further one is a round trip.
+constexpr const char *linkWithParts =
+    "WITH link AS MATERIALIZED (SELECT " PELLIKO_SHARE_COLUMNS ", a.number FROM shares s"
+    " JOIN accounts a ON a.id = s.account WHERE s.link_hash = $1)"
+    " SELECT link.*, parts.* FROM link LEFT JOIN LATERAL (" PELLIKO_PARTS(
+        "= link.id") ") parts ON true ORDER BY parts.kind, parts.position";
+constexpr int firstOfParts = 6;
+
+/// What a row of PELLIKO_PARTS tells, whose columns begin at `first`.
+void addPart(const PostgresRows &row, int first, ShareRecord &share)
+{
+    const std::string name = row.text(first + 3);
+    const std::string type = row.text(first + 4);
+    if (row.integer(first + 2) == 0)
+        share.files.push_back({name, type, row.size(first + 5), row.size(first + 6),
+                               row.text(first + 7), row.text(first + 8)});
+    else
+        share.recipients.push_back({name, type});
+}
+
 std::vector<std::int64_t> idsOf(const std::vector<ShareRow> &shares)
 {
     std::vector<std::int64_t> ids;
@@ -33,23 +61,10 @@ void addParts(PostgresConnection &db, std::vector<ShareRow> &shares)
     for (ShareRow &share : shares)
         byId[share.id] = &share.record;
     const std::vector<std::int64_t> ids = idsOf(shares);
-    PostgresRows files = db.query("SELECT f.share, f.name, f.type, f.size, coalesce(b.received, 0),"
-                                  " f.upload, coalesce(b.key, '') FROM files f"
-                                  " LEFT JOIN blobs b ON b.id = f.blob"
-                                  " WHERE f.share = ANY ($1) ORDER BY f.share, f.position",
-                                  ids);
-    while (files.next()) {
-        byId.at(files.integer(0))
-            ->files.push_back({files.text(1), files.text(2), files.size(3), files.size(4),
-                               files.text(5), files.text(6)});
-    }
-    PostgresRows recipients = db.query("SELECT share, number, ccc FROM recipients"
-                                       " WHERE share = ANY ($1) ORDER BY share, position",
-                                       ids);
-    while (recipients.next()) {
-        byId.at(recipients.integer(0))
-            ->recipients.push_back({recipients.text(1), recipients.text(2)});
-    }
+    PostgresRows parts =
+        db.query(PELLIKO_PARTS("= ANY ($1)") " ORDER BY share, kind, position", ids);
+    while (parts.next())
+        addPart(parts, 0, *byId.at(parts.integer(0)));
 }
 
 void addParts(PostgresConnection &db, ShareRow &share)
@@ -181,16 +196,16 @@ PostgresMetadata::withdrawShare(std::int64_t account, const std::string &key, Se
 
 std::optional<LinkRecord> PostgresMetadata::findLink(const std::string &linkHash, Seconds now)
 {
-    return m_pool->read([&](PostgresConnection &db) -> std::optional<LinkRecord> {
-        PostgresRows row = db.query("SELECT " PELLIKO_SHARE_COLUMNS ", a.number FROM shares s"
-                                    " JOIN accounts a ON a.id = s.account WHERE s.link_hash = $1",
-                                    Bytes{linkHash});
-        if (!row.next())
-            return std::nullopt;
-        ShareRow share = shareRowOf(row, now);
-        std::string sender = row.text(5);
-        addParts(db, share);
-        return LinkRecord{std::move(sender), std::move(share.record)};
+    return m_pool->single([&](PostgresConnection &db) -> std::optional<LinkRecord> {
+        PostgresRows rows = db.query(linkWithParts, Bytes{linkHash});
+        std::optional<LinkRecord> link;
+        while (rows.next()) {
+            if (!link)
+                link = LinkRecord{rows.text(5), shareRowOf(rows, now).record};
+            if (!rows.isNull(firstOfParts))
+                addPart(rows, firstOfParts, link->share);
+        }
+        return link;
     });
 }
 

@@ -225,6 +225,28 @@ TEST_P(MetadataSuite, AFinishedSharesFilesAreNotDropped)
     EXPECT_FALSE(m_store->resetUpload(m_account, share.files[0].upload, 1000));
 }
 
+TEST_P(MetadataSuite, ALinkTellsFilesAndRecipientsInTheirOrder)
+{
+    NewShare wanted = shareOf({}, 1000);
+    // More than ten, so that an order by text would be another.
+    for (int number = 11; number >= 0; --number)
+        wanted.files.push_back({"file" + std::to_string(number), "image/jpeg", 0});
+    wanted.recipients = {{"+493", "49"}, {"+492", ""}, {"+494", "7"}};
+    const ShareRecord share = m_store->createShare(wanted).share;
+    m_store->finishShare(m_account, share.key, linkHash, 1000, 1200);
+    const ShareRecord found = m_store->findLink(linkHash, 1000)->share;
+    ASSERT_THAT(found.files, SizeIs(wanted.files.size()));
+    for (std::size_t at = 0; at < wanted.files.size(); ++at) {
+        EXPECT_EQ(found.files[at].name, wanted.files[at].name);
+        EXPECT_EQ(found.files[at].upload, share.files[at].upload);
+        EXPECT_EQ(found.files[at].blob, share.files[at].blob);
+    }
+    ASSERT_THAT(found.recipients, SizeIs(3));
+    EXPECT_EQ(found.recipients[0].number, "+493");
+    EXPECT_EQ(found.recipients[1].callingCode, "");
+    EXPECT_EQ(found.recipients[2].callingCode, "7");
+}
+
 TEST_P(MetadataSuite, FinishNeedsEveryByte)
 {
     const ShareRecord share = make({10, 5});
