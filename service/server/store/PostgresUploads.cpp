@@ -10,9 +10,18 @@ namespace pelliko::server
 namespace
 {
 
-/// Enough for one round of sweeping; the next round takes the rest.
-constexpr int doomedAtOnce = 256;
-constexpr int endedAtOnce = 64;
+// How much is swept at once stands in the statements themselves: a number that comes later would
+// not lead to the indexes, and what takes everything might never end.
+
+/// Runs a statement that deletes what is old enough in pieces, until nothing is left.
+void deleteUpTo(PostgresPool &pool, const char *piece, Seconds end)
+{
+    int deleted = 1;
+    while (deleted > 0) {
+        deleted =
+            pool.single([&](PostgresConnection &db) { return db.query(piece, end).changed(); });
+    }
+}
 
 std::optional<Seconds> secondsOf(PostgresRows row)
 {
@@ -26,8 +35,8 @@ std::optional<std::vector<std::string>> expireSome(PostgresConnection &db, Secon
 {
     PostgresRows rows = db.query("SELECT " PELLIKO_SHARE_COLUMNS " FROM shares s"
                                  " WHERE s.state IN (0, 1) AND s.deadline <= $1"
-                                 " ORDER BY s.deadline, s.id LIMIT $2 FOR NO KEY UPDATE",
-                                 now, endedAtOnce);
+                                 " ORDER BY s.deadline, s.id LIMIT 64 FOR NO KEY UPDATE",
+                                 now);
     std::optional<std::vector<std::string>> blobs;
     while (rows.next()) {
         ShareRow share = shareRowOf(rows, now);
@@ -112,11 +121,18 @@ std::optional<Seconds> PostgresMetadata::nextDeadline()
 
 void PostgresMetadata::forgetEnded(Seconds ended, Seconds used)
 {
-    m_pool->single([&](PostgresConnection &db) {
-        db.query("DELETE FROM shares WHERE ended <= $1", ended);
-        db.query("DELETE FROM usage WHERE at <= $1", used);
-        db.query("DELETE FROM questions WHERE at <= $1", used);
-    });
+    deleteUpTo(*m_pool,
+               "DELETE FROM shares WHERE id = ANY (ARRAY("
+               "SELECT id FROM shares WHERE ended <= $1 ORDER BY ended LIMIT 1000))",
+               ended);
+    deleteUpTo(*m_pool,
+               "DELETE FROM usage WHERE ctid = ANY (ARRAY("
+               "SELECT ctid FROM usage WHERE at <= $1 ORDER BY at LIMIT 5000))",
+               used);
+    deleteUpTo(*m_pool,
+               "DELETE FROM questions WHERE ctid = ANY (ARRAY("
+               "SELECT ctid FROM questions WHERE at <= $1 ORDER BY at LIMIT 5000))",
+               used);
 }
 
 std::optional<Seconds> PostgresMetadata::earliestEnd()
@@ -143,8 +159,7 @@ std::vector<std::string> PostgresMetadata::doomedBlobs()
 {
     return m_pool->single([](PostgresConnection &db) {
         std::vector<std::string> keys;
-        PostgresRows rows =
-            db.query("SELECT key FROM blobs WHERE doomed ORDER BY id LIMIT $1", doomedAtOnce);
+        PostgresRows rows = db.query("SELECT key FROM blobs WHERE doomed ORDER BY id LIMIT 256");
         while (rows.next())
             keys.push_back(rows.text(0));
         return keys;
