@@ -53,7 +53,7 @@ struct Server::State {
           std::unique_ptr<Peers> others)
         : timeouts(config.timeouts), drain(config.drain), peers(std::move(others)),
           blobPool(std::max(storageThreads, blobs.callsAtOnce())), writes(*peers),
-          pushes(io.get_executor(), limitsOf(config, capacity)),
+          pushes(io.get_executor(), limitsOf(config, capacity), !peers->tellsOfTokens()),
           context{metadata, blobs,  *peers,        pool,           blobPool,
                   writes,   pushes, config.limits, std::move(now), config.publicUrl},
           sweeper(io.get_executor(), context), acceptor(io), monitorAcceptor(io),

@@ -147,21 +147,21 @@ Task<void> Sweeper::removeDoomed()
 
 Task<void> Sweeper::sleep()
 {
-    const auto next = co_await m_context.pool.run([&] {
-        const auto deadline = m_context.metadata.nextDeadline();
-        const auto ended = m_context.metadata.earliestEnd();
-        if (!ended)
-            return deadline;
-        const Seconds forget = *ended + m_context.limits.endedKept;
-        return std::optional(deadline ? std::min(*deadline, forget) : forget);
+    const Limits &limits = m_context.limits;
+    const Seconds next = co_await m_context.pool.run([&] {
+        // No deadline that is set from here on is earlier: nobody has to tell of new ones.
+        Seconds earliest =
+            m_context.now() + std::min(limits.shareLifetime, limits.unfinishedLifetime);
+        if (const auto deadline = m_context.metadata.nextDeadline())
+            earliest = std::min(earliest, *deadline);
+        if (const auto ended = m_context.metadata.earliestEnd())
+            earliest = std::min(earliest, *ended + limits.endedKept);
+        return earliest;
     });
     // No suspension between this look and the wait: a wake in between cannot be lost.
     if (m_woken || m_stopped)
         co_return;
-    if (next)
-        m_timer.expires_after(std::chrono::seconds(*next - m_context.now()));
-    else
-        m_timer.expires_at(std::chrono::system_clock::time_point::max());
+    m_timer.expires_after(std::chrono::seconds(next - m_context.now()));
     co_await m_timer.async_wait(boost::asio::as_tuple(boost::asio::use_awaitable));
 }
 

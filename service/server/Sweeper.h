@@ -8,8 +8,8 @@ namespace pelliko::server
 {
 
 /// Deletes what has expired, at the second when it does: sleeps until the next deadline that the
-/// store knows, or until it is woken. Of several servers one sweeps; the others' sweepers sleep
-/// until it is theirs to do. Network thread only.
+/// store knows or that a new share could have, or until it is woken. Of several servers one sweeps;
+/// the others' sweepers sleep until it is theirs to do. Network thread only.
 class Sweeper
 {
 public:
@@ -18,7 +18,7 @@ public:
     /// Sweeps until stopped.
     Task<void> run();
 
-    /// Something may have become unneeded, or a deadline was set: look again.
+    /// Something may have become unneeded: look again.
     void wake();
     void stop();
 

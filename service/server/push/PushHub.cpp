@@ -14,8 +14,8 @@ namespace asio = boost::asio;
 constexpr auto asTuple = asio::as_tuple(asio::use_awaitable);
 using Clock = asio::steady_timer::clock_type;
 
-/// A stream whose account was removed by another process gets no push that would show it: its
-/// token is looked at again after so many beats, five minutes.
+/// A stream whose account was removed by another process gets no push that would show it: where
+/// nobody tells, its token is looked at again after so many beats, five minutes.
 constexpr unsigned beatsPerLook = 12;
 
 } // namespace
@@ -56,9 +56,10 @@ void PushHub::Seat::beat()
     m_timer.cancel();
 }
 
-PushHub::PushHub(const asio::any_io_executor &executor, const Limits &limits)
+PushHub::PushHub(const asio::any_io_executor &executor, const Limits &limits, bool looksByTime)
     : m_timer(executor), m_streams(limits.pushStreams),
-      m_streamsPerAccount(limits.pushStreamsPerAccount), m_keepAlive(limits.pushKeepAlive)
+      m_streamsPerAccount(limits.pushStreamsPerAccount), m_keepAlive(limits.pushKeepAlive),
+      m_looksByTime(looksByTime)
 {
 }
 
@@ -121,7 +122,7 @@ Task<void> PushHub::run()
         m_timer.expires_at(m_count == 0 ? Clock::time_point::max() : Clock::now() + m_keepAlive);
         auto [cancelled] = co_await m_timer.async_wait(asTuple);
         if (!cancelled)
-            beatAll(++beats % beatsPerLook == 0);
+            beatAll(m_looksByTime && ++beats % beatsPerLook == 0);
     }
 }
 

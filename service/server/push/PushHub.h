@@ -21,7 +21,8 @@ namespace pelliko::server
 class PushHub
 {
 public:
-    PushHub(const boost::asio::any_io_executor &executor, const Limits &limits);
+    /// With `looksByTime` streams look now and then although nothing was announced.
+    PushHub(const boost::asio::any_io_executor &executor, const Limits &limits, bool looksByTime);
 
     /// What a stream was woken for. The first wake of a stream has `look`.
     struct Wake {
@@ -85,6 +86,7 @@ private:
     std::size_t m_streams;
     std::size_t m_streamsPerAccount;
     std::chrono::seconds m_keepAlive;
+    bool m_looksByTime;
     bool m_stopped = false;
 };
 

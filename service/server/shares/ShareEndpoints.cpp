@@ -53,7 +53,6 @@ Task<void> createShare(Exchange &exchange, Context &context)
     const CreateResult result =
         co_await context.pool.run([&] { return context.metadata.createShare(share); });
     checkCreated(result);
-    context.peers.wakeSweeper();
     const bool known = result.outcome == CreateResult::Outcome::known;
     co_await exchange.respond(
         jsonResponse(known ? Status::ok : Status::created, shareJson(result.share)));
@@ -98,7 +97,6 @@ Task<void> finishShare(Exchange &exchange, Context &context, std::string key)
     case FinishResult::Outcome::finished:
         break;
     }
-    context.peers.wakeSweeper();
     context.peers.announcePushes(result.pushed);
     co_await exchange.respond(
         jsonResponse(Status::ok, finishedJson(result, context.publicUrl + "/s/" + token)));

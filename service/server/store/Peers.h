@@ -53,6 +53,8 @@ public:
     [[nodiscard]] virtual bool sweeps() const = 0;
     /// Wakes the sweeper of the server that sweeps.
     virtual void wakeSweeper() = 0;
+    /// Whether every end of a token is heard, also one that another program brings about.
+    [[nodiscard]] virtual bool tellsOfTokens() const = 0;
     /// Wakes the streams of these accounts, on whichever server.
     virtual void announcePushes(const std::vector<std::int64_t> &accounts) = 0;
 };
@@ -71,6 +73,7 @@ public:
         if (m_ears.sweep)
             m_ears.sweep();
     }
+    [[nodiscard]] bool tellsOfTokens() const override { return false; }
     void announcePushes(const std::vector<std::int64_t> &accounts) override
     {
         if (m_ears.pushes)

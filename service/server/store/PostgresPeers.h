@@ -26,6 +26,7 @@ public:
     void release(const std::string &blob) noexcept override;
     [[nodiscard]] bool sweeps() const override;
     void wakeSweeper() override;
+    [[nodiscard]] bool tellsOfTokens() const override { return true; }
     /// Nothing is left to do: the transaction that made the pushes has told all servers.
     void announcePushes(const std::vector<std::int64_t> & /*accounts*/) override {}
 

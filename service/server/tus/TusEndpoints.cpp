@@ -95,7 +95,6 @@ Task<void> makeOwnShare(Exchange &exchange, Context &context, Account account, M
     const CreateResult result =
         co_await context.pool.run([&] { return context.metadata.createShare(share); });
     checkCreated(result);
-    context.peers.wakeSweeper();
     co_await answerCreated(exchange, result.share, 0, true);
 }
 

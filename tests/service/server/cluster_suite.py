@@ -141,6 +141,12 @@ class Pushes(ClusterCase):
         self.assertEqual(answer.status, 201)
         self.assertIsNone(stream.next())
 
+    def test_a_removed_accounts_streams_end_at_every_server(self):
+        streams = [self.listen(node) for node in self.nodes]
+        self.run_account("remove", "--number", BERTA)
+        for stream in streams:
+            self.assertIsNone(stream.next())
+
 
 class Sweeping(ClusterCase):
     options = ["--share-lifetime", "4"]
