@@ -73,6 +73,8 @@ class S3Cluster(S3ClusterCase):
 class CutOff(S3ClusterCase):
     """The first server is behind a network that can be cut; the second has another way to the store."""
 
+    patience = 45  # a call gives up after some twenty seconds
+
     def another(self, *more):
         self.stores = [word.replace(f"127.0.0.1:{self.proxy.port}", STORE) for word in self.stores]
         return super().another(*more)
