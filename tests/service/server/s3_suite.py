@@ -165,6 +165,8 @@ class WholeFiles(S3Case):
 
 
 class Faults(S3Case):
+    patience = 60  # a call to a silent store gives up after some thirty seconds
+
     def test_a_busy_store_is_asked_again(self):
         self.proxy.fault("slow_down", times=4, each=2)
         content, share, upload = self.one_file(3 * PART + 5)
@@ -189,6 +191,20 @@ class Faults(S3Case):
         for sender in senders:
             sender.join()
         self.assertEqual(answers, [204] * 30)
+
+    def test_a_silent_store_is_given_up(self):
+        content, share, upload = self.one_file(1000)
+        self.proxy.fault("hold", times=1000)
+        self.addCleanup(self.proxy.release)
+        for _ in range(2):
+            self.assert_refused(self.patch(upload, 0, content), 503, "unavailable")
+        self.assertEqual(self.get("/readyz").status, 503)
+        self.assertEqual(self.request("GET", "/api/v1/account").status, 200)
+        self.proxy.release()
+        self.assertEqual(self.when_back("GET", "/readyz", token=False).status, 200)
+        self.go_on(upload, content)
+        self.assert_shared(share, content)
+        self.assert_stored(content)
 
     def test_lost_answers_lose_nothing_and_leave_nothing(self):
         for kind in ("begin", "part", "complete"):
