@@ -154,7 +154,7 @@ std::string answersTo(std::string_view bytes)
     asio::io_context io{1};
     NoPeers peers;
     ActiveWrites writes(peers);
-    PushHub pushes(io.get_executor(), world().limits);
+    PushHub pushes(io.get_executor(), world().limits, !peers.tellsOfTokens());
     Context context{world().metadata,   world().blobs, peers,  world().pool,
                     world().pool,       writes,        pushes, world().limits,
                     [] { return now; }, "https://host"};
