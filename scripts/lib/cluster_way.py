@@ -101,4 +101,6 @@ class ClusterWay(Way):
             raise WorldError("the upload began again from nothing")
         say(f"7. {self.killed.name} was killed in mid upload and stayed away; {other.name} went on from byte {offset:,}.")
         by_port = collections.Counter(request["servers"][-1] for request in requests if request["servers"])
+        say("   pelliko-server check finds no row without bytes and no bytes without a row: "
+            + world.run("pelliko-server", "check", *self.stores).splitlines()[-1])
         say("   Answered: " + ", ".join(f"{by_port[node.port]} requests by {node.name}" for node in self.cluster.nodes) + ".")
