@@ -1,22 +1,32 @@
 #include "Sweeper.h"
 
 #include <boost/asio/as_tuple.hpp>
+#include <boost/asio/co_spawn.hpp>
+#include <boost/asio/detached.hpp>
+#include <boost/asio/steady_timer.hpp>
 #include <boost/asio/use_awaitable.hpp>
 
 #include <algorithm>
 #include <chrono>
 #include <cstdio>
+#include <exception>
+#include <memory>
 #include <string>
 #include <utility>
 #include <vector>
 
 namespace pelliko::server
 {
+
+namespace asio = boost::asio;
+
 namespace
 {
 
 /// After a failure of the store, which may pass.
 constexpr std::chrono::seconds retryDelay{60};
+/// Of the calls that a store takes at once the sweeper uses one of so many.
+constexpr std::size_t shareOfCalls = 6;
 /// A store of millions is looked through in pieces.
 constexpr std::size_t blobsAtOnce = 1000;
 
@@ -31,7 +41,22 @@ std::vector<std::string> keysOf(const std::vector<StoredBlob> &blobs)
 
 } // namespace
 
-Sweeper::Sweeper(const boost::asio::any_io_executor &executor, Context &context)
+/// Blobs of which several are being removed.
+struct Sweeper::Removal {
+    explicit Removal(const asio::any_io_executor &executor)
+        : done(executor, asio::steady_timer::time_point::max())
+    {
+    }
+
+    std::vector<std::string> keys;
+    std::size_t next = 0;
+    std::size_t atWork = 0;
+    std::exception_ptr failure;
+    /// Never expires: cancelled by whoever ends last.
+    asio::steady_timer done;
+};
+
+Sweeper::Sweeper(const asio::any_io_executor &executor, Context &context)
     : m_context(context), m_timer(executor)
 {
 }
@@ -61,7 +86,7 @@ Task<void> Sweeper::run()
         }
         if (failed && !m_stopped) {
             m_timer.expires_after(retryDelay);
-            co_await m_timer.async_wait(boost::asio::as_tuple(boost::asio::use_awaitable));
+            co_await m_timer.async_wait(asio::as_tuple(asio::use_awaitable));
         }
     }
 }
@@ -71,7 +96,7 @@ Task<void> Sweeper::round()
     if (!m_context.peers.sweeps()) {
         m_timer.expires_at(std::chrono::system_clock::time_point::max());
         if (!m_woken && !m_stopped)
-            co_await m_timer.async_wait(boost::asio::as_tuple(boost::asio::use_awaitable));
+            co_await m_timer.async_wait(asio::as_tuple(asio::use_awaitable));
         co_return;
     }
     if (!std::exchange(m_lookedForStrays, true)) {
@@ -128,20 +153,48 @@ Task<void> Sweeper::sweep()
     co_await removeDoomed();
 }
 
+Task<void> Sweeper::removeOne(std::string key)
+{
+    // Under the lease nobody can make the blob again after it was removed.
+    const ActiveWrites::Lease lease = co_await m_context.writes.take(key, [] {});
+    co_await m_context.blobPool.run([&] { m_context.blobs.remove(key); });
+    co_await m_context.pool.run([&] { m_context.metadata.forgetBlob(key); });
+    m_context.metrics.blobsRemoved(1);
+}
+
+/// Removes one after the other, as others do with the same keys at the same time.
+Task<void> Sweeper::removeInTurn(std::shared_ptr<Removal> removal)
+{
+    try {
+        while (removal->next < removal->keys.size() && !removal->failure && !m_stopped) {
+            std::string key = removal->keys[removal->next++];
+            co_await removeOne(std::move(key));
+        }
+    } catch (const std::exception &) {
+        removal->failure = std::current_exception();
+    }
+    if (--removal->atWork == 0)
+        removal->done.cancel();
+}
+
 Task<void> Sweeper::removeDoomed()
 {
     while (!m_stopped) {
-        const std::vector<std::string> keys =
+        const auto removal = std::make_shared<Removal>(m_timer.get_executor());
+        removal->keys =
             co_await m_context.pool.run([&] { return m_context.metadata.doomedBlobs(); });
-        if (keys.empty())
+        if (removal->keys.empty())
             co_return;
-        for (const std::string &key : keys) {
-            // Under the lease nobody can make the blob again after it was removed.
-            const ActiveWrites::Lease lease = co_await m_context.writes.take(key, [] {});
-            co_await m_context.blobPool.run([&] { m_context.blobs.remove(key); });
-            co_await m_context.pool.run([&] { m_context.metadata.forgetBlob(key); });
-            m_context.metrics.blobsRemoved(1);
-        }
+        // Most of a removal is waiting, and others want the store as well.
+        const std::size_t atOnce =
+            std::max<std::size_t>(1, m_context.blobs.callsAtOnce() / shareOfCalls);
+        removal->atWork = atOnce;
+        for (std::size_t count = 0; count < atOnce; ++count)
+            asio::co_spawn(m_timer.get_executor(), removeInTurn(removal), asio::detached);
+        if (removal->atWork > 0)
+            co_await removal->done.async_wait(asio::as_tuple(asio::use_awaitable));
+        if (removal->failure)
+            std::rethrow_exception(removal->failure);
     }
 }
 
@@ -162,7 +215,7 @@ Task<void> Sweeper::sleep()
     if (m_woken || m_stopped)
         co_return;
     m_timer.expires_after(std::chrono::seconds(next - m_context.now()));
-    co_await m_timer.async_wait(boost::asio::as_tuple(boost::asio::use_awaitable));
+    co_await m_timer.async_wait(asio::as_tuple(asio::use_awaitable));
 }
 
 } // namespace pelliko::server

@@ -4,6 +4,9 @@
 
 #include <boost/asio/system_timer.hpp>
 
+#include <memory>
+#include <string>
+
 namespace pelliko::server
 {
 
@@ -26,6 +29,9 @@ private:
     Task<void> round();
     Task<void> removeStrays();
     Task<void> sweep();
+    struct Removal;
+    Task<void> removeOne(std::string key);
+    Task<void> removeInTurn(std::shared_ptr<Removal> removal);
     Task<void> removeDoomed();
     Task<void> sleep();
 
