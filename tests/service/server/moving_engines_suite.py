@@ -3,6 +3,7 @@
 import os
 import sqlite3
 import sys
+import threading
 
 from checking_suite import Checking
 from moving_suite import MIB, SERVERS_RUN, MovingCase
@@ -143,6 +144,25 @@ class CheckingStore(S3Case):
         self.assertEqual(self.get(link + "/1").body, contents[1])
         self.assertEqual(self.offset(upload), 0)
         self.assertEqual(self.go_on(runs, running), PART + 1000)
+
+    def test_beside_uploads_that_run(self):
+        def upload_some():
+            for _ in range(6):
+                content, share, upload = self.one_file(2 * PART + 5)
+                for offset in range(0, len(content), 5 * MIB):
+                    answers.append(self.patch(upload, offset, content[offset:offset + 5 * MIB]).status)
+                answers.append(self.request("POST", f"/api/v1/shares/{share['share']}/finish").status)
+
+        answers = []
+        senders = [threading.Thread(target=upload_some) for _ in range(2)]
+        for sender in senders:
+            sender.start()
+        looks = 0
+        while any(sender.is_alive() for sender in senders):
+            self.assertIn("0 lost, 0 strays, 0 with leftovers, 0 unused rows", self.check("--mend"))
+            looks += 1
+        self.assertGreater(looks, 0)
+        self.assertEqual(set(answers), {204, 200}, answers)
 
     def key_of(self, upload):
         with sqlite3.connect(self.data + "/metadata.db") as metadata:
