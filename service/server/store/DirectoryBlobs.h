@@ -9,7 +9,7 @@ namespace pelliko::server
 
 /// Blobs as files of one directory: ROOT/ab/abcdef…, the sub-directory being the key's first two
 /// characters.
-class DirectoryBlobs final : public Blobs
+class DirectoryBlobs : public Blobs
 {
 public:
     /// Makes the directory, for its owner alone, when it is absent.

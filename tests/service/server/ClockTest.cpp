@@ -21,32 +21,14 @@ namespace
 namespace fs = std::filesystem;
 
 /// The real blobs, which tell when one was removed.
-class TellingBlobs final : public Blobs
+class TellingBlobs final : public DirectoryBlobs
 {
 public:
-    explicit TellingBlobs(const fs::path &root) : m_blobs(root) {}
+    using DirectoryBlobs::DirectoryBlobs;
 
-    std::unique_ptr<BlobWriter> openForWriting(const std::string &key) override
-    {
-        return m_blobs.openForWriting(key);
-    }
-    std::unique_ptr<BlobReader> openForReading(const std::string &key) override
-    {
-        return m_blobs.openForReading(key);
-    }
-    std::vector<StoredBlob> list(const std::string &after, std::size_t most) override
-    {
-        return m_blobs.list(after, most);
-    }
-    std::optional<std::uint64_t> sizeOf(const std::string &key) override
-    {
-        return m_blobs.sizeOf(key);
-    }
-    std::optional<StoreMark> mark() override { return m_blobs.mark(); }
-    void setMark(const std::optional<StoreMark> &mark) override { m_blobs.setMark(mark); }
     void remove(const std::string &key) override
     {
-        m_blobs.remove(key);
+        DirectoryBlobs::remove(key);
         const std::lock_guard lock(m_mutex);
         m_removed.insert(key);
         m_changed.notify_all();
@@ -60,7 +42,6 @@ public:
     }
 
 private:
-    DirectoryBlobs m_blobs;
     std::mutex m_mutex;
     std::condition_variable m_changed;
     std::set<std::string> m_removed;

@@ -30,6 +30,10 @@ protected:
     /// Makes a share, stores all its bytes, finishes it; the link's hash is `hash`.
     ShareRecord makeFinished(std::uint64_t size, const std::string &hash, Seconds now = 1000);
 
+    static inline const std::string tokenHash = std::string(32, '\x01');
+    static inline const std::string linkHash = std::string(32, '\x02');
+    static inline const std::string otherLinkHash{"\0\x03 with a zero", 15};
+
     std::unique_ptr<Metadata> m_store;
     std::int64_t m_account = 0;
 };

@@ -24,10 +24,10 @@ namespace
 namespace fs = std::filesystem;
 
 /// A store on which each sixth byte is written wrongly.
-class TwistingBlobs final : public Blobs
+class TwistingBlobs final : public DirectoryBlobs
 {
 public:
-    explicit TwistingBlobs(const fs::path &root) : m_blobs(root) {}
+    using DirectoryBlobs::DirectoryBlobs;
 
     std::unique_ptr<BlobWriter> openForWriting(const std::string &key) override
     {
@@ -44,26 +44,8 @@ public:
             void sync() override { writer->sync(); }
             std::unique_ptr<BlobWriter> writer;
         };
-        return std::make_unique<Writer>(m_blobs.openForWriting(key));
+        return std::make_unique<Writer>(DirectoryBlobs::openForWriting(key));
     }
-    std::unique_ptr<BlobReader> openForReading(const std::string &key) override
-    {
-        return m_blobs.openForReading(key);
-    }
-    std::vector<StoredBlob> list(const std::string &after, std::size_t most) override
-    {
-        return m_blobs.list(after, most);
-    }
-    std::optional<std::uint64_t> sizeOf(const std::string &key) override
-    {
-        return m_blobs.sizeOf(key);
-    }
-    void remove(const std::string &key) override { m_blobs.remove(key); }
-    std::optional<StoreMark> mark() override { return m_blobs.mark(); }
-    void setMark(const std::optional<StoreMark> &mark) override { m_blobs.setMark(mark); }
-
-private:
-    DirectoryBlobs m_blobs;
 };
 
 class Moving : public testing::Test
