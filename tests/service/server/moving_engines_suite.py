@@ -49,7 +49,7 @@ class Engines(MovingCase):
     def test_there_and_back_killed_at_any_moment(self):
         self.sent = self.offset(self.upload)
         self.stop()
-        self.move_while_it_is_killed(seed=11, first=0.1)
+        self.move_while_it_is_killed(seed=11)
         self.assert_refuses_to_serve(self.stores, "moved elsewhere")
         self.serve_target()
         # One object of each file, one of the upload that goes on, and no mark.
@@ -59,7 +59,7 @@ class Engines(MovingCase):
         self.stop()
         there, self.place = self.place, [self.directory + "/back"]
         self.source = lambda: there
-        self.move_while_it_is_killed(seed=12, first=0.1)
+        self.move_while_it_is_killed(seed=12)
         self.assert_refuses_to_serve(self.stores, "moved elsewhere")
         self.served = ["--data", *self.place]
         self.serve_target()
@@ -98,11 +98,11 @@ class Engines(MovingCase):
         everything = self.place
         blobs = "dir:" + self.data + "/blobs"
         self.place = everything[:1]
-        self.move_while_it_is_killed(seed=13, first=0.1)
+        self.move_while_it_is_killed(seed=13)
         self.assert_refuses_to_serve(self.stores, "moved elsewhere")
         self.source = lambda: [everything[0], blobs]
         self.place = everything[1:]
-        self.move_while_it_is_killed(seed=14, first=0.1)
+        self.move_while_it_is_killed(seed=14)
         self.assert_refuses_to_serve(["--metadata", everything[0], "--blobs", blobs], "moved elsewhere")
         self.serve_target()
         self.assert_everything_is_there()
