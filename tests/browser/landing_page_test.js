@@ -56,7 +56,7 @@ async function assertFits(page, where) {
 async function assertWholeWords(page, where) {
   const broken = await page.evaluate(() => {
     const range = document.createRange();
-    return [...document.querySelectorAll('h1, p, .button span, .kind')].flatMap((part) => {
+    return [...document.querySelectorAll('h1, p, .button span, .kind, .lost .size')].flatMap((part) => {
       const walker = document.createTreeWalker(part, NodeFilter.SHOW_TEXT);
       const words = [];
       for (let node = walker.nextNode(); node; node = walker.nextNode()) {
@@ -215,7 +215,8 @@ const cases = {
       assert.equal(await style(page.locator('body'), 'fontSize'), large ? '34px' : '17px');
     });
     await Promise.all([
-      look(['files', 'expired', 'withdrawn', 'unknown', 'home'], false), look(['files'], true)]);
+      look(['files', 'lossy', 'lost', 'expired', 'withdrawn', 'unknown', 'home'], false),
+      look(['files', 'lossy'], true)]);
   },
 
   async 'keeps the rules of accessibility'(server, _build, browser) {

@@ -41,15 +41,26 @@ function endTime(server, share) {
     'sys.exit(changed != 1)', path.join(server.data, 'metadata.db'), share]);
 }
 
+const blobs = (server) => fs.readdirSync(path.join(server.data, 'blobs'), { recursive: true })
+  .map((name) => path.join(server.data, 'blobs', name)).filter((file) => fs.statSync(file).isFile());
+
 function loseBytes(server) {
-  for (const name of fs.readdirSync(path.join(server.data, 'blobs'), { recursive: true })) {
-    const file = path.join(server.data, 'blobs', name);
-    if (fs.statSync(file).isFile()) fs.rmSync(file);
-  }
+  blobs(server).forEach((file) => fs.rmSync(file));
+}
+
+/** Shares files and then loses some of them, which the operator has noted. */
+async function makeLossy(server, lost, kept) {
+  const link = await makeLink(server, [...lost, ...kept]);
+  blobs(server).filter((name) => lost.some((file) => file.bytes.equals(fs.readFileSync(name))))
+    .forEach((name) => fs.rmSync(name));
+  execFileSync(server.program, ['check', '--data', server.data, '--mend']);
+  return link;
 }
 
 /** The address and the status of a page of each kind, by the kind's name. */
 async function pageKinds(server) {
+  const lossy = await makeLossy(server, variety.slice(0, 2), variety.slice(2, 6));
+  const lost = await makeLossy(server, variety.slice(0, 2), []);
   const failing = await makeLink(server, files.slice(2));
   loseBytes(server);
   const withdrawn = await makeLink(server, files.slice(2));
@@ -60,6 +71,8 @@ async function pageKinds(server) {
     files: { url: (await makeLink(server, variety)).url, status: 200 },
     text: { url: (await makeLink(server, memo)).url, status: 200 },
     contact: { url: (await makeLink(server, variety.slice(4, 5))).url, status: 200 },
+    lossy: { url: lossy.url, status: 200 },
+    lost: { url: lost.url, status: 410 },
     expired: { url: expired.url, status: 410 },
     withdrawn: { url: withdrawn.url, status: 410 },
     unknown: { url: `${server.url}/s/${'A'.repeat(22)}`, status: 404 },

@@ -21,6 +21,7 @@ constexpr ErrorEntry table[] = {
     {Error::expired, "gone", 410, "The share has expired."},
     {Error::withdrawn, "gone", 410, "The share was withdrawn."},
     {Error::fileLost, "gone", 410, "The server does not have this file any more."},
+    {Error::filesLost, "gone", 410, "The server does not have these files any more."},
     {Error::unsupportedTusVersion, "unsupported_tus_version", 412,
      "Tus-Resumable has to be 1.0.0."},
     {Error::tooManyFiles, "too_many_files", 413, "A share holds at most 100 files."},

@@ -23,6 +23,8 @@ enum class Error {
     withdrawn,
     /// Of a share that goes on otherwise.
     fileLost,
+    /// All of several files, of a share that has not ended.
+    filesLost,
     unsupportedTusVersion,
     tooManyFiles,
     shareTooLarge,

@@ -38,10 +38,33 @@ Task<LinkRecord> findLiveLink(Context &context, std::string token)
     co_return std::move(*link);
 }
 
+/// Refuses when nothing of a live share can be had.
+void checkSomethingIsLeft(const ShareRecord &share)
+{
+    if (std::all_of(share.files.begin(), share.files.end(),
+                    [&](const FileRecord &file) { return share.lost(file); }))
+        throw Refusal(share.files.size() == 1 ? Error::fileLost : Error::filesLost);
+}
+
+/// The files that can be had, each under a name of its own.
+std::vector<FileRecord> filesForZip(const ShareRecord &share)
+{
+    std::vector<FileRecord> files;
+    std::vector<std::string> names;
+    for (const FileRecord &file : share.files) {
+        if (share.lost(file))
+            continue;
+        files.push_back(file);
+        names.push_back(file.name);
+    }
+    names = uniqueNames(names);
+    for (std::size_t index = 0; index < files.size(); ++index)
+        files[index].name = names[index];
+    return files;
+}
+
 Task<std::shared_ptr<BlobReader>> openBlob(Context &context, std::string key)
 {
-    if (key.empty())
-        throw Refusal(Error::fileLost);
     std::shared_ptr<BlobReader> reader = co_await context.blobPool.run(
         [&]() -> std::shared_ptr<BlobReader> { return context.blobs.openForReading(key); });
     if (!reader)
@@ -164,6 +187,7 @@ Task<std::string> readWhole(Context &context, FileRecord file)
 Task<void> showLandingPage(Exchange &exchange, Context &context, std::string token)
 {
     const LinkRecord link = co_await findLiveLink(context, token);
+    checkSomethingIsLeft(link.share);
     std::optional<std::string> text;
     if (const FileRecord *file = textInPlace(link.share)) {
         const std::string bytes = co_await readWhole(context, *file);
@@ -190,6 +214,8 @@ Task<void> downloadFile(Exchange &exchange, Context &context, std::string token,
 
 Task<void> sendShareFile(Exchange &exchange, Context &context, const FileRecord &file)
 {
+    if (file.blob.empty())
+        throw Refusal(Error::fileLost);
     const std::string etag = etagOf(file);
     if (listsEtag(exchange.request().header("If-None-Match"), etag)) {
         Response unchanged = makeResponse(Status::notModified, {{"ETag", etag}});
@@ -212,15 +238,8 @@ Task<void> sendShareFile(Exchange &exchange, Context &context, const FileRecord 
 Task<void> downloadAll(Exchange &exchange, Context &context, std::string token)
 {
     const LinkRecord link = co_await findLiveLink(context, token);
-    std::vector<std::string> names;
-    for (const FileRecord &file : link.share.files)
-        names.push_back(file.name);
-    names = uniqueNames(names);
-    // Nobody notices what is missing from an archive.
-    for (const FileRecord &file : link.share.files) {
-        if (file.blob.empty())
-            throw Refusal(Error::fileLost);
-    }
+    checkSomethingIsLeft(link.share);
+    const std::vector<FileRecord> files = filesForZip(link.share);
     Response head =
         makeResponse(Status::ok, {{"Content-Type", "application/zip"},
                                   {"Content-Disposition", attachmentDisposition("pelliko.zip")},
@@ -228,11 +247,8 @@ Task<void> downloadAll(Exchange &exchange, Context &context, std::string token)
     co_await exchange.startStream(std::move(head), std::nullopt);
     if (exchange.request().method != "HEAD") {
         ZipWriter zip;
-        for (std::size_t index = 0; index < names.size(); ++index) {
-            FileRecord file = link.share.files[index];
-            file.name = names[index];
-            co_await zipFile(exchange, context, zip, std::move(file), link.share.created);
-        }
+        for (const FileRecord &file : files)
+            co_await zipFile(exchange, context, zip, file, link.share.created);
         zip.close();
         const std::string rest = zip.takeOutput();
         co_await exchange.write(rest);

@@ -57,6 +57,11 @@ ErrorWords wordsOf(const ErrorEntry &entry)
         return {Mark::trouble, "This file is lost",
                 "The server does not have this file any more. Ask the sender to share it again.",
                 false};
+    case Error::filesLost:
+        return {Mark::trouble, "These files are lost",
+                "The server does not have these files any more. Ask the sender to share them "
+                "again.",
+                false};
     case Error::busy:
         return {Mark::clock, "The server is busy",
                 "It has more to do than it can manage at the moment. Wait a few minutes, then open "

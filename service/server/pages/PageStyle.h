@@ -38,15 +38,17 @@ p{margin:.2rem 0}
 a:focus-visible{outline:3px solid var(--accent);outline-offset:3px}
 ul{list-style:none;margin:1rem 0 0;padding:0}
 li{border-top:1px solid var(--line)}
-li a{display:flex;gap:.8rem;align-items:center;min-height:56px;padding:.6rem .1rem;border-radius:10px;color:inherit;text-decoration:none}
+li>*{display:flex;gap:.8rem;align-items:center;min-height:56px;padding:.6rem .1rem;border-radius:10px;color:inherit;text-decoration:none}
 li a:hover .name,li a:active .name{text-decoration:underline}
 .file{flex:1;min-width:0}
 .name{display:block;color:var(--accent);font-weight:500;line-height:1.35}
 .kind,.size{color:var(--soft);font-size:.9rem}
 .kind::after{content:" \b7  "}
+.lost .name{color:var(--soft)}
+.lost .disc{border-color:var(--line);background:none;color:var(--soft)}
 .get{display:flex;color:var(--accent)}
 .get svg{width:22px;height:22px}
-@media (max-width:22.5rem){main{padding:1rem 10px 2rem}.card{padding:1.2rem 16px}.button{gap:10px;padding:.7rem 12px}li a{gap:12px}}
+@media (max-width:22.5rem){main{padding:1rem 10px 2rem}.card{padding:1.2rem 16px}.button{gap:10px;padding:.7rem 12px}li>*{gap:12px}}
 @media (prefers-reduced-motion:no-preference){.button{transition:background-color .15s}}
 @media (forced-colors:active){.button{border-color:LinkText}.disc{border-color:CanvasText}}
 @media print{:root{color-scheme:light;--paper:#fff;--card:#fff;--ink:#000;--soft:#333;--line:#888;--accent:#000;--tint:#fff;--on-tint:#000}main{max-width:none;padding:0}.card{border:0;padding:0}.button,.get{display:none}li{break-inside:avoid}}

@@ -55,6 +55,8 @@ json recordOf(const ReceivedRecord &received)
         const FileRecord &file = received.share.files[index];
         files.push_back(
             {{"index", index}, {"name", file.name}, {"size", file.size}, {"type", file.type}});
+        if (received.share.lost(file))
+            files.back()["lost"] = true;
     }
     return {{"id", received.push},
             {"sender", received.senderNumber},

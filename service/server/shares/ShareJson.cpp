@@ -83,6 +83,8 @@ json recordOf(const ShareRecord &share)
                          {"offset", file.offset},
                          {"upload", uploadPath(file.upload)},
                          {"complete", file.complete()}});
+        if (share.lost(file))
+            files.back()["lost"] = true;
     }
     json record{{"share", share.key},
                 {"state", stateName(share.state)},

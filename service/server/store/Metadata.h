@@ -87,6 +87,13 @@ struct ShareRecord {
     Seconds deadline = 0;
     std::vector<FileRecord> files;
     std::vector<Recipient> recipients;
+
+    /// Whether the store has lost the bytes of this one of its files. A share that has ended has no
+    /// bytes any more, but lost none.
+    [[nodiscard]] bool lost(const FileRecord &file) const
+    {
+        return state == ShareState::finished && file.blob.empty();
+    }
 };
 
 struct NewFile {

@@ -21,7 +21,7 @@ ShareState stateAt(ShareState stored, Seconds deadline, Seconds now)
 bool hasLostFile(const ShareRecord &share)
 {
     return std::any_of(share.files.begin(), share.files.end(),
-                       [](const FileRecord &file) { return file.blob.empty(); });
+                       [&](const FileRecord &file) { return share.lost(file); });
 }
 
 std::uint64_t announcedBytes(const NewShare &share)

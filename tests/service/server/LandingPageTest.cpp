@@ -23,6 +23,7 @@ LinkRecord link(std::vector<FileRecord> files)
 {
     LinkRecord record;
     record.senderNumber = "+4915112345678";
+    record.share.state = ShareState::finished;
     record.share.deadline = deadline;
     record.share.files = std::move(files);
     return record;
@@ -33,6 +34,12 @@ std::string pageOf(std::vector<FileRecord> files, const PageLanguage &language =
     return landingPage(link(std::move(files)), "TOKEN", language, now).body;
 }
 
+/// Without the head and its style sheet.
+std::string shownIn(const std::string &page)
+{
+    return page.substr(page.find("<body>"));
+}
+
 std::string errorBody(Error error, const PageLanguage &language = {})
 {
     return errorPage(Refusal(error), language).body;
@@ -40,10 +47,10 @@ std::string errorBody(Error error, const PageLanguage &language = {})
 
 /// Every refusal that a page can tell of; the others belong to the calls of accounts.
 constexpr Error errorsOfPages[] = {
-    Error::badRequest,      Error::notFound,   Error::methodNotAllowed,
-    Error::expired,         Error::withdrawn,  Error::rangeNotSatisfiable,
-    Error::tooManyAttempts, Error::internal,   Error::busy,
-    Error::noSpace,         Error::unavailable};
+    Error::badRequest, Error::notFound, Error::methodNotAllowed, Error::expired,
+    Error::withdrawn,  Error::fileLost, Error::filesLost,        Error::rangeNotSatisfiable,
+    Error::internal,   Error::busy,     Error::tooManyAttempts,  Error::noSpace,
+    Error::unavailable};
 
 TEST(LandingPage, TellsSenderFilesSizesAndEnd)
 {
@@ -84,6 +91,37 @@ TEST(LandingPage, NamesCannotBecomeMarkup)
     const std::string body = pageOf({{"<img src=x onerror=\"a\">.jpg", "", 1, 1, "", "k"}});
     EXPECT_THAT(body, Not(HasSubstr("<img")));
     EXPECT_THAT(body, HasSubstr("&lt;img src=x onerror=&quot;a&quot;&gt;.jpg"));
+}
+
+TEST(LandingPage, ALostFileIsStruckOffAndLeadsNowhere)
+{
+    const std::string body = pageOf({{"a.jpg", "", 1000, 1000, "", "k"},
+                                     {"<b>.pdf", "", 500, 0, "", ""},
+                                     {"c", "", 501, 501, "", "k"}});
+    EXPECT_THAT(body,
+                HasSubstr("<h1>2 files from +4915112345678</h1>\n<p>1 more file is lost</p>"));
+    EXPECT_THAT(body, HasSubstr("1.5 kB in all"));
+    EXPECT_THAT(body, HasSubstr("<s><bdi>&lt;b&gt;.pdf</bdi></s>"));
+    EXPECT_THAT(body, HasSubstr("Lost: ask the sender to share it again."));
+    EXPECT_THAT(body, Not(HasSubstr("500 bytes")));
+    EXPECT_THAT(body, HasSubstr("href=\"TOKEN/all.zip\""));
+    EXPECT_THAT(body, Not(HasSubstr("href=\"TOKEN/1\"")));
+    EXPECT_THAT(body, HasSubstr("href=\"TOKEN/2\""));
+}
+
+TEST(LandingPage, TheOneFileThatIsLeftNeedsNoZip)
+{
+    const std::string body = pageOf({{"a.jpg", "", 7, 0, "", ""}, {"b.jpg", "", 5, 5, "", "k"}});
+    EXPECT_THAT(body, HasSubstr("<h1>1 file from"));
+    EXPECT_THAT(body, Not(HasSubstr("in all")));
+    EXPECT_THAT(body, HasSubstr("class=\"button\" href=\"TOKEN/1\""));
+    EXPECT_THAT(body, Not(HasSubstr("all.zip")));
+}
+
+TEST(LandingPage, NothingIsSaidOfLossWhereNothingIsLost)
+{
+    const std::string body = pageOf({{"a.jpg", "", 7, 7, "", "k"}, {"b.jpg", "", 0, 0, "", "k"}});
+    EXPECT_THAT(shownIn(body), Not(HasSubstr("lost")));
 }
 
 TEST(LandingPage, ATextIsReadInThePage)
@@ -158,6 +196,8 @@ TEST(ErrorPage, ExpiredWithdrawnAndUnknownLinksSayWhatHappened)
     EXPECT_THAT(errorBody(Error::expired), HasSubstr("<h1>The time is over</h1>"));
     EXPECT_THAT(errorBody(Error::withdrawn), HasSubstr("The sender has taken this share back"));
     EXPECT_THAT(errorBody(Error::notFound), HasSubstr("This link is not known"));
+    EXPECT_EQ(errorPage(Refusal(Error::filesLost), {}).status, 410);
+    EXPECT_THAT(errorBody(Error::filesLost), HasSubstr("<h1>These files are lost</h1>"));
 }
 
 TEST(ErrorPage, WhoHasToWaitIsToldSoAndHowLong)
@@ -239,29 +279,34 @@ TEST(PageLanguage, EveryLanguageFillsEveryPlace)
         ASSERT_STREQ(language.tag(), catalogue.tag);
         for (const std::uint64_t count : {0U, 1U, 2U, 3U, 5U, 11U, 21U, 22U, 100U, 111U}) {
             LinkRecord record = link(std::vector<FileRecord>(count, {"a", "", 7, 7, "", "k"}));
-            const std::string body = landingPage(record, "TOKEN", language, now).body;
-            const std::string text = body.substr(body.find("<body>"));
+            const std::string text = shownIn(landingPage(record, "TOKEN", language, now).body);
             EXPECT_THAT(text, Not(HasSubstr("%"))) << catalogue.tag << count;
             EXPECT_THAT(text, HasSubstr("+4915112345678")) << catalogue.tag << count;
             EXPECT_THAT(text, HasSubstr("2025")) << catalogue.tag;
+            record.share.files.assign(count, {"a", "", 7, 0, "", ""});
+            record.share.files.push_back({"b", "", 7, 7, "", "k"});
+            const std::string lossy = shownIn(landingPage(record, "TOKEN", language, now).body);
+            EXPECT_THAT(lossy, Not(HasSubstr("%"))) << catalogue.tag << count;
         }
     }
 }
 
 TEST(PageLanguage, NoPageMixesInEnglish)
 {
-    const std::vector<FileRecord> files(2, {"a", "", 7, 7, "", "k"});
+    std::vector<FileRecord> files(2, {"a", "", 7, 7, "", "k"});
+    files.push_back({"a", "", 7, 0, "", ""});
     for (const PageCatalogue &catalogue : pageCatalogues()) {
         const PageLanguage language = PageLanguage::preferred(catalogue.tag);
         const std::string page = pageOf(files, language);
         for (const char *words : {"files from", "in all", "Available", "Download all", "hours left",
-                                  "Shared with", "Somebody"})
+                                  "Shared with", "Somebody", "more file", "Lost:"})
             EXPECT_THAT(page, Not(HasSubstr(words))) << catalogue.tag;
         EXPECT_THAT(homePage(language).body, Not(HasSubstr("erson to"))) << catalogue.tag;
         for (const Error error : errorsOfPages) {
             const std::string own = errorBody(error, language);
             for (const char *words : {"the link", "The time", "No longer", "the sender", "Too many",
-                                      "is busy", "not work", "Nothing here", "could not answer"})
+                                      "is busy", "not work", "Nothing here", "could not answer",
+                                      "is lost", "are lost", "any more"})
                 EXPECT_THAT(own, Not(HasSubstr(words))) << catalogue.tag;
         }
     }

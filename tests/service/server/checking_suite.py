@@ -1,7 +1,10 @@
 """`check`: what is known about files and the bytes that there are agree, or it says what does not."""
 
+import io
 import os
+import re
 import subprocess
+import zipfile
 
 import harness
 from harness import ServerCase
@@ -12,6 +15,15 @@ class Checking(ServerCase):
         done = subprocess.run([harness.PROGRAM, "check", *self.stores, *options], capture_output=True, text=True)
         self.assertEqual(done.returncode, status, done.stdout + done.stderr)
         return done.stdout
+
+    def lose(self, *contents):
+        """Takes the bytes of these files away and has it noted."""
+        for path in self.blob_files():
+            with open(path, "rb") as file:
+                lost = file.read() in contents
+            if lost:
+                os.unlink(path)
+        self.assertIn(f"{len(contents)} lost", self.check("--mend"))
 
     def test_sound_data_beside_an_upload_that_runs(self):
         self.make_finished(b"hello", b"")
@@ -35,11 +47,52 @@ class Checking(ServerCase):
         page = self.get(link + "/0")
         self.assertEqual(page.status, 410)
         self.assertIn(b"<h1>This file is lost</h1>", page.body)
-        self.assertEqual(self.get(link).status, 200)
+        for asked in ({"If-None-Match": "*"}, {"Range": "bytes=99-"}):
+            self.assertEqual(self.request("GET", link + "/0", headers=asked, token=False).status, 410, asked)
         self.assertEqual(self.get(link + "/1").body, b"others stay")
-        self.assertEqual(self.get(link + "/all.zip").status, 410)
         again = self.post_share({"reshare_of": share["share"], "recipients": [{"number": "+491511111"}]})
         self.assert_refused(again, 410, "gone")
+
+    def test_the_page_of_a_share_offers_what_is_left(self):
+        kept = [b"others stay", b"and so do these"]
+        share, link = self.make_finished(b"hello", *kept, names=["<gone>.jpg", "a.jpg", "b.jpg"])
+        self.lose(b"hello")
+        page = self.get(link)
+        self.assertEqual(page.status, 200)
+        for there in ("<h1>2 files from ", "1 more file is lost", "26 bytes in all", "Download all (<bdi>26 bytes</bdi>)",
+                      "<s><bdi>&lt;gone&gt;.jpg</bdi></s>", "Lost: ask the sender to share it again."):  # fmt: skip
+            self.assertIn(there, page.body.decode())
+        addresses = re.findall(r'href="[^"]*(/[^"/]+)" download', page.body.decode())
+        self.assertEqual(addresses, ["/all.zip", "/1", "/2"])
+        with zipfile.ZipFile(io.BytesIO(self.get(link + "/all.zip").body)) as archive:
+            self.assertIsNone(archive.testzip())
+            self.assertEqual([(name, archive.read(name)) for name in archive.namelist()],
+                             list(zip(["a.jpg", "b.jpg"], kept)))  # fmt: skip
+        record = self.request("GET", "/api/v1/shares/" + share["share"]).json()
+        self.assertEqual([file.get("lost") for file in record["files"]], [True, None, None])
+        self.request("DELETE", "/api/v1/shares/" + share["share"])
+        record = self.request("GET", "/api/v1/shares/" + share["share"]).json()
+        self.assertEqual([file.get("lost") for file in record["files"]], [None] * 3, "what has ended is not lost")
+
+    def test_the_last_file_that_is_left_needs_no_zip(self):
+        _, link = self.make_finished(b"hello", b"others stay")
+        self.lose(b"hello")
+        page = self.get(link).body.decode()
+        self.assertIn("<h1>1 file from ", page)
+        self.assertIn("Download (<bdi>11 bytes</bdi>)", page)
+        self.assertEqual(re.findall(r'href="[^"]*(/[^"/]+)" download', page), ["/1", "/1"])
+        with zipfile.ZipFile(io.BytesIO(self.get(link + "/all.zip").body)) as archive:
+            self.assertEqual(archive.namelist(), ["file1"])
+
+    def test_a_share_of_which_nothing_is_left_says_so(self):
+        _, several = self.make_finished(b"hello", b"world")
+        _, one = self.make_finished(b"text that the page would show", names=["memo.txt"])
+        self.lose(b"hello", b"world", b"text that the page would show")
+        for path, heading in ((several, "These files are lost"), (several + "/all.zip", "These files are lost"),
+                              (one, "This file is lost"), (one + "/all.zip", "This file is lost")):  # fmt: skip
+            page = self.get(path)
+            self.assertEqual(page.status, 410, path)
+            self.assertIn(f"<h1>{heading}</h1>", page.body.decode())
 
     def test_an_upload_whose_bytes_are_lost_begins_again(self):
         share = self.make_share(10)

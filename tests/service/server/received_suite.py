@@ -2,11 +2,14 @@
 
 import time
 
+import checking_suite
 from harness import NUMBER
 from push_case import BERTA, CARL, STRANGER, PushCase
 
 
 class Received(PushCase):
+    check, lose = checking_suite.Checking.check, checking_suite.Checking.lose
+
     def receive(self, *contents):
         stream = self.listen()
         share, finished = self.share_with(BERTA, STRANGER, contents=contents or (b"hello",))
@@ -67,6 +70,16 @@ class Received(PushCase):
         self.assertEqual(self.received(f"{number}/files/1").body, b"")
         for index in ["2", "-1", "x", "99999999999999999999", ""]:
             self.assert_refused(self.received(f"{token}/files/{index}"), 404, "not_found")
+
+    def test_a_file_that_the_store_has_lost(self):
+        share, finished, (_, token) = self.receive(b"hello", b"others stay")
+        self.lose(b"hello")
+        self.assertEqual([file.get("lost") for file in self.received(token).json()["files"]], [True, None])
+        self.assert_refused(self.received(token + "/files/0"), 410, "gone")
+        self.assertEqual(self.received(token + "/files/1").body, b"others stay")
+        self.assertIn(b"1 more file is lost", self.get(finished["url"][len(self.url):]).body)
+        self.withdraw(share)
+        self.assertEqual([file.get("lost") for file in self.received(token).json()["files"]], [None, None])
 
     def test_a_withdrawn_share_tells_that_it_was_withdrawn(self):
         share, _, (number, token) = self.receive()
