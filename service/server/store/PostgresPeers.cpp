@@ -38,10 +38,9 @@ constexpr auto longestBackOff = 2s;
 /// Counters of machines differ by some seconds a day.
 constexpr auto clockRound = 60s;
 
-/// A session that waits for its lock as long as it takes, and is ended by the database when its
-/// server is gone.
-constexpr const char *waitForever = "SET statement_timeout = 0; SET lock_timeout = 0;"
-                                    "SET client_connection_check_interval = '2s'";
+/// How often a server asks for the sweeper's lock. It does not wait for it in the database: a
+/// statement that waits keeps every row from being cleaned up that was deleted meanwhile.
+constexpr auto electionRound = 1s;
 
 struct Order {
     enum class Kind { claim, release, sweep };
@@ -116,7 +115,7 @@ private:
     void refuseOrders(const std::exception_ptr &error);
     void hearAll();
     void hear(std::string_view message);
-    void lookAtElection();
+    void takePartInElection();
     void await();
     [[nodiscard]] int patience() const;
     void wake() const;
@@ -135,10 +134,10 @@ private:
     // Of the thread alone.
     std::unique_ptr<PostgresConnection> m_session;
     std::unique_ptr<PostgresRights> m_rights;
-    std::unique_ptr<PostgresConnection> m_election;
     Clock::time_point m_notBefore{};
     Clock::duration m_backOff{};
     Clock::time_point m_nextClock{};
+    Clock::time_point m_nextElection{};
 };
 
 void PostgresPeers::Thread::wake() const
@@ -155,7 +154,7 @@ void PostgresPeers::Thread::run()
         } catch (const StorageFailure &error) {
             std::fprintf(stderr, "pelliko-server: among servers: %s\n", error.what());
             // What one statement was refused for does not end the others' rights.
-            if (!m_session || !m_session->isAlive() || !m_election || !m_election->isAlive())
+            if (!m_session || !m_session->isAlive())
                 lose(std::current_exception());
             // Others' orders may still wait.
             continue;
@@ -188,7 +187,7 @@ void PostgresPeers::Thread::work()
     }
     m_rights->takeOver();
     hearAll();
-    lookAtElection();
+    takePartInElection();
 }
 
 void PostgresPeers::Thread::connect()
@@ -200,16 +199,9 @@ void PostgresPeers::Thread::connect()
     // Ends with the session, so that it is known as long as this server runs.
     if (!takePartInServing(*session))
         throw PostgresFailure(Kind::unavailable, Remedy::none, "the data are being moved");
-    auto election = std::make_unique<PostgresConnection>(m_url);
-    election->command(waitForever);
-    const std::string lock = "SELECT pg_advisory_lock(" + std::to_string(lockGroup) + ", " +
-                             std::to_string(lockOfSweeper) + ")";
-    if (PQsendQuery(election->get(), lock.c_str()) == 0)
-        throw PostgresFailure(Kind::unavailable, Remedy::reconnect, "the connection was lost");
     m_rights = std::make_unique<PostgresRights>(*session);
     m_session = std::move(session);
-    m_election = std::move(election);
-    m_nextClock = {};
+    m_nextClock = m_nextElection = {};
     m_backOff = {};
     // What was told meanwhile was told to nobody here.
     m_ears.missed();
@@ -225,7 +217,6 @@ void PostgresPeers::Thread::lose(const std::exception_ptr &error)
         m_ears.stopAllWriting();
     }
     m_rights.reset();
-    m_election.reset();
     m_session.reset();
 }
 
@@ -297,28 +288,24 @@ void PostgresPeers::Thread::hear(std::string_view message)
     }
 }
 
-/// The lock's answer comes when the server that has swept until now is gone.
-void PostgresPeers::Thread::lookAtElection()
+/// The lock ends with the session of the server that has swept until now.
+void PostgresPeers::Thread::takePartInElection()
 {
-    if (PQconsumeInput(m_election->get()) == 0)
-        throw PostgresFailure(Kind::unavailable, Remedy::reconnect,
-                              "the database ended the connection");
-    if (m_sweeps || PQisBusy(m_election->get()) != 0)
+    if (m_sweeps || Clock::now() < m_nextElection)
         return;
-    while (PGresult *result = PQgetResult(m_election->get())) {
-        if (PQresultStatus(result) == PGRES_TUPLES_OK)
-            m_sweeps = true;
-        PQclear(result);
-    }
-    if (!m_sweeps)
-        throw PostgresFailure(Kind::unavailable, Remedy::reconnect,
-                              "the sweeper's lock was refused");
-    m_ears.sweep();
+    m_nextElection = Clock::now() + electionRound;
+    PostgresRows row = m_session->query(
+        "SELECT pg_try_advisory_lock($1::bigint::int, $2::bigint::int)", lockGroup, lockOfSweeper);
+    m_sweeps = row.next() && row.integer(0) != 0;
+    if (m_sweeps)
+        m_ears.sweep();
 }
 
 int PostgresPeers::Thread::patience() const
 {
     Clock::time_point until = m_session ? m_nextClock : m_notBefore;
+    if (m_session && !m_sweeps)
+        until = std::min(until, m_nextElection);
     const auto next = m_rights ? m_rights->nextTakeOver() : std::nullopt;
     until = std::min(until, next.value_or(until));
     const auto rest = std::chrono::ceil<std::chrono::milliseconds>(until - Clock::now());
@@ -327,12 +314,9 @@ int PostgresPeers::Thread::patience() const
 
 void PostgresPeers::Thread::await()
 {
-    std::array<pollfd, 3> waits{pollfd{m_wake, POLLIN, 0}, pollfd{-1, POLLIN, 0},
-                                pollfd{-1, POLLIN, 0}};
-    if (m_session) {
+    std::array<pollfd, 2> waits{pollfd{m_wake, POLLIN, 0}, pollfd{-1, POLLIN, 0}};
+    if (m_session)
         waits[1].fd = PQsocket(m_session->get());
-        waits[2].fd = PQsocket(m_election->get());
-    }
     if (m_stopping || ::poll(waits.data(), waits.size(), patience()) <= 0)
         return;
     std::uint64_t count = 0;

@@ -161,6 +161,15 @@ class Sweeping(ClusterCase):
             deletion.wait()
         self.assertEqual(self.get(link + "/0").status, 410)
 
+    def test_servers_that_do_not_sweep_keep_no_deleted_row(self):
+        self.another()
+        self.assertEqual(self.get("/readyz").status, 200)
+        self.make_finished(b"12345")
+        self.engine.sql("CREATE EXTENSION pgstattuple; UPDATE shares SET state = state")
+        self.assertEqual(self.engine.sql("SELECT dead_tuple_count > 0 FROM pgstattuple('shares')"), "t")
+        self.engine.sql("VACUUM shares")
+        self.assertEqual(self.engine.sql("SELECT dead_tuple_count FROM pgstattuple('shares')"), "0")
+
 
 class Draining(ClusterCase):
     options = ["--drain", "5"]
