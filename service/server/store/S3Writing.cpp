@@ -5,6 +5,7 @@
 #include <boost/asio/post.hpp>
 
 #include <algorithm>
+#include <atomic>
 #include <utility>
 
 namespace pelliko::server
@@ -51,7 +52,7 @@ S3Writing::S3Writing(s3::Client &client, S3Couriers &couriers, std::string key)
 void S3Writing::write(std::uint64_t offset, std::string_view bytes)
 {
     std::unique_lock lock(m_mutex);
-    if (!m_placed || offset != m_parts.size() * s3PartSize + m_tail.size()) {
+    if (!m_placed || offset != m_parts.size() * s3PartSize + m_tail->size()) {
         lock.unlock();
         moveTo(offset);
         lock.lock();
@@ -59,13 +60,28 @@ void S3Writing::write(std::uint64_t offset, std::string_view bytes)
     while (!bytes.empty()) {
         if (m_failure)
             std::rethrow_exception(m_failure);
-        const auto count = std::min<std::size_t>(bytes.size(), s3PartSize - m_tail.size());
-        makeRoom(m_tail, m_tail.size() + count);
-        m_tail.append(bytes.substr(0, count));
+        const auto count = std::min<std::size_t>(bytes.size(), s3PartSize - m_tail->size());
+        changeTail(m_tail->size() + count).append(bytes.substr(0, count));
         bytes.remove_prefix(count);
-        if (m_tail.size() == s3PartSize)
+        if (m_tail->size() == s3PartSize)
             sendPart(lock);
     }
+}
+
+/// The tail with room for so many bytes. What others still look at stays as it is.
+std::string &S3Writing::changeTail(std::size_t room)
+{
+    if (m_tail.use_count() > 1) {
+        auto own = std::make_shared<std::string>();
+        makeRoom(*own, std::max(room, m_tail->size()));
+        own->append(*m_tail);
+        m_tail = std::move(own);
+    } else {
+        // Whoever let go of it has read it before that.
+        std::atomic_thread_fence(std::memory_order_acquire);
+        makeRoom(*m_tail, room);
+    }
+    return *m_tail;
 }
 
 void S3Writing::sendPart(std::unique_lock<std::mutex> &lock)
@@ -78,7 +94,8 @@ void S3Writing::sendPart(std::unique_lock<std::mutex> &lock)
     const std::size_t index = m_parts.size();
     m_parts.emplace_back();
     ++m_underWay;
-    auto bytes = std::make_shared<const std::string>(std::exchange(m_tail, {}));
+    const std::shared_ptr<const std::string> bytes =
+        std::exchange(m_tail, std::make_shared<std::string>());
     lock.unlock();
     m_couriers.send([self = shared_from_this(), index, bytes] { self->deliver(index, *bytes); });
     lock.lock();
@@ -153,9 +170,9 @@ void S3Writing::putTail(const Snapshot &now)
 {
     startAnew();
     const auto stored = m_stored.tails.find(now.parts);
-    if (!now.tail.empty() || now.parts == 0 || stored != m_stored.tails.end()) {
-        m_client.put(s3TailName(m_key, now.parts), now.tail);
-        m_stored.tails[now.parts] = now.tail.size();
+    if (!now.tail->empty() || now.parts == 0 || stored != m_stored.tails.end()) {
+        m_client.put(s3TailName(m_key, now.parts), *now.tail);
+        m_stored.tails[now.parts] = now.tail->size();
     }
     m_synced = now.end();
     m_tailStale = false;
@@ -183,7 +200,7 @@ void S3Writing::finish()
     if (!look().placed)
         return;
     if (now.parts == 0)
-        m_client.put(m_key, now.tail);
+        m_client.put(m_key, *now.tail);
     else
         completeParts(now);
     try {
@@ -219,9 +236,9 @@ void S3Writing::completeParts(const Snapshot &now)
         const std::lock_guard lock(m_mutex);
         parts.assign(m_parts.begin(), m_parts.begin() + static_cast<long>(now.parts));
     }
-    if (!now.tail.empty())
+    if (!now.tail->empty())
         parts.push_back(
-            m_client.putPart(m_stored.upload, static_cast<int>(now.parts) + 1, now.tail));
+            m_client.putPart(m_stored.upload, static_cast<int>(now.parts) + 1, *now.tail));
     m_client.completeUpload(m_stored.upload, parts, now.end());
 }
 
@@ -280,8 +297,8 @@ void S3Writing::moveTo(std::uint64_t offset)
     if (m_failure)
         std::rethrow_exception(m_failure);
     const std::uint64_t rest = offset - std::min(offset, m_parts.size() * s3PartSize);
-    if (m_placed && offset >= m_parts.size() * s3PartSize && rest <= m_tail.size()) {
-        m_tail.resize(rest);
+    if (m_placed && offset >= m_parts.size() * s3PartSize && rest <= m_tail->size()) {
+        changeTail(rest).resize(rest);
         m_tailStale = true;
         return;
     }
@@ -304,7 +321,7 @@ void S3Writing::place(std::uint64_t offset)
     m_synced = 0;
     const std::lock_guard lock(m_mutex);
     m_parts.clear();
-    m_tail.clear();
+    m_tail = std::make_shared<std::string>();
     m_placed = true;
 }
 
@@ -318,7 +335,8 @@ void S3Writing::goBackTo(std::uint64_t offset)
         (rest > 0 && (tail == m_stored.tails.end() || tail->second < rest)))
         throw StorageFailure(StorageFailure::Kind::lost,
                              "the store has lost bytes of the blob " + m_key);
-    std::string bytes = rest == 0 ? "" : m_client.get(s3TailName(m_key, parts), 0, rest);
+    auto bytes = std::make_shared<std::string>(
+        rest == 0 ? "" : m_client.get(s3TailName(m_key, parts), 0, rest));
     m_synced = offset;
     m_tailStale = tail != m_stored.tails.end() && tail->second > rest;
     const std::lock_guard lock(m_mutex);

@@ -59,8 +59,8 @@ private:
     struct Snapshot {
         bool placed = false;
         std::size_t parts = 0;
-        std::string tail;
-        std::uint64_t end() const { return parts * s3PartSize + tail.size(); }
+        std::shared_ptr<const std::string> tail;
+        std::uint64_t end() const { return parts * s3PartSize + tail->size(); }
     };
 
     void moveTo(std::uint64_t offset);
@@ -74,6 +74,7 @@ private:
     void sendPart(std::unique_lock<std::mutex> &lock);
     void deliver(std::size_t index, const std::string &bytes);
     void waitForParts(std::size_t count);
+    [[nodiscard]] std::string &changeTail(std::size_t room);
     Snapshot look();
     void putTail(const Snapshot &now);
     void completeParts(const Snapshot &now);
@@ -98,7 +99,8 @@ private:
     std::condition_variable m_changed;
     /// It is known where the next bytes go.
     bool m_placed = false;
-    std::string m_tail;
+    /// Whoever looks at it shares it: nobody copies megabytes for that.
+    std::shared_ptr<std::string> m_tail = std::make_shared<std::string>();
     /// Those handed over; an empty one is under way.
     std::vector<s3::Part> m_parts;
     std::size_t m_underWay = 0;

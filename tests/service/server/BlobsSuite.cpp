@@ -5,6 +5,8 @@
 
 #include <algorithm>
 #include <array>
+#include <future>
+#include <span>
 
 namespace pelliko::server
 {
@@ -18,6 +20,18 @@ std::string BlobsSuite::contentOf(Blobs &blobs, const std::string &key)
     std::array<char, 7> part;
     while (const std::size_t count = reader->read(content.size(), part))
         content.append(part.data(), count);
+    return content;
+}
+
+std::string wholeOf(Blobs &blobs, const std::string &key, std::size_t most)
+{
+    const auto reader = blobs.openForReading(key);
+    std::string content(most + 1, '\0');
+    std::size_t size = 0;
+    while (const std::size_t count =
+               reader ? reader->read(size, std::span(content).subspan(size)) : 0)
+        size += count;
+    content.resize(size);
     return content;
 }
 
@@ -55,6 +69,31 @@ TEST_P(BlobsSuite, WritingGoesOnWhereItStopped)
     writer->write(7, "orld");
     writer->sync();
     EXPECT_EQ(contentOf(*m_store, key), "hello world");
+}
+
+TEST_P(BlobsSuite, WhatIsWrittenWhileOtherBytesAreMadeDurableIsMadeSoByTheNextSync)
+{
+    // Some rounds end their writing before the first bytes leave, some while they are on their way.
+    for (int round = 0; round < 10; ++round) {
+        const std::string key = randomToken();
+        const auto writer = m_store->openForWriting(key);
+        std::string content(2UL * 1024 * 1024, 'x');
+        writer->write(0, content);
+        // The next one has nothing to ask first.
+        writer->sync();
+        writer->write(content.size(), "y");
+        content += 'y';
+        auto sync = std::async(std::launch::async, [&] { writer->sync(); });
+        for (int count = 0; count < 3000 * round; ++count) {
+            const std::string piece(100, static_cast<char>('a' + count % 26));
+            writer->write(content.size(), piece);
+            content += piece;
+        }
+        ASSERT_NO_THROW(sync.get());
+        ASSERT_NO_THROW(writer->sync());
+        const auto other = GetParam().again();
+        EXPECT_TRUE(wholeOf(*other, key, content.size()) == content) << "in round " << round;
+    }
 }
 
 TEST_P(BlobsSuite, ReadsInTheMiddle)
