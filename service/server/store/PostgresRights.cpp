@@ -41,10 +41,24 @@ bool PostgresRights::tryLock(const std::string &blob, std::int64_t &id)
     return row.integer(1) != 0;
 }
 
+void PostgresRights::unlock(std::int64_t id)
+{
+    m_db.query("SELECT pg_advisory_unlock($1)", id);
+}
+
 /// The number in the row is what counts: whoever wrote the blob before notes no offset any more.
 void PostgresRights::take(const std::string &blob, std::int64_t id, const Peers::ClaimDone &done)
 {
-    m_db.query("UPDATE blobs SET writer = $2 WHERE id = $1", id, m_number);
+    try {
+        m_db.query("UPDATE blobs SET writer = $2 WHERE id = $1", id, m_number);
+    } catch (const StorageFailure &) {
+        done({0, std::current_exception()});
+        // With a full disk as much as this is still possible: nobody is to wait for one who does
+        // not write. A session that is lost has no locks.
+        if (m_db.isAlive())
+            unlock(id);
+        throw;
+    }
     m_held[blob] = id;
     m_keys[id] = blob;
     done({m_number, nullptr});
@@ -53,15 +67,18 @@ void PostgresRights::take(const std::string &blob, std::int64_t id, const Peers:
 void PostgresRights::claim(const std::string &blob, Peers::ClaimDone done)
 {
     std::int64_t id = 0;
+    bool isOurs = false;
     try {
-        if (tryLock(blob, id)) {
-            take(blob, id, done);
-            return;
-        }
-        tell("stop", id);
+        isOurs = tryLock(blob, id);
+        if (!isOurs)
+            tell("stop", id);
     } catch (const StorageFailure &) {
         done({0, std::current_exception()});
         throw;
+    }
+    if (isOurs) {
+        take(blob, id, done);
+        return;
     }
     m_waiting.push_back({blob, id, Clock::now() + holdersPatience, std::move(done)});
 }
@@ -75,7 +92,7 @@ void PostgresRights::release(const std::string &blob)
     m_held.erase(held);
     m_keys.erase(id);
     // False for one that was taken from a stuck holder, whose lock it still is.
-    m_db.query("SELECT pg_advisory_unlock($1)", id);
+    unlock(id);
     if (m_wanted.erase(id) != 0)
         tell("free", id);
 }
@@ -121,16 +138,16 @@ void PostgresRights::takeOver()
     while (!m_waiting.empty() && m_waiting.front().until <= Clock::now()) {
         const Waiting waiting = std::move(m_waiting.front());
         m_waiting.pop_front();
+        std::int64_t id = waiting.id;
         try {
             // Gets the lock of a holder that has died meanwhile; from one that is stuck only the
             // blob itself.
-            std::int64_t id = waiting.id;
             tryLock(waiting.blob, id);
-            take(waiting.blob, id, waiting.done);
         } catch (const StorageFailure &) {
             waiting.done({0, std::current_exception()});
             throw;
         }
+        take(waiting.blob, id, waiting.done);
     }
 }
 

@@ -200,6 +200,27 @@ TEST_P(PostgresServers, AStuckServersBlobIsTakenAndItsOffsetsAreRefused)
     EXPECT_EQ(m_store->findUpload(m_account, m_share.files[0].upload, 1000)->file.offset, 8U);
 }
 
+TEST_P(PostgresServers, AClaimThatCannotBeNotedIsRefusedAndLeavesTheBlobFree)
+{
+    Server first;
+    Server second;
+    EXPECT_NE(claimNow(first), 0);
+    PostgresConnection db(postgresUrl());
+    db.command("CREATE FUNCTION refuse() RETURNS trigger LANGUAGE plpgsql AS $$ BEGIN"
+               " RAISE disk_full; END $$;"
+               "CREATE TRIGGER refused BEFORE UPDATE ON blobs EXECUTE FUNCTION refuse()");
+    auto waited = second.claim(m_blob);
+    EXPECT_TRUE(answer(waited).error) << "it was let go by the other";
+    auto direct = first.claim(m_blob);
+    EXPECT_TRUE(answer(direct).error);
+    // Ends with the statement's own time limit where a lock is left behind.
+    EXPECT_NO_THROW(db.command("DO $$ BEGIN WHILE EXISTS (SELECT FROM pg_locks WHERE objsubid = 1"
+                               " AND locktype = 'advisory') LOOP PERFORM pg_sleep(0.01);"
+                               " END LOOP; END $$"));
+    db.command("DROP TRIGGER refused ON blobs");
+    EXPECT_NE(claimNow(second), 0);
+}
+
 TEST_P(PostgresServers, AWithdrawnUploadStopsOnWhicheverServer)
 {
     Server server;
