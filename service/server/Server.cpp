@@ -61,6 +61,7 @@ struct Server::State {
           room(io, asio::steady_timer::time_point::max())
     {
         context.levels = [this] { return levels(); };
+        context.doubt = [this](const std::string &blob) { sweeper.doubt(blob); };
         for (const std::string &proxy : config.trustedProxies)
             context.proxies.push_back(normalAddress(proxy));
     }

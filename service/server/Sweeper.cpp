@@ -25,6 +25,8 @@ namespace
 
 /// After a failure of the store, which may pass.
 constexpr std::chrono::seconds retryDelay{60};
+/// While there is something that nobody but this server knows of.
+constexpr std::chrono::seconds doubtDelay{10};
 /// Of the calls that a store takes at once the sweeper uses one of so many.
 constexpr std::size_t shareOfCalls = 6;
 /// A store of millions is looked through in pieces.
@@ -67,6 +69,12 @@ void Sweeper::wake()
     m_timer.cancel();
 }
 
+void Sweeper::doubt(const std::string &blob)
+{
+    m_doubtful.insert(blob);
+    wake();
+}
+
 void Sweeper::stop()
 {
     m_stopped = true;
@@ -85,7 +93,7 @@ Task<void> Sweeper::run()
             failed = true;
         }
         if (failed && !m_stopped) {
-            m_timer.expires_after(retryDelay);
+            m_timer.expires_after(m_doubtful.empty() ? retryDelay : doubtDelay);
             co_await m_timer.async_wait(asio::as_tuple(asio::use_awaitable));
         }
     }
@@ -93,6 +101,7 @@ Task<void> Sweeper::run()
 
 Task<void> Sweeper::round()
 {
+    co_await settleDoubts();
     if (!m_context.peers.sweeps()) {
         m_timer.expires_at(std::chrono::system_clock::time_point::max());
         if (!m_woken && !m_stopped)
@@ -108,6 +117,26 @@ Task<void> Sweeper::round()
     }
     co_await sweep();
     co_await sleep();
+}
+
+/// A server that was cut off or stuck goes on writing for a while. When the blob's share has ended
+/// meanwhile, the server that sweeps has removed what was there before, and the database knows
+/// nothing of what came later.
+Task<void> Sweeper::settleDoubts()
+{
+    while (!m_doubtful.empty() && !m_stopped) {
+        // What is doubted meanwhile is doubted anew.
+        const auto blob = m_doubtful.extract(m_doubtful.begin());
+        try {
+            const bool isWanted = co_await m_context.pool.run(
+                [&] { return m_context.metadata.recordOffset(blob.value(), 0); });
+            if (!isWanted)
+                co_await m_context.blobPool.run([&] { m_context.blobs.remove(blob.value()); });
+        } catch (const std::exception &) {
+            m_doubtful.insert(blob.value());
+            throw;
+        }
+    }
 }
 
 /// Bytes that the database does not know are needed by nobody: a copy of it that was put back may

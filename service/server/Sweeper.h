@@ -5,6 +5,7 @@
 #include <boost/asio/system_timer.hpp>
 
 #include <memory>
+#include <set>
 #include <string>
 
 namespace pelliko::server
@@ -23,10 +24,14 @@ public:
 
     /// Something may have become unneeded: look again.
     void wake();
+    /// This server has put bytes of the blob into the store and does not know whether they were
+    /// still wanted: looks, whichever server sweeps, and removes them when they were not.
+    void doubt(const std::string &blob);
     void stop();
 
 private:
     Task<void> round();
+    Task<void> settleDoubts();
     Task<void> removeStrays();
     Task<void> sweep();
     struct Removal;
@@ -37,6 +42,7 @@ private:
 
     Context &m_context;
     boost::asio::system_timer m_timer;
+    std::set<std::string> m_doubtful;
     bool m_lookedForStrays = false;
     bool m_woken = false;
     bool m_stopped = false;

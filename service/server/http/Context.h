@@ -38,6 +38,8 @@ struct Context {
     std::vector<std::string> proxies{};
     /// What is true of the server now.
     std::function<Levels()> levels{};
+    /// To be told of a blob that this server has written to without knowing the end of it.
+    std::function<void(const std::string &blob)> doubt{};
     Metrics metrics{};
     AttemptLimiter registrations{limits.registrations, limits.registrationWindow};
 };

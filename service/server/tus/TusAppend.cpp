@@ -176,6 +176,9 @@ Task<std::uint64_t> appendBody(Exchange &exchange, Context &context, std::int64_
     } catch (const std::exception &) {
         failure = std::current_exception();
     }
+    // Without other servers nobody removes a blob that is being written.
+    if (failure && write->writer && write->right != 0)
+        context.doubt(write->key);
     if (failure && isFailure(failure, StorageFailure::Kind::lost))
         co_await beginAgain(context, account, upload, failure);
     if (failure)
