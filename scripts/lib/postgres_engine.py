@@ -13,6 +13,7 @@ import tempfile
 BIN = "/usr/lib/postgresql/15/bin"
 FAKETIME = "/usr/lib/x86_64-linux-gnu/faketime/libfaketime.so.1"
 PATIENCE = 60
+LONG_PATIENCE = 100  # for what others do by themselves, and again after a minute
 
 
 def unprivileged():
@@ -145,8 +146,9 @@ class PostgresEngine:
         self.start()
 
     def wait_until(self, query):
-        """Returns once the query finds something."""
+        """Returns once the query finds something; fails when it never does."""
         self.sql(f"""DO $$ BEGIN LOOP EXIT WHEN EXISTS ({query});
+            IF clock_timestamp() > now() + interval '{LONG_PATIENCE} s' THEN RAISE 'nothing was found'; END IF;
             PERFORM pg_stat_clear_snapshot(), pg_sleep(0.02); END LOOP; END $$""")
 
     def restart(self, how=signal.SIGINT):

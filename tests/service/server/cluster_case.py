@@ -105,14 +105,50 @@ class ClusterCase(ServerCase):
             time.sleep(0.2)
         self.fail("the upload does not get on")
 
+    def withdraw(self, share):
+        self.assertEqual(self.request("DELETE", "/api/v1/shares/" + share["share"]).status, 204)
+
+    # What there is, seen from outside
+
+    def stored_sizes(self):
+        """By the names that the database has for them."""
+        return {os.path.basename(path): os.path.getsize(path) for path in self.blob_files()}
+
+    def stored_contents(self):
+        contents = []
+        for path in self.blob_files():
+            with open(path, "rb") as file:
+                contents.append(file.read())
+        return contents
+
     def assert_nothing_is_left(self):
-        """After a sweep the files are those that the database knows, as long as it says."""
+        """After a sweep there is what the database knows, as long as it says, and it knows of nothing that nobody has."""
         self.engine.wait_until("SELECT WHERE NOT EXISTS (SELECT FROM blobs WHERE doomed)")
-        known = self.engine.sql("SELECT key, received FROM blobs WHERE received > 0").splitlines()
-        found = {path: os.path.getsize(path) for path in self.blob_files()}
-        self.assertEqual(sorted(f"{os.path.basename(path)}|{size}" for path, size in found.items() if size),
-                         sorted(known))
+        rows = [row.split("|") for row in self.engine.sql("SELECT key, received FROM blobs").splitlines()]
+        known = {key: int(received) for key, received in rows}
+        self.assertEqual({key: size for key, size in self.stored_sizes().items() if size or key not in known},
+                         {key: received for key, received in known.items() if received})
+        self.assertEqual(self.engine.sql("SELECT key FROM blobs b WHERE NOT EXISTS"
+                                         " (SELECT FROM files f WHERE f.blob = b.id)"), "")
+
+    def assert_nobody_has_a_right(self):
+        """To write an upload; those that end are given back in a moment."""
+        self.engine.wait_until("SELECT WHERE NOT EXISTS (SELECT FROM pg_locks WHERE locktype = 'advisory'"
+                               " AND objsubid = 1)")
+
+    def assert_stored(self, *contents):
+        """After a sweep there are exactly these contents."""
+        self.assert_nothing_is_left()
+        self.assertEqual(sorted(self.stored_contents()), sorted(contents))
 
     def assert_content(self, share, content):
         link = self.finish(share)["url"][len(self.url):]
         self.assertEqual(self.get(link + "/0").body, content)
+
+    def assert_it_comes_and_goes(self, share, content):
+        """What is missing of the share's file can be uploaded, and once it is withdrawn nothing is left of it."""
+        self.go_on(share["files"][0]["upload"], content)
+        self.assert_content(share, content)
+        self.assert_stored(content)
+        self.withdraw(share)
+        self.assert_stored()

@@ -7,7 +7,8 @@ import threading
 import time
 
 from cluster_case import MIB, ClusterCase
-from harness import read_until_closed
+from full_database import FullDatabaseCase
+from harness import read_head, read_until_closed
 from push_case import BERTA, Stream
 from watch import DELETED, Watch
 
@@ -27,10 +28,18 @@ class Restarts(ClusterCase):
         self.engine.start()
         self.assertEqual(self.when_back("GET", "/api/v1/account").json()["used_bytes"], 5)
         self.assertEqual(self.get(link + "/0").body, b"12345")
+        self.assert_shares_come_and_go(share)
+
+    def assert_shares_come_and_go(self, former):
+        """As they do where nothing was ever wrong."""
         self.make_finished(b"abc")
+        self.assert_stored(b"12345", b"abc")
+        self.withdraw(former)
+        self.assert_stored(b"abc")
+        self.assertEqual(self.engine.sql("SELECT count(*), sum(bytes) FROM usage"), "2|8")
 
     def test_a_database_that_refuses_connections_is_found_again(self):
-        self.make_finished(b"12345")
+        share, _ = self.make_finished(b"12345")
         self.engine.sql("ALTER DATABASE pelliko ALLOW_CONNECTIONS false", database="postgres")
         self.engine.sql("SELECT pg_terminate_backend(pid, 10000) FROM pg_stat_activity WHERE datname = 'pelliko'",
                         database="postgres")
@@ -38,7 +47,7 @@ class Restarts(ClusterCase):
         self.assertEqual(self.get("/readyz").status, 503)
         self.engine.sql("ALTER DATABASE pelliko ALLOW_CONNECTIONS true", database="postgres")
         self.assertEqual(self.when_back("GET", "/api/v1/account").json()["used_bytes"], 5)
-        self.make_finished(b"abc")
+        self.assert_shares_come_and_go(share)
 
     def test_a_database_that_is_silent_is_given_up_and_found_again(self):
         share, _ = self.make_finished(b"12345")
@@ -48,7 +57,7 @@ class Restarts(ClusterCase):
         finally:
             self.engine.signal_all(signal.SIGCONT)
         self.assertEqual(self.when_back("GET", "/api/v1/account").json()["used_bytes"], 5)
-        self.make_finished(b"abc")
+        self.assert_shares_come_and_go(share)
 
     def test_an_upload_goes_on_after_a_crash_of_the_database(self):
         content = os.urandom(4 * MIB)
@@ -60,8 +69,7 @@ class Restarts(ClusterCase):
         self.assertRegex(read_until_closed(connection), b"^(HTTP/1.1 (409|503) |$)")
         self.assertEqual(self.when_back("GET", "/api/v1/account").status, 200)
         self.assertGreaterEqual(self.offset(upload), told)
-        self.go_on(upload, content)
-        self.assert_content(share, content)
+        self.assert_it_comes_and_goes(share, content)
 
     def test_pushes_reach_streams_that_were_open_before_a_restart(self):
         berta = self.run_account("add", "--number", BERTA).strip()
@@ -87,19 +95,16 @@ class Restarts(ClusterCase):
             thread.join()
         self.assert_refused(answers[0], 503, "unavailable")
         self.assertEqual(self.engine.sql("SELECT count(*), max(bytes) FROM shares, usage"), "1|1")
+        self.assert_stored()
+        self.assertEqual(self.engine.sql("SELECT count(*) FROM blobs"), "1")
 
 
-class FullDatabase(ClusterCase):
-    engine_options = {"room": 6 * MIB}
-
+class FullDatabase(FullDatabaseCase):
     def test_a_full_disk_is_said_to_be_full_and_nothing_is_half_made(self):
-        place = self.engine.small_place()
-        self.engine.sql(f"CREATE TABLESPACE small LOCATION '{place}'")
-        self.engine.sql("ALTER TABLE recipients SET TABLESPACE small")
+        self.put_on_the_small_disk("recipients")
         body = {"files": [{"name": "a", "size": 1}], "recipients": [{"number": BERTA}] * 100}
         made, refused = 0, None
-        for size in (1_000_000, 100_000, 8_000):
-            self.fill(size)
+        self.fill_the_disk()
         for _ in range(60):
             answer = self.post_share(body)
             if answer.status != 201:
@@ -109,19 +114,29 @@ class FullDatabase(ClusterCase):
         self.assert_refused(refused, 507, "no_space")
         self.assertEqual(self.engine.sql("SELECT count(*) FROM shares"), str(made))
         self.assertEqual(self.request("GET", "/api/v1/account").json()["used_bytes"], made)
-        self.engine.sql("DROP TABLE filler; CHECKPOINT")
-        self.assertEqual(self.post_share(body).status, 201)
+        self.make_room()
+        share = self.post_share(body).json()
+        self.assertEqual(self.patch(share["files"][0]["upload"], 0, b"x").status, 204)
+        self.assert_stored(b"x")
+        self.withdraw(share)
+        self.assert_stored()
+        self.assertEqual(self.engine.sql("SELECT count(*) FROM blobs"), str(made))
 
-    def fill(self, size):
-        self.engine.sql("CREATE TABLE IF NOT EXISTS filler (bytes text) TABLESPACE small;"
-                        "ALTER TABLE filler ALTER bytes SET STORAGE PLAIN")
-        statement = f"INSERT INTO filler SELECT repeat('x', 7900) FROM generate_series(1, {max(1, size // 8000)})"
-        while True:
-            try:
-                self.engine.sql(statement)
-            except RuntimeError as error:
-                self.assertIn("No space left", str(error))
-                return
+    def test_an_upload_that_cannot_be_noted_keeps_its_offset_and_goes_on(self):
+        self.put_uploads_on_the_small_disk()
+        content = os.urandom(4 * MIB)
+        share = self.make_share(len(content))
+        upload = share["files"][0]["upload"]
+        connection = self.begin_upload(upload, content, 2 * MIB)
+        told = self.offset(upload)
+        self.fill_the_disk()
+        connection.sendall(content[2 * MIB:])
+        self.assertIn(b" 507 ", read_head(connection))
+        self.assert_refused(self.patch(upload, told, content[told:]), 507, "no_space")
+        self.assertEqual(self.offset(upload), told)
+        self.make_room()
+        self.assert_it_comes_and_goes(share, content)
+        self.assert_nobody_has_a_right()
 
 
 class OtherClock(ClusterCase):
@@ -139,3 +154,4 @@ class OtherClock(ClusterCase):
         now = float(self.engine.sql("SELECT extract(epoch FROM clock_timestamp())"))
         self.assertGreaterEqual(now, expires)
         self.assertEqual(self.get(link + "/0").status, 410)
+        self.assert_stored()

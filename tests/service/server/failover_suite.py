@@ -98,7 +98,8 @@ class Failover(FailoverCase):
         self.assert_content(share, content)
         self.assert_they_work_together(stream, finished)
         self.assert_the_former_one_is_left_alone(link)
-        self.assert_nothing_is_left()
+        self.withdraw(share)
+        self.assert_stored(b"1234567890", *[b"x" for _ in self.nodes])
 
     def assert_they_work_together(self, stream, finished):
         """Rights, messages and the sweeper's lock are had anew."""
@@ -166,3 +167,4 @@ class InDoubt(FailoverCase):
         self.assertEqual(share.status, 201)
         self.assertEqual(self.request("GET", "/api/v1/shares/" + share.json()["share"]).status, 200)
         self.assertEqual(self.engine.sql("SELECT count(*), sum(bytes) FROM shares, usage"), "1|7")
+        self.assert_it_comes_and_goes(share.json(), b"1234567")

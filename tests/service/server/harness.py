@@ -205,6 +205,14 @@ class ServerCase(unittest.TestCase):
         self.assertTrue(answer.json()["message"])
 
 
+def read_head(connection):
+    """The head of the answer that comes."""
+    received = b""
+    while b"\r\n\r\n" not in received and (part := connection.recv(65536)):
+        received += part
+    return received
+
+
 def read_until_closed(connection):
     """Everything the other side still sends; a reset ends it as well."""
     received = b""

@@ -61,7 +61,7 @@ class CutOff(ClusterCase):
             self.assertEqual(self.get("/readyz").status, 200)
             self.make_finished(b"12345")
         self.assertEqual(stream.next()[0], 1)
-        self.assert_nothing_is_left()
+        self.assert_stored(b"12345")
 
     def assert_swept_and_told(self, share):
         """The one that is cut off was to sweep; its lock has to end without it."""
@@ -100,3 +100,4 @@ class CutOff(ClusterCase):
             self.assertEqual(share.status, 200)
             self.assertEqual(self.request("GET", "/api/v1/account").json()["used_bytes"], 7)
         self.assertEqual(self.engine.sql("SELECT count(*), sum(bytes) FROM shares, usage"), "1|7")
+        self.assert_it_comes_and_goes(share.json(), b"1234567")

@@ -1,11 +1,13 @@
 """Several servers on one database and one S3 store."""
 
+import contextlib
 import os
 import signal
 import threading
 
-from cluster_case import ClusterCase
-from harness import read_until_closed
+from cluster_case import MIB, ClusterCase
+from full_database import FullDatabaseCase
+from harness import read_head, read_until_closed
 from partition import Partition
 from s3_suite import PART, STORE, S3Case, fetch, signed
 
@@ -17,6 +19,13 @@ class S3ClusterCase(S3Case, ClusterCase):
     def setUp(self):
         super().setUp()
         self.second = self.another()
+
+    def stored_sizes(self):
+        return {name.split(f"/{self.prefix}/", 1)[1]: size for name, size in self.object_sizes().items()}
+
+    def assert_stored(self, *contents):
+        self.assert_nothing_is_left()
+        super().assert_stored(*contents)
 
 
 class S3Cluster(S3ClusterCase):
@@ -107,6 +116,68 @@ class CutOff(S3ClusterCase):
             self.go_on(small_upload, small)
             self.assert_shared(small_share, small)
         self.assert_stored(content, small)
+
+
+class DatabaseCrash(S3ClusterCase):
+    def test_an_upload_goes_on_after_a_crash_of_the_database(self):
+        content, share, upload = self.one_file(4 * PART)
+        connection = self.begin_patch(upload, 0, content, 2 * PART + 1000)
+        self.proxy.wait_for("part", 2)
+        told = self.offset(upload)
+        self.assertEqual(told, 2 * PART + 1000)
+        self.engine.restart(signal.SIGQUIT)
+        self.assertRegex(read_until_closed(connection), b"^(HTTP/1.1 (409|503) |$)")
+        self.assertEqual(self.when_back("GET", "/api/v1/account").json()["used_bytes"], len(content))
+        self.assertGreaterEqual(self.offset(upload), told)
+        self.assert_it_comes_and_goes(share, content)
+
+
+class FullDatabase(S3ClusterCase, FullDatabaseCase):
+    def test_an_upload_that_cannot_be_noted_keeps_its_offset_and_goes_on(self):
+        self.put_uploads_on_the_small_disk()
+        content, share, upload = self.one_file(2 * PART + 5 * MIB)
+        connection = self.begin_patch(upload, 0, content, 2 * PART + 1000)
+        self.proxy.wait_for("part", 2)
+        told = self.offset(upload)
+        self.assertEqual(told, 2 * PART + 1000)
+        self.fill_the_disk()
+        connection.sendall(content[told:])
+        self.assertIn(b" 507 ", read_head(connection))
+        for node in self.nodes:
+            with self.at(node):
+                self.assert_refused(self.patch(upload, told, content[told:]), 507, "no_space")
+                self.assertEqual(self.offset(upload), told)
+        self.make_room()
+        self.assert_it_comes_and_goes(share, content)
+        self.assert_nobody_has_a_right()
+
+
+class DatabaseCutOff(S3ClusterCase):
+    """The second server reaches the database over a network that can be cut, and the store all the time."""
+
+    engine_options = {"settings": {"listen_addresses": "127.0.0.1"}}
+
+    def another(self, *more):
+        self.stores = [word.replace(self.engine.url(), self.engine.tcp_url()) for word in self.stores]
+        return super().another(*more)
+
+    def test_what_it_puts_there_after_a_withdrawal_elsewhere_is_removed(self):
+        network = Partition()
+        self.addCleanup(network.mend)
+        content, share, upload = self.one_file(3 * PART)
+        connection = self.begin_patch(upload, 0, content, MIB)
+        self.engine.wait_until("SELECT FROM blobs WHERE writer > 0")
+        network.cut(5432)
+        with self.at(self.first):
+            self.assertEqual(self.request("DELETE", "/api/v1/shares/" + share["share"]).status, 204)
+        self.engine.wait_until("SELECT WHERE NOT EXISTS (SELECT FROM blobs)")
+        # It has not noticed yet, and takes a part and something more.
+        with contextlib.suppress(ConnectionError):
+            connection.sendall(content[MIB:PART + MIB])
+            self.assertRegex(read_until_closed(connection), b"^(HTTP/1.1 (409|503) |$)")
+        network.mend()
+        self.proxy.wait_for("delete", 1)
+        self.assert_stored()
 
 
 class SlowStore(S3ClusterCase):

@@ -11,7 +11,7 @@ import threading
 import time
 import urllib.parse
 
-from harness import ServerCase
+from harness import ServerCase, read_head
 from store_proxy import StoreProxy
 
 MIB = 1024 * 1024
@@ -62,9 +62,13 @@ class S3Case(ServerCase):
 
     # The store, seen from outside
 
-    def objects(self):
+    def object_sizes(self):
         lines = s3cmd("ls", "--recursive", f"s3://{BUCKET}/{self.prefix}/").splitlines()
-        return [line.split(None, 3)[3] for line in lines]
+        words = [line.split(None, 3) for line in lines]
+        return {name: int(size) for _, _, size, name in words}
+
+    def objects(self):
+        return list(self.object_sizes())
 
     def open_uploads(self):
         lines = s3cmd("multipart", f"s3://{BUCKET}").splitlines()
@@ -326,11 +330,3 @@ class Redirects(S3Case):
         self.assertEqual(self.get(link + "/1").status, 200)
         self.assertEqual(self.get(link + "/0", Range="bytes=5-9").body, content[5:10])
         self.assertEqual(self.request("HEAD", link + "/0", token=False).headers["Content-Length"], "100000")
-
-
-def read_head(connection):
-    """The head of the answer that comes."""
-    received = b""
-    while b"\r\n\r\n" not in received and (part := connection.recv(65536)):
-        received += part
-    return received
