@@ -99,6 +99,36 @@ class Restarts(ClusterCase):
         self.assertEqual(self.engine.sql("SELECT count(*) FROM blobs"), "1")
 
 
+class LostAnswers(ClusterCase):
+    """A commit that waits for a standby is made already: a session that ends there tells nobody."""
+
+    engine_options = {"settings": {"synchronous_standby_names": "nobody", "synchronous_commit": "local"}}
+
+    def end_sessions(self, synchronous_commit):
+        """Those that come instead wait so."""
+        for statement in [f"ALTER DATABASE pelliko SET synchronous_commit = '{synchronous_commit}'",
+                          "SELECT pg_terminate_backend(pid, 10000) FROM pg_stat_activity"
+                          " WHERE application_name = 'pelliko-server'"]:
+            self.engine.sql(statement, database="postgres")
+
+    def test_what_was_done_without_an_answer_is_not_done_again(self):
+        self.end_sessions("on")
+        self.addCleanup(self.end_sessions, "local")
+        self.when_back("GET", "/api/v1/account")
+        answers = []
+        creation = {"Tus-Resumable": "1.0.0", "Upload-Length": "7"}
+        thread = threading.Thread(target=lambda: answers.append(self.request("POST", "/api/v1/uploads", headers=creation)))
+        thread.start()
+        self.engine.wait_until("SELECT FROM pg_stat_activity WHERE wait_event = 'SyncRep'")
+        self.end_sessions("local")
+        thread.join()
+        self.assertEqual(answers[0].status, 201, answers[0].body)
+        self.assertEqual(self.engine.sql("SELECT count(*), sum(bytes) FROM shares, usage"), "1|7")
+        upload = answers[0].headers["Location"]
+        self.go_on(upload, b"1234567")
+        self.assert_stored(b"1234567")
+
+
 class FullDatabase(FullDatabaseCase):
     def test_a_full_disk_is_said_to_be_full_and_nothing_is_half_made(self):
         self.put_on_the_small_disk("recipients")

@@ -4,6 +4,7 @@ import contextlib
 import os
 import signal
 import threading
+import time
 
 from cluster_case import MIB, ClusterCase
 from full_database import FullDatabaseCase
@@ -231,6 +232,7 @@ class DatabasesClock(S3ClusterCase):
         content = os.urandom(3 * PART)
         share, link = self.make_finished(content)
         expires = self.request("GET", "/api/v1/shares/" + share["share"]).json()["expires"]
+        self.assertAlmostEqual(share["created"], time.time() + 60, delta=30)
         with self.at(self.first):
             address = self.get(link + "/0").headers["Location"]
             running = self.connect()

@@ -182,26 +182,37 @@ class Faults(S3Case):
     def test_a_slow_store_holds_nobody_else_up(self):
         self.proxy.fault(1.0, "put", "part", times=40)
         share = self.make_share(*[1000] * 30)
-        answers = []
+        with self.filled(share) as statuses:
+            for _ in range(10):
+                self.assertEqual(self.get("/healthz").status, 200)
+        self.assertEqual(statuses, [204] * 30)
+
+    @contextlib.contextmanager
+    def filled(self, share):
+        """Sends all files of the share at once, 1000 bytes each; the answers' statuses are there at the end."""
+        statuses = []
 
         def send(upload):
-            answers.append(self.patch(upload, 0, bytes(1000)).status)
+            statuses.append(self.patch(upload, 0, bytes(1000)).status)
 
         senders = [threading.Thread(target=send, args=[file["upload"]]) for file in share["files"]]
         for sender in senders:
             sender.start()
-        for _ in range(10):
-            self.assertEqual(self.get("/healthz").status, 200)
+        yield statuses
         for sender in senders:
             sender.join()
-        self.assertEqual(answers, [204] * 30)
 
     def test_a_silent_store_is_given_up(self):
         content, share, upload = self.one_file(1000)
+        others = self.make_share(*[1000] * 20)
         self.proxy.fault("hold", times=1000)
         self.addCleanup(self.proxy.release)
-        for _ in range(2):
-            self.assert_refused(self.patch(upload, 0, content), 503, "unavailable")
+        self.assert_refused(self.patch(upload, 0, content), 503, "unavailable")
+        tried = self.proxy.held
+        with self.filled(others) as statuses:
+            pass
+        self.assertEqual(statuses, [503] * 20)
+        self.assertLess(self.proxy.held - tried, 30)  # each alone makes two calls, and waits for both
         self.assertEqual(self.get("/readyz").status, 503)
         self.assertEqual(self.request("GET", "/api/v1/account").status, 200)
         self.proxy.release()
