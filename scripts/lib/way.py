@@ -84,8 +84,7 @@ class Way:
     def given_up(self):
         """The sentence for a person who cancelled: the application has left and showed nothing of a share."""
         showed = any(item.get("app") == world.APP and item["event"] == "post" for item in self.panel.items)
-        left = self.application.was_here and not self.application.owner
-        return None if showed or not left else "the share was cancelled; nothing was sent"
+        return None if showed or not self.application.left else "the share was cancelled; nothing was sent"
 
     def confirm(self):
         limit = A_PERSON_DECIDES if self.person_presses else world.LIMIT

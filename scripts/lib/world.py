@@ -134,39 +134,43 @@ class Stream:
 
 
 class BusName:
-    """Whether a program is running, told by the session bus."""
+    """Whether a program is running, told by the session bus: what it announces wakes the loop, but may come late, so
+    who has the name is asked."""
 
     def __init__(self, name):
         self.name = name
-        self.owner = None
         self.known = False
         self.was_here = False
+        self.left = False
         self.watch = Gio.bus_watch_name(Gio.BusType.SESSION, name, Gio.BusNameWatcherFlags.NONE,
                                         self._appeared, self._vanished)
         wait_for(lambda: self.known, f"the bus to tell who owns {name}")
 
-    def _appeared(self, _connection, _name, owner):
-        self.known, self.owner, self.was_here = True, owner, True
+    def _appeared(self, _connection, _name, _owner):
+        self.known, self.was_here, self.left = True, True, False
 
     def _vanished(self, _connection, _name):
-        self.known, self.owner = True, None
+        self.known, self.left = True, self.was_here
+
+    def _ask_bus(self, method):
+        bus = Gio.bus_get_sync(Gio.BusType.SESSION)
+        return bus.call_sync("org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DBus", method,
+                             GLib.Variant("(s)", (self.name,)), None, Gio.DBusCallFlags.NONE, 5000).unpack()[0]
+
+    def here(self):
+        return self._ask_bus("NameHasOwner")
 
     def wait_gone(self, limit=LIMIT):
-        wait_for(lambda: self.owner is None, f"{self.name} to leave the bus", limit)
+        wait_for(lambda: not self.here(), f"{self.name} to leave the bus", limit)
 
     def wait_here(self, limit=LIMIT):
-        wait_for(lambda: self.owner is not None, f"{self.name} to come to the bus", limit)
+        wait_for(self.here, f"{self.name} to come to the bus", limit)
 
     def process_id(self):
-        bus = Gio.bus_get_sync(Gio.BusType.SESSION)
-        return bus.call_sync("org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DBus",
-                             "GetConnectionUnixProcessID", GLib.Variant("(s)", (self.name,)), None,
-                             Gio.DBusCallFlags.NONE, 5000).unpack()[0]
+        return self._ask_bus("GetConnectionUnixProcessID")
 
     def kill(self):
         """Ends the program and waits until it is gone; False when it had left, or was leaving, by itself."""
-        if self.owner is None:
-            return False
         try:
             os.kill(self.process_id(), signal.SIGKILL)
             killed = True
@@ -293,7 +297,7 @@ def requests():
 def stop_service():
     """Ends the background service; the next call starts it with the environment of then."""
     running = BusName(SERVICE)
-    if running.owner:
+    if running.here():
         os.kill(running.process_id(), signal.SIGTERM)
         running.wait_gone()
 

@@ -170,7 +170,7 @@ class Round:
             self.process = subprocess.Popen([PROGRAM], env=environment, stdin=subprocess.DEVNULL, stdout=errors, stderr=errors)
         self.ended = []
         GLib.child_watch_add(GLib.PRIORITY_DEFAULT, self.process.pid, lambda _pid, status: self.ended.append(status))
-        world.wait_for(lambda: self.ended or self.stage.application.owner, "the application to start", LIMIT)
+        world.wait_for(lambda: self.ended or self.stage.application.here(), "the application to start", LIMIT)
 
     def _end(self):
         """Ends a process that stays, as the session's end would."""
@@ -188,7 +188,7 @@ class Round:
         self.status = os.waitstatus_to_exitcode(self.ended[0])
         self.said = self.lines()
         # The service may bring up another one, which this plan has no part in.
-        world.wait_for(lambda: self._all_ended() and self.stage.application.owner is None,
+        world.wait_for(lambda: self._all_ended() and not self.stage.application.here(),
                        "the request to end and the application to be gone", LIMIT)
         self.posted = [(item.get("title") or item.get("text", ""), item.get("tag", ""))
                        for item in self.stage.panel.items[self.panel_before:]

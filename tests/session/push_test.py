@@ -41,7 +41,7 @@ class Push(share_case.ShareCase):
             Push.me = world.add_contact("Ida Example", OWN_NUMBER, joined=True)
 
     def tearDown(self):
-        if self.application.owner:
+        if self.application.here():
             os.kill(self.application.process_id(), signal.SIGTERM)
             self.application.wait_gone()
         if self.shown():

@@ -28,7 +28,7 @@ class Sim(share_case.ShareCase):
 
     def tearDown(self):
         super().tearDown()
-        if self.application.owner:
+        if self.application.here():
             os.kill(self.application.process_id(), signal.SIGTERM)
             self.application.wait_gone()
 

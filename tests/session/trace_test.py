@@ -197,7 +197,7 @@ class Trace(share_case.ShareCase):
         self.log.wait(lambda lines: any(line.endswith("> Records deleted successfully...")
                                         for line in lines[self.lines_before:]), "the row to go")
         self.assertEqual([str(other)], self.pending_rows())
-        self.assertIsNotNone(self.application.owner)
+        self.assertTrue(self.application.here())
         os.kill(self.application.process_id(), signal.SIGTERM)
         self.application.wait_gone()
 

@@ -125,7 +125,7 @@ class Requests(PickerCase):
                    "/tmp/photo.jpg", "--extra-array", f"appcontrol/data/to={self.ann}"]
         sender = subprocess.Popen([*request, "--wait-reply"], stdout=subprocess.PIPE)
         self.see("1 person is chosen. At most 10 people at once.")
-        self.application.kill()
+        self.assertTrue(self.application.kill())
         self.assertEqual(-2, json.loads(sender.communicate(timeout=world.LIMIT)[0])["result"])
         self.assertEqual([], self.pelliko.requests)
         world.run(*request)

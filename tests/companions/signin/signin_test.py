@@ -55,7 +55,7 @@ class SignInCase(unittest.TestCase):
         self.addCleanup(self.leave)
 
     def leave(self):
-        if self.application.owner:
+        if self.application.here():
             os.kill(self.application.process_id(), 9)
             self.application.wait_gone()
         if self.launcher:
