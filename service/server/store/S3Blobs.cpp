@@ -72,7 +72,8 @@ struct S3Blobs::State {
     std::shared_ptr<S3Writing> writingOf(const std::string &key);
 
     s3::Client client;
-    // Goes before the client: its threads still use that.
+    PartMemory memory;
+    // Goes before the client and the memory: its threads still use those.
     S3Couriers couriers;
     std::mutex mutex;
     /// Blobs that this process is writing.
@@ -113,7 +114,8 @@ std::size_t S3Blobs::callsAtOnce() const
 std::unique_ptr<BlobWriter> S3Blobs::openForWriting(const std::string &key)
 {
     checkKey(key);
-    auto writing = std::make_shared<S3Writing>(m_state->client, m_state->couriers, key);
+    auto writing =
+        std::make_shared<S3Writing>(m_state->client, m_state->couriers, m_state->memory, key);
     const std::lock_guard lock(m_state->mutex);
     std::erase_if(m_state->writings, [](const auto &entry) { return entry.second.expired(); });
     m_state->writings[key] = writing;
@@ -129,7 +131,7 @@ std::unique_ptr<BlobReader> S3Blobs::openForReading(const std::string &key)
     if (auto reader = S3Reader::open(m_state->client, key))
         return reader;
     // Whoever wrote it ended before it was made whole: what is there is the blob.
-    writing = std::make_shared<S3Writing>(m_state->client, m_state->couriers, key);
+    writing = std::make_shared<S3Writing>(m_state->client, m_state->couriers, m_state->memory, key);
     if (!writing->exists())
         return nullptr;
     writing->finish();

@@ -17,16 +17,6 @@ namespace
 /// this one.
 constexpr std::size_t mostUnderWay = 3;
 
-/// Small files take what they have; a part has its room at once, of which the kernel gives only the
-/// pages that are written to.
-constexpr std::size_t smallTail = 256UL * 1024;
-
-void makeRoom(std::string &tail, std::size_t size)
-{
-    if (tail.capacity() < size)
-        tail.reserve(size <= smallTail ? smallTail : s3PartSize);
-}
-
 } // namespace
 
 void S3Couriers::send(std::function<void()> work)
@@ -44,9 +34,15 @@ void S3Couriers::send(std::function<void()> work)
     });
 }
 
-S3Writing::S3Writing(s3::Client &client, S3Couriers &couriers, std::string key)
-    : m_client(client), m_couriers(couriers), m_key(std::move(key))
+S3Writing::S3Writing(s3::Client &client, S3Couriers &couriers, PartMemory &memory, std::string key)
+    : m_client(client), m_couriers(couriers), m_memory(memory), m_key(std::move(key)),
+      m_tail(noTail())
 {
+}
+
+std::shared_ptr<PartBuffer> S3Writing::noTail() const
+{
+    return std::make_shared<PartBuffer>(m_memory);
 }
 
 void S3Writing::write(std::uint64_t offset, std::string_view bytes)
@@ -68,18 +64,16 @@ void S3Writing::write(std::uint64_t offset, std::string_view bytes)
     }
 }
 
-/// The tail with room for so many bytes. What others still look at stays as it is.
-std::string &S3Writing::changeTail(std::size_t room)
+/// The tail, which may have so many bytes. What others still look at stays as it is.
+PartBuffer &S3Writing::changeTail(std::size_t size)
 {
     if (m_tail.use_count() > 1) {
-        auto own = std::make_shared<std::string>();
-        makeRoom(*own, std::max(room, m_tail->size()));
-        own->append(*m_tail);
-        m_tail = std::move(own);
+        const std::size_t kept = std::min(size, m_tail->size());
+        m_tail =
+            std::make_shared<PartBuffer>(m_memory, m_tail->view().substr(0, kept), size - kept);
     } else {
         // Whoever let go of it has read it before that.
         std::atomic_thread_fence(std::memory_order_acquire);
-        makeRoom(*m_tail, room);
     }
     return *m_tail;
 }
@@ -94,14 +88,14 @@ void S3Writing::sendPart(std::unique_lock<std::mutex> &lock)
     const std::size_t index = m_parts.size();
     m_parts.emplace_back();
     ++m_underWay;
-    const std::shared_ptr<const std::string> bytes =
-        std::exchange(m_tail, std::make_shared<std::string>());
+    const std::shared_ptr<const PartBuffer> bytes = std::exchange(m_tail, noTail());
     lock.unlock();
-    m_couriers.send([self = shared_from_this(), index, bytes] { self->deliver(index, *bytes); });
+    m_couriers.send(
+        [self = shared_from_this(), index, bytes] { self->deliver(index, bytes->view()); });
     lock.lock();
 }
 
-void S3Writing::deliver(std::size_t index, const std::string &bytes)
+void S3Writing::deliver(std::size_t index, std::string_view bytes)
 {
     s3::Part part;
     std::exception_ptr failure;
@@ -171,7 +165,7 @@ void S3Writing::putTail(const Snapshot &now)
     startAnew();
     const auto stored = m_stored.tails.find(now.parts);
     if (!now.tail->empty() || now.parts == 0 || stored != m_stored.tails.end()) {
-        m_client.put(s3TailName(m_key, now.parts), *now.tail);
+        m_client.put(s3TailName(m_key, now.parts), now.tail->view());
         m_stored.tails[now.parts] = now.tail->size();
     }
     m_synced = now.end();
@@ -200,7 +194,7 @@ void S3Writing::finish()
     if (!look().placed)
         return;
     if (now.parts == 0)
-        m_client.put(m_key, *now.tail);
+        m_client.put(m_key, now.tail->view());
     else
         completeParts(now);
     try {
@@ -238,7 +232,7 @@ void S3Writing::completeParts(const Snapshot &now)
     }
     if (!now.tail->empty())
         parts.push_back(
-            m_client.putPart(m_stored.upload, static_cast<int>(now.parts) + 1, *now.tail));
+            m_client.putPart(m_stored.upload, static_cast<int>(now.parts) + 1, now.tail->view()));
     m_client.completeUpload(m_stored.upload, parts, now.end());
 }
 
@@ -298,7 +292,7 @@ void S3Writing::moveTo(std::uint64_t offset)
         std::rethrow_exception(m_failure);
     const std::uint64_t rest = offset - std::min(offset, m_parts.size() * s3PartSize);
     if (m_placed && offset >= m_parts.size() * s3PartSize && rest <= m_tail->size()) {
-        changeTail(rest).resize(rest);
+        changeTail(rest).truncate(rest);
         m_tailStale = true;
         return;
     }
@@ -321,7 +315,7 @@ void S3Writing::place(std::uint64_t offset)
     m_synced = 0;
     const std::lock_guard lock(m_mutex);
     m_parts.clear();
-    m_tail = std::make_shared<std::string>();
+    m_tail = noTail();
     m_placed = true;
 }
 
@@ -335,8 +329,8 @@ void S3Writing::goBackTo(std::uint64_t offset)
         (rest > 0 && (tail == m_stored.tails.end() || tail->second < rest)))
         throw StorageFailure(StorageFailure::Kind::lost,
                              "the store has lost bytes of the blob " + m_key);
-    auto bytes = std::make_shared<std::string>(
-        rest == 0 ? "" : m_client.get(s3TailName(m_key, parts), 0, rest));
+    auto bytes = std::make_shared<PartBuffer>(
+        m_memory, rest == 0 ? "" : m_client.get(s3TailName(m_key, parts), 0, rest));
     m_synced = offset;
     m_tailStale = tail != m_stored.tails.end() && tail->second > rest;
     const std::lock_guard lock(m_mutex);

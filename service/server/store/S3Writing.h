@@ -1,5 +1,6 @@
 #pragma once
 
+#include "store/PartBuffer.h"
 #include "store/S3Layout.h"
 
 #include <boost/asio/thread_pool.hpp>
@@ -43,7 +44,7 @@ private:
 class S3Writing : public std::enable_shared_from_this<S3Writing>
 {
 public:
-    S3Writing(s3::Client &client, S3Couriers &couriers, std::string key);
+    S3Writing(s3::Client &client, S3Couriers &couriers, PartMemory &memory, std::string key);
 
     void write(std::uint64_t offset, std::string_view bytes);
     void truncate(std::uint64_t size);
@@ -59,7 +60,7 @@ private:
     struct Snapshot {
         bool placed = false;
         std::size_t parts = 0;
-        std::shared_ptr<const std::string> tail;
+        std::shared_ptr<const PartBuffer> tail;
         std::uint64_t end() const { return parts * s3PartSize + tail->size(); }
     };
 
@@ -72,9 +73,10 @@ private:
     void startAnew();
     s3::OpenUpload needUpload();
     void sendPart(std::unique_lock<std::mutex> &lock);
-    void deliver(std::size_t index, const std::string &bytes);
+    void deliver(std::size_t index, std::string_view bytes);
     void waitForParts(std::size_t count);
-    [[nodiscard]] std::string &changeTail(std::size_t room);
+    [[nodiscard]] std::shared_ptr<PartBuffer> noTail() const;
+    [[nodiscard]] PartBuffer &changeTail(std::size_t size);
     Snapshot look();
     void putTail(const Snapshot &now);
     void completeParts(const Snapshot &now);
@@ -82,6 +84,7 @@ private:
 
     s3::Client &m_client;
     S3Couriers &m_couriers;
+    PartMemory &m_memory;
     const std::string m_key;
 
     /// Guards what is known of the store; held while it is asked.
@@ -100,7 +103,7 @@ private:
     /// It is known where the next bytes go.
     bool m_placed = false;
     /// Whoever looks at it shares it: nobody copies megabytes for that.
-    std::shared_ptr<std::string> m_tail = std::make_shared<std::string>();
+    std::shared_ptr<PartBuffer> m_tail;
     /// Those handed over; an empty one is under way.
     std::vector<s3::Part> m_parts;
     std::size_t m_underWay = 0;

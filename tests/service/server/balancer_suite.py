@@ -10,6 +10,7 @@ import harness
 from push_case import BERTA, Stream
 from cluster_case import MIB, PostgresEngine
 from watch import MODIFIED, Watch
+import kernel_limits
 from server_cluster import PLAIN_PORT, ServerCluster, store_address
 
 PATIENCE = 60
@@ -22,6 +23,7 @@ class BalancedCase(harness.ServerCase):
 
     @classmethod
     def setUpClass(cls):
+        kernel_limits.apply()
         cls.engine = PostgresEngine()
         cls.addClassCleanup(cls.engine.close)
 
@@ -222,6 +224,11 @@ class Upgrade:
 
     def test_a_call_that_is_too_large_is_refused_in_the_servers_words(self):
         self.assert_refused(self.post_share(b" " * (MIB + 1)), 413, "too_large")
+
+    def test_the_kernel_has_the_limits_of_the_example(self):
+        limits = {file.name: value.split() for file, value in kernel_limits.advised()}
+        self.assertEqual({file.name: file.read_text(encoding="ascii").split() for file, _ in kernel_limits.advised()}, limits)
+        self.assertEqual({"tcp_rmem", "tcp_notsent_lowat"}, set(limits))
 
     def test_plain_requests_are_led_to_tls(self):
         client = harness.http.client.HTTPConnection("localhost", PLAIN_PORT, timeout=PATIENCE)
