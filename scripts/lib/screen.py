@@ -227,6 +227,18 @@ def press(label, role=None, limit=LIMIT):
     run("xdotool", "mousemove", str(x), str(y), "click", "1")
 
 
+def press_row(name, seen):
+    """Presses a row of a list until the press has led to a control with the label `seen`. A list that is laid out anew
+    between press and release, or takes the press for a long one since the machine was busy, does nothing, and a person
+    would press again."""
+    for limit in (10, 10, LIMIT):
+        wait_still(0.6)
+        press(name, "list item")
+        with contextlib.suppress(WorldError):
+            return wait_for_control(seen, limit=limit)
+    raise WorldError(f"no press of “{name}” led to “{seen}”")
+
+
 def key(name):
     run("xdotool", "key", name)
 

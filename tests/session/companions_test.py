@@ -59,8 +59,9 @@ class CompanionsCase(share_case.ShareCase):
 
     def pick(self, *people):
         """Chooses people in the picker, which then hands over to the application."""
-        for person in people:
-            self.press(self.row(person, "list item"), "list item")
+        for count, person in enumerate(people, 1):
+            chosen = "1 person is" if count == 1 else f"{count} people are"
+            screen.press_row(self.row(person, "list item"), f"{chosen} chosen. At most 10 people at once.")
         self.press("Share")
         self.companions[1].wait_gone()
 

@@ -19,6 +19,8 @@ import world  # noqa: E402
 NAMESPACE = "http://tizen.org/appcontrol/"
 TO = NAMESPACE + "data/to"
 STORE = os.path.join(os.environ["XDG_DATA_HOME"], "pelliko-platform", "contacts.db")
+ONE_CHOSEN = "1 person is chosen. At most 10 people at once."
+TWO_CHOSEN = "2 people are chosen. At most 10 people at once."
 SEARCH = "Search for a name or number"
 PICTURE = os.path.join(os.environ["PELLIKO_BUILD"], "app", "shared", "res", "com.velmora.pelliko.png")
 
@@ -57,10 +59,8 @@ class PickerCase(companion_case.CompanionCase):
     def row(self, start):
         return screen.wait_for_row(start, "list item")
 
-    def choose(self, start):
-        name = self.row(start)
-        screen.wait_still(0.6)  # a list that is laid out anew between press and release takes no press
-        self.press(name, "list item")
+    def choose(self, start, seen):
+        screen.press_row(self.row(start), seen)
 
     def type(self, text):
         screen.type_into(SEARCH, text)
@@ -84,17 +84,15 @@ class Requests(PickerCase):
                     "appcontrol/data/path=/tmp/photo.jpg", "--extra", "of_the_sender=kept")
         self.see("2 files · \u2068plan.pdf\u2069, \u2068photo.jpg\u2069")
         self.picture("start")
-        self.choose("Bo Example, +44 7700 900456, Sees it in Pelliko")
+        self.choose("Bo Example, +44 7700 900456, Sees it in Pelliko", ONE_CHOSEN)
         self.row("Chosen: \u2068Bo Example")
         self.type("albr")  # neither case nor dots matter
-        self.choose("Zoë Älbrecht, +49 151 12345678, Gets an SMS with the link")
-        self.see("2 people are chosen. At most 10 people at once.")
+        self.choose("Zoë Älbrecht, +49 151 12345678, Gets an SMS with the link", TWO_CHOSEN)
         self.picture("two")
         self.press("Remove \u2068Zoë Älbrecht\u2069")
-        self.see("1 person is chosen. At most 10 people at once.")
+        self.see(ONE_CHOSEN)
         self.type("+44 7700 900777")
-        self.choose("Send to \u2068+447700900777\u2069, Not in your contacts")
-        self.see("2 people are chosen. At most 10 people at once.")
+        self.choose("Send to \u2068+447700900777\u2069, Not in your contacts", TWO_CHOSEN)
         self.press("Share")
         request = self.pelliko.wait_request()
         self.application.wait_gone()
@@ -111,7 +109,7 @@ class Requests(PickerCase):
             sender = subprocess.Popen(["app-launch", "--app", self.program, "--operation", "appcontrol/operation/share",
                                        "--uri", "/tmp/photo.jpg", "--extra-array", f"appcontrol/data/to={self.ann}|x",
                                        "--wait-reply"], stdout=subprocess.PIPE)
-            self.see("1 person is chosen. At most 10 people at once.")  # whom the request names
+            self.see(ONE_CHOSEN)  # whom the request names
             self.press(button)
             if button == "Share":
                 self.pelliko.wait_request()
@@ -124,12 +122,12 @@ class Requests(PickerCase):
         request = ["app-launch", "--app", self.program, "--operation", "appcontrol/operation/share", "--uri",
                    "/tmp/photo.jpg", "--extra-array", f"appcontrol/data/to={self.ann}"]
         sender = subprocess.Popen([*request, "--wait-reply"], stdout=subprocess.PIPE)
-        self.see("1 person is chosen. At most 10 people at once.")
+        self.see(ONE_CHOSEN)
         self.assertTrue(self.application.kill())
         self.assertEqual(-2, json.loads(sender.communicate(timeout=world.LIMIT)[0])["result"])
         self.assertEqual([], self.pelliko.requests)
         world.run(*request)
-        self.see("1 person is chosen. At most 10 people at once.")
+        self.see(ONE_CHOSEN)
         self.press("Share")
         self.assertEqual([str(self.ann)], self.pelliko.wait_request()["extras"][TO])
 
@@ -178,7 +176,7 @@ class People(PickerCase):
             world.wait_for(lambda: screen.text_of(SEARCH) == text, "what is typed")
             screen.key("Return")
             world.wait_for(lambda: screen.text_of(SEARCH) == "", "the next search")
-        self.see("2 people are chosen. At most 10 people at once.")
+        self.see(TWO_CHOSEN)
         screen.wait_still()
         for name in ("Tab", "Tab", "Tab", "Tab", "Tab", "Return"):  # both people, the list and Cancel lie between
             screen.key(name)
@@ -187,8 +185,7 @@ class People(PickerCase):
     def test_nobody_comes_after_the_tenth(self):
         self.share_photo(*world.recipients_option(self.ten))
         self.see("10 people are chosen. At most 10 people at once.")
-        self.choose("Bo Example")
-        self.see("At most 10 people at once.")
+        self.choose("Bo Example", "At most 10 people at once.")
         self.picture("ten")
         self.press("Share")
         self.assertEqual([str(one) for one in self.ten], self.pelliko.wait_request()["extras"][TO])
@@ -224,7 +221,7 @@ class People(PickerCase):
 
     def test_it_changes_its_language_while_it_is_open(self):
         self.share_photo()
-        self.choose("Ann Example, \u2066+44 20 7946 0123\u2069 · Mobile")
+        self.choose("Ann Example, \u2066+44 20 7946 0123\u2069 · Mobile", ONE_CHOSEN)
         self.addCleanup(self.language, "en_GB.UTF-8")
         for language, title in (("de_DE.UTF-8", "Teilen mit"), ("ar", "المشاركة مع")):
             self.language(language)
