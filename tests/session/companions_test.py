@@ -67,9 +67,7 @@ class CompanionsCase(share_case.ShareCase):
 
     def _end_companions(self):
         for program in self.companions:
-            if program.here():
-                os.kill(program.process_id(), 9)
-                program.wait_gone()
+            program.kill()
 
     @staticmethod
     def press(label, role="button"):

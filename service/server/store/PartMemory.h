@@ -18,7 +18,7 @@ public:
     /// So many parts' rooms wait at most.
     static constexpr std::size_t mostKept = 16;
 
-    PartMemory() = default;
+    PartMemory() { m_kept.reserve(mostKept); }
     ~PartMemory();
     PartMemory(const PartMemory &) = delete;
     PartMemory &operator=(const PartMemory &) = delete;
@@ -40,7 +40,8 @@ private:
     void giveBack(char *room);
 
     std::mutex m_mutex;
-    /// What was used last comes first: it may still be in the processor's caches.
+    /// What was used last comes first: it may still be in the processor's caches. Never grows
+    /// beyond what was reserved: to give a room back must not fail.
     std::vector<char *> m_kept;
 };
 

@@ -55,9 +55,7 @@ class SignInCase(unittest.TestCase):
         self.addCleanup(self.leave)
 
     def leave(self):
-        if self.application.here():
-            os.kill(self.application.process_id(), 9)
-            self.application.wait_gone()
+        self.application.kill()
         if self.launcher:
             self.launcher.communicate()
         subprocess.run(["pelliko-server", "account", "remove", "--data", SERVER_DATA, "--number", NUMBER],
