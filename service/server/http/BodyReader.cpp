@@ -30,6 +30,8 @@ constexpr auto asTuple = asio::as_tuple(asio::use_awaitable);
 constexpr std::uint32_t headLimit = 16 * 1024;
 /// Room for a head and for the first bytes of a body that come with it.
 constexpr std::size_t bufferLimit = 64 * 1024;
+/// What is taken from a socket with one call.
+constexpr std::size_t takeSize = 256 * 1024;
 
 using HeadParser = http::request_parser<http::empty_body>;
 using ChunkParser = http::request_parser<http::buffer_body>;
@@ -56,6 +58,13 @@ Request requestOf(HeadParser &parser)
     if (!parser.chunked())
         request.bodyLength = parser.content_length().value_or(0);
     return request;
+}
+
+/// One for each thread, not for each body: most bodies wait for their network most of the time.
+std::span<char> takeBuffer()
+{
+    static thread_local const auto buffer = std::make_unique_for_overwrite<char[]>(takeSize);
+    return {buffer.get(), takeSize};
 }
 
 } // namespace
@@ -219,9 +228,10 @@ Task<bool> BodyReader::awaitPlainBytes()
     co_return true;
 }
 
-std::size_t BodyReader::takeNow(std::span<char> buffer, std::size_t most, const BodyTaker &take)
+std::size_t BodyReader::takeNow(std::size_t most, const BodyTaker &take)
 {
     State &state = *m_state;
+    const std::span<char> buffer = takeBuffer();
     state.mayHaveMore = true;
     std::size_t taken = 0;
     while (taken < most && state.remaining > 0) {

@@ -34,7 +34,7 @@ public:
     Task<bool> awaitPlainBytes();
     /// Gives what the socket has now to `take`, up to `most` bytes of the body, and returns how
     /// much that was. After awaitPlainBytes; may run on another thread while nothing else is asked.
-    std::size_t takeNow(std::span<char> buffer, std::size_t most, const BodyTaker &take);
+    std::size_t takeNow(std::size_t most, const BodyTaker &take);
     void interrupt();
 
     /// True once per request whose sender waits to be told that its body is wanted.

@@ -20,6 +20,7 @@
 #include <cstdio>
 #include <ctime>
 #include <utility>
+#include <vector>
 
 namespace pelliko::server
 {
@@ -34,6 +35,8 @@ constexpr auto asTuple = asio::as_tuple(asio::use_awaitable);
 constexpr std::uint64_t drainLimit = 256 * 1024;
 /// A chunk up to this goes out in one packet with its frame; copying a longer one costs more.
 constexpr std::size_t joinedChunk = 4096;
+/// Of a body that does not come straight from the socket: in chunks, or with its head.
+constexpr std::size_t otherPiece = 64 * 1024;
 /// One call of the kernel's copy; bounds how long a thread of the pool serves one download.
 constexpr std::uint64_t sendStep = 1024 * 1024;
 
@@ -56,8 +59,7 @@ public:
 
     [[nodiscard]] const Request &request() const override { return m_reader.request(); }
     Task<std::size_t> readBody(std::span<char> into) override;
-    Task<std::size_t> takeBody(std::span<char> buffer, std::size_t most,
-                               const BodyTaker &take) override;
+    Task<std::size_t> takeBody(std::size_t most, const BodyTaker &take) override;
     void interrupt() override { m_reader.interrupt(); }
     Task<void> respond(Response response) override;
     Task<void> startStream(Response head, std::optional<std::uint64_t> length) override;
@@ -218,8 +220,7 @@ Task<std::size_t> ConnectionImpl::readBody(std::span<char> into)
 
 /// Where bytes come fast, receiving and storing them on one thread saves two changes of threads for
 /// each piece.
-Task<std::size_t> ConnectionImpl::takeBody(std::span<char> buffer, std::size_t most,
-                                           const BodyTaker &take)
+Task<std::size_t> ConnectionImpl::takeBody(std::size_t most, const BodyTaker &take)
 {
     if (m_reader.peerAwaitsContinue())
         co_await sendAll("HTTP/1.1 100 Continue\r\n\r\n");
@@ -228,15 +229,16 @@ Task<std::size_t> ConnectionImpl::takeBody(std::span<char> buffer, std::size_t m
         const bool plain = co_await m_reader.awaitPlainBytes();
         if (!plain)
             break;
-        auto step = [&] { return m_reader.takeNow(buffer, most, take); };
+        auto step = [&] { return m_reader.takeNow(most, take); };
         taken = co_await m_pool.run(step);
         m_traffic.received += taken;
     }
     if (taken > 0)
         co_return taken;
-    taken = co_await m_reader.readBody(buffer);
+    std::vector<char> piece(std::min(most, otherPiece));
+    taken = co_await m_reader.readBody(piece);
     m_traffic.received += taken;
-    auto last = [&] { take({buffer.data(), taken}); };
+    auto last = [&] { take({piece.data(), taken}); };
     if (taken > 0)
         co_await m_pool.run(last);
     co_return taken;

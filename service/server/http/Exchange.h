@@ -60,10 +60,9 @@ public:
     virtual Task<std::size_t> readBody(std::span<char> into) = 0;
 
     /// Gives bytes of the body to `take`, on a thread of the pool, as long as more are there and
-    /// until `most` are taken; each piece fits `buffer`. Returns how many; 0 at the body's
-    /// end. Throws as readBody does, and what `take` throws.
-    virtual Task<std::size_t> takeBody(std::span<char> buffer, std::size_t most,
-                                       const BodyTaker &take) = 0;
+    /// until `most` are taken. Returns how many; 0 at the body's end. Throws as readBody does, and
+    /// what `take` throws.
+    virtual Task<std::size_t> takeBody(std::size_t most, const BodyTaker &take) = 0;
 
     /// Ends a running readBody or takeBody, and every later one, with Interrupted. An answer can
     /// still be sent.

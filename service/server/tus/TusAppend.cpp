@@ -10,14 +10,12 @@
 #include <cstdio>
 #include <exception>
 #include <utility>
-#include <vector>
 
 namespace pelliko::server
 {
 namespace
 {
 
-constexpr std::size_t bufferSize = 256 * 1024;
 /// How much one thread of the pool stores before others get their turn.
 constexpr std::size_t stepSize = 1024 * 1024;
 
@@ -34,7 +32,6 @@ Task<void> copyBody(Exchange &exchange, Context &context, std::shared_ptr<Active
     if (exchange.request().bodyLength == 0)
         co_return;
     co_await openWriter(context, *write);
-    std::vector<char> buffer(bufferSize);
     std::uint64_t at = write->written;
     const BodyTaker store = [&](std::string_view piece) {
         piece = piece.substr(0, write->size - at);
@@ -43,7 +40,7 @@ Task<void> copyBody(Exchange &exchange, Context &context, std::shared_ptr<Active
     };
     while (true) {
         const std::uint64_t before = at;
-        const std::size_t count = co_await exchange.takeBody(buffer, stepSize, store);
+        const std::size_t count = co_await exchange.takeBody(stepSize, store);
         if (count == 0)
             co_return;
         write->written = at;
