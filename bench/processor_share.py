@@ -28,8 +28,8 @@ class ProcessorShare:
             path, self.file, self.text, self.all = controller()
             self.group = path / f"pelliko-bench-{pid}"
             self.group.mkdir()
-        except PermissionError as error:
-            raise SystemExit(f"to limit a server's processor takes root: {error}") from None
+        except OSError as error:
+            raise SystemExit(f"a server's processor cannot be limited, which takes root and control groups: {error}") from None
         period = self.group / "cpu.cfs_period_us"
         if period.exists():
             period.write_text(str(PERIOD), encoding="ascii")
