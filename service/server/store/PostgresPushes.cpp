@@ -5,7 +5,6 @@
 
 #include <algorithm>
 #include <map>
-#include <set>
 #include <utility>
 
 namespace pelliko::server
@@ -13,29 +12,29 @@ namespace pelliko::server
 namespace
 {
 
+/// An account that is among a share's recipients.
+struct KnownRecipient {
+    std::int64_t account = 0;
+    /// Has a push for the share already. Others are made under the share's lock only.
+    bool told = false;
+};
+
 /// The accounts among the recipients by number, locked in the order of their ids: two shares that
 /// go to the same people take them one after the other.
-std::map<std::string, std::int64_t> lockRecipients(PostgresConnection &db, const ShareRecord &share)
+std::map<std::string, KnownRecipient> lockRecipients(PostgresConnection &db, const ShareRow &share)
 {
     std::vector<std::string> numbers;
-    for (const Recipient &recipient : share.recipients)
+    for (const Recipient &recipient : share.record.recipients)
         numbers.push_back(recipient.number);
-    PostgresRows rows = db.query("SELECT id, number FROM accounts WHERE number = ANY ($1)"
-                                 " ORDER BY id FOR NO KEY UPDATE",
-                                 numbers);
-    std::map<std::string, std::int64_t> accounts;
+    PostgresRows rows = db.query("SELECT a.id, a.number, EXISTS"
+                                 " (SELECT 1 FROM pushes p WHERE p.share = $2 AND p.account = a.id)"
+                                 " FROM accounts a WHERE a.number = ANY ($1)"
+                                 " ORDER BY a.id FOR NO KEY UPDATE OF a",
+                                 numbers, share.id);
+    std::map<std::string, KnownRecipient> known;
     while (rows.next())
-        accounts[rows.text(1)] = rows.integer(0);
-    return accounts;
-}
-
-std::set<std::int64_t> toldBefore(PostgresConnection &db, std::int64_t share)
-{
-    PostgresRows rows = db.query("SELECT account FROM pushes WHERE share = $1", share);
-    std::set<std::int64_t> accounts;
-    while (rows.next())
-        accounts.insert(rows.integer(0));
-    return accounts;
+        known[rows.text(1)] = {rows.integer(0), rows.integer(2) != 0};
+    return known;
 }
 
 void addPushes(PostgresConnection &db, std::int64_t share,
@@ -59,14 +58,13 @@ void addPushes(PostgresConnection &db, std::int64_t share,
 /// Sorts the share's recipients into those that get a push, which is made, and those of an SMS.
 void tellRecipients(PostgresConnection &db, const ShareRow &share, FinishResult &result)
 {
-    const auto accounts = lockRecipients(db, share.record);
-    std::set<std::int64_t> told = toldBefore(db, share.id);
+    auto known = lockRecipients(db, share);
     for (const Recipient &recipient : share.record.recipients) {
-        const auto account = accounts.find(recipient.number);
+        const auto found = known.find(recipient.number);
         std::vector<std::string> &sms = result.sms;
-        if (account != accounts.end()) {
-            if (told.insert(account->second).second)
-                result.pushed.push_back(account->second);
+        if (found != known.end()) {
+            if (!std::exchange(found->second.told, true))
+                result.pushed.push_back(found->second.account);
         } else if (std::find(sms.begin(), sms.end(), recipient.number) == sms.end()) {
             sms.push_back(recipient.number);
         }

@@ -31,14 +31,34 @@ void PostgresRights::tell(const char *word, std::int64_t id)
                std::string(word) + " " + std::to_string(id));
 }
 
-bool PostgresRights::tryLock(const std::string &blob, std::int64_t &id)
+/// In one statement, since each is a round trip of the one session that all uploads of a server
+/// share. The number in the row is what counts: whoever wrote the blob before notes no offset any
+/// more.
+bool PostgresRights::tryTake(const std::string &blob, std::int64_t &id)
 {
-    PostgresRows row =
-        m_db.query("SELECT id, pg_try_advisory_lock(id) FROM blobs WHERE key = $1", blob);
-    if (!row.next())
-        return true;
-    id = row.integer(0);
-    return row.integer(1) != 0;
+    try {
+        PostgresRows row = m_db.query(
+            "WITH wanted AS MATERIALIZED"
+            " (SELECT id, pg_try_advisory_lock(id) AS ours FROM blobs WHERE key = $1),"
+            " taken AS (UPDATE blobs b SET writer = $2 FROM wanted w WHERE b.id = w.id AND w.ours)"
+            " SELECT id, ours FROM wanted",
+            blob, m_number);
+        if (!row.next())
+            return true;
+        id = row.integer(0);
+        return row.integer(1) != 0;
+    } catch (const StorageFailure &) {
+        letGo(blob);
+        throw;
+    }
+}
+
+/// With a full disk as much as this is still possible: nobody is to wait for one who does not
+/// write. A session that is lost has no locks.
+void PostgresRights::letGo(const std::string &blob)
+{
+    if (m_db.isAlive())
+        m_db.query("SELECT pg_advisory_unlock(id) FROM blobs WHERE key = $1", blob);
 }
 
 void PostgresRights::unlock(std::int64_t id)
@@ -46,19 +66,8 @@ void PostgresRights::unlock(std::int64_t id)
     m_db.query("SELECT pg_advisory_unlock($1)", id);
 }
 
-/// The number in the row is what counts: whoever wrote the blob before notes no offset any more.
-void PostgresRights::take(const std::string &blob, std::int64_t id, const Peers::ClaimDone &done)
+void PostgresRights::hold(const std::string &blob, std::int64_t id, const Peers::ClaimDone &done)
 {
-    try {
-        m_db.query("UPDATE blobs SET writer = $2 WHERE id = $1", id, m_number);
-    } catch (const StorageFailure &) {
-        done({0, std::current_exception()});
-        // With a full disk as much as this is still possible: nobody is to wait for one who does
-        // not write. A session that is lost has no locks.
-        if (m_db.isAlive())
-            unlock(id);
-        throw;
-    }
     m_held[blob] = id;
     m_keys[id] = blob;
     done({m_number, nullptr});
@@ -69,7 +78,7 @@ void PostgresRights::claim(const std::string &blob, Peers::ClaimDone done)
     std::int64_t id = 0;
     bool isOurs = false;
     try {
-        isOurs = tryLock(blob, id);
+        isOurs = tryTake(blob, id);
         if (!isOurs)
             tell("stop", id);
     } catch (const StorageFailure &) {
@@ -77,7 +86,7 @@ void PostgresRights::claim(const std::string &blob, Peers::ClaimDone done)
         throw;
     }
     if (isOurs) {
-        take(blob, id, done);
+        hold(blob, id, done);
         return;
     }
     m_waiting.push_back({blob, id, Clock::now() + holdersPatience, std::move(done)});
@@ -104,7 +113,16 @@ void PostgresRights::freed(std::int64_t id)
         if (each->id != id)
             continue;
         std::int64_t found = id;
-        if (!tryLock(each->blob, found)) {
+        bool isOurs = false;
+        try {
+            isOurs = tryTake(each->blob, found);
+        } catch (const StorageFailure &) {
+            const Waiting waiting = std::move(*each);
+            m_waiting.erase(each);
+            waiting.done({0, std::current_exception()});
+            throw;
+        }
+        if (!isOurs) {
             // Somebody else was faster and knows nothing of this one yet.
             tell("stop", id);
             each->until = Clock::now() + holdersPatience;
@@ -113,7 +131,7 @@ void PostgresRights::freed(std::int64_t id)
         }
         const Waiting waiting = std::move(*each);
         m_waiting.erase(each);
-        take(waiting.blob, id, waiting.done);
+        hold(waiting.blob, id, waiting.done);
     }
 }
 
@@ -142,12 +160,13 @@ void PostgresRights::takeOver()
         try {
             // Gets the lock of a holder that has died meanwhile; from one that is stuck only the
             // blob itself.
-            tryLock(waiting.blob, id);
+            if (!tryTake(waiting.blob, id))
+                m_db.query("UPDATE blobs SET writer = $2 WHERE id = $1", id, m_number);
         } catch (const StorageFailure &) {
             waiting.done({0, std::current_exception()});
             throw;
         }
-        take(waiting.blob, id, waiting.done);
+        hold(waiting.blob, id, waiting.done);
     }
 }
 

@@ -48,9 +48,9 @@ private:
     };
 
     /// True when the blob is this session's now, or is not there at all.
-    bool tryLock(const std::string &blob, std::int64_t &id);
-    /// Tells what came of it, also when it throws.
-    void take(const std::string &blob, std::int64_t id, const Peers::ClaimDone &done);
+    bool tryTake(const std::string &blob, std::int64_t &id);
+    void letGo(const std::string &blob);
+    void hold(const std::string &blob, std::int64_t id, const Peers::ClaimDone &done);
     void unlock(std::int64_t id);
     void tell(const char *word, std::int64_t id);
 

@@ -139,6 +139,29 @@ Task<void> beginAgain(Context &context, std::int64_t account, std::string upload
                   {{"Upload-Offset", "0"}});
 }
 
+struct Append {
+    std::int64_t account = 0;
+    std::string upload;
+    std::shared_ptr<ActiveWrite> write;
+};
+
+Task<void> appendOrBeginAgain(Exchange &exchange, Context &context, Append append)
+{
+    std::exception_ptr failure;
+    try {
+        co_await appendHeld(exchange, context, append.write);
+    } catch (const std::exception &) {
+        failure = std::current_exception();
+    }
+    // Without other servers nobody removes a blob that is being written.
+    if (failure && append.write->writer && append.write->right != 0)
+        context.doubt(append.write->key);
+    if (failure && isFailure(failure, StorageFailure::Kind::lost))
+        co_await beginAgain(context, append.account, append.upload, failure);
+    if (failure)
+        std::rethrow_exception(failure);
+}
+
 } // namespace
 
 Task<UploadRecord> findWantedUpload(Context &context, std::int64_t account, std::string upload)
@@ -152,35 +175,28 @@ Task<UploadRecord> findWantedUpload(Context &context, std::int64_t account, std:
     co_return std::move(*found);
 }
 
-Task<std::uint64_t> appendBody(Exchange &exchange, Context &context, std::int64_t account,
-                               std::string upload)
+Task<UploadRecord> appendBody(Exchange &exchange, Context &context, std::int64_t account,
+                              std::string upload)
 {
     const std::uint64_t offset = requiredNumber(exchange.request(), "Upload-Offset");
     const UploadRecord before = co_await findWantedUpload(context, account, upload);
     const ActiveWrites::Lease lease =
         co_await context.writes.take(before.file.blob, [&exchange] { exchange.interrupt(); });
     // Read again: the former writer may have got on, or the upload may have been dropped.
-    const UploadRecord current = co_await findWantedUpload(context, account, upload);
+    UploadRecord current = co_await findWantedUpload(context, account, upload);
     if (current.file.blob != before.file.blob)
         throw Refusal(Error::conflict, "The upload was dropped meanwhile.");
     checkAppend(exchange.request(), current, offset);
-    const std::shared_ptr<ActiveWrite> &write = lease.write();
-    write->written = write->kept = offset;
-    write->size = current.file.size;
-    std::exception_ptr failure;
-    try {
-        co_await appendHeld(exchange, context, write);
-    } catch (const std::exception &) {
-        failure = std::current_exception();
-    }
-    // Without other servers nobody removes a blob that is being written.
-    if (failure && write->writer && write->right != 0)
-        context.doubt(write->key);
-    if (failure && isFailure(failure, StorageFailure::Kind::lost))
-        co_await beginAgain(context, account, upload, failure);
-    if (failure)
-        std::rethrow_exception(failure);
-    co_return write->written;
+    lease.write()->written = lease.write()->kept = offset;
+    lease.write()->size = current.file.size;
+    const Append append{account, upload, lease.write()};
+    co_await appendOrBeginAgain(exchange, context, append);
+    // That the upload was dropped meanwhile, or ended by somebody, its last note has told; its time
+    // may be over as well.
+    if (current.deadline <= context.now())
+        throw Refusal(Error::expired);
+    current.file.offset = lease.write()->written;
+    co_return std::move(current);
 }
 
 } // namespace pelliko::server

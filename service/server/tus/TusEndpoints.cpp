@@ -132,10 +132,9 @@ Task<void> showOffset(Exchange &exchange, Context &context, Account account, std
 Task<void> append(Exchange &exchange, Context &context, Account account, std::string key)
 {
     checkContentType(exchange.request());
-    const std::uint64_t offset = co_await appendBody(exchange, context, account.id, key);
-    const UploadRecord upload = co_await findWantedUpload(context, account.id, key);
-    Response response =
-        makeResponse(Status::noContent, {resumable(), {"Upload-Offset", std::to_string(offset)}});
+    const UploadRecord upload = co_await appendBody(exchange, context, account.id, key);
+    Response response = makeResponse(
+        Status::noContent, {resumable(), {"Upload-Offset", std::to_string(upload.file.offset)}});
     if (upload.state == ShareState::uploading)
         response.headers.push_back(expiryOf(upload.deadline));
     co_await exchange.respond(std::move(response));

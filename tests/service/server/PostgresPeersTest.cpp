@@ -208,7 +208,8 @@ TEST_P(PostgresServers, AClaimThatCannotBeNotedIsRefusedAndLeavesTheBlobFree)
     PostgresConnection db(postgresUrl());
     db.command("CREATE FUNCTION refuse() RETURNS trigger LANGUAGE plpgsql AS $$ BEGIN"
                " RAISE disk_full; END $$;"
-               "CREATE TRIGGER refused BEFORE UPDATE ON blobs EXECUTE FUNCTION refuse()");
+               "CREATE TRIGGER refused BEFORE UPDATE ON blobs FOR EACH ROW"
+               " EXECUTE FUNCTION refuse()");
     auto waited = second.claim(m_blob);
     EXPECT_TRUE(answer(waited).error) << "it was let go by the other";
     auto direct = first.claim(m_blob);
