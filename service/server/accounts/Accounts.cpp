@@ -35,14 +35,18 @@ std::string tokenHashOf(const Request &request)
     return sha256(tokenOf(request));
 }
 
+Account needAccount(Metadata &metadata, const std::string &tokenHash)
+{
+    std::optional<Account> account = metadata.findAccount(tokenHash);
+    if (!account)
+        refuse();
+    return std::move(*account);
+}
+
 Task<Account> authenticate(Exchange &exchange, Context &context)
 {
     const std::string hash = tokenHashOf(exchange.request());
-    std::optional<Account> account =
-        co_await context.pool.run([&] { return context.metadata.findAccount(hash); });
-    if (!account)
-        refuse();
-    co_return std::move(*account);
+    co_return co_await context.pool.run([&] { return needAccount(context.metadata, hash); });
 }
 
 Task<void> showAccount(Exchange &exchange, Context &context)

@@ -11,6 +11,9 @@ namespace pelliko::server
 /// The hash of the token that the request carries; without one that may be a token it is refused.
 [[nodiscard]] std::string tokenHashOf(const Request &request);
 
+/// The account that has the token of this hash; without one the request is refused. Blocks.
+[[nodiscard]] Account needAccount(Metadata &metadata, const std::string &tokenHash);
+
 /// The account whose token the request carries; anything else is refused.
 Task<Account> authenticate(Exchange &exchange, Context &context);
 

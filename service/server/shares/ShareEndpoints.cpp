@@ -80,13 +80,15 @@ Task<void> showShare(Exchange &exchange, Context &context, std::string key)
 
 Task<void> finishShare(Exchange &exchange, Context &context, std::string key)
 {
-    const Account account = co_await authenticate(exchange, context);
+    const std::string sender = tokenHashOf(exchange.request());
     const std::string token = randomToken();
     const std::string hash = sha256(token);
     const Seconds now = context.now();
     const Seconds deadline = now + context.limits.shareLifetime;
-    const FinishResult result = co_await context.pool.run(
-        [&] { return context.metadata.finishShare(account.id, key, hash, now, deadline); });
+    const FinishResult result = co_await context.pool.run([&] {
+        const Account account = needAccount(context.metadata, sender);
+        return context.metadata.finishShare(account.id, key, hash, now, deadline);
+    });
     switch (result.outcome) {
     case FinishResult::Outcome::missing:
         throw Refusal(Error::notFound);

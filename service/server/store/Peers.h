@@ -3,6 +3,7 @@
 #include <cstdint>
 #include <exception>
 #include <functional>
+#include <optional>
 #include <string>
 #include <utility>
 #include <vector>
@@ -34,6 +35,9 @@ public:
     struct Claimed {
         std::int64_t right = 0;
         std::exception_ptr error;
+        /// How many bytes of the blob are noted, as nobody else changes any more. Nothing for a
+        /// blob that is not wanted, and where Peers do not know.
+        std::optional<std::uint64_t> noted{};
     };
     using ClaimDone = std::function<void(const Claimed &)>;
 

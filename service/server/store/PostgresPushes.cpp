@@ -19,18 +19,23 @@ struct KnownRecipient {
     bool told = false;
 };
 
-/// The accounts among the recipients by number, locked in the order of their ids: two shares that
-/// go to the same people take them one after the other.
-std::map<std::string, KnownRecipient> lockRecipients(PostgresConnection &db, const ShareRow &share)
+/// Writes what finishing has changed, and gives the accounts among the recipients by number, locked
+/// in the order of their ids: two shares that go to the same people take them one after the other.
+std::map<std::string, KnownRecipient> noteFinish(PostgresConnection &db, const ShareRow &share,
+                                                 const std::string &linkHash)
 {
+    const ShareRecord &record = share.record;
     std::vector<std::string> numbers;
-    for (const Recipient &recipient : share.record.recipients)
+    for (const Recipient &recipient : record.recipients)
         numbers.push_back(recipient.number);
-    PostgresRows rows = db.query("SELECT a.id, a.number, EXISTS"
+    PostgresRows rows = db.query("WITH done AS (UPDATE shares SET state = $3, deadline = $4,"
+                                 " link_hash = $5 WHERE id = $2)"
+                                 " SELECT a.id, a.number, EXISTS"
                                  " (SELECT 1 FROM pushes p WHERE p.share = $2 AND p.account = a.id)"
                                  " FROM accounts a WHERE a.number = ANY ($1)"
                                  " ORDER BY a.id FOR NO KEY UPDATE OF a",
-                                 numbers, share.id);
+                                 numbers, share.id, static_cast<int>(record.state), record.deadline,
+                                 Bytes{linkHash});
     std::map<std::string, KnownRecipient> known;
     while (rows.next())
         known[rows.text(1)] = {rows.integer(0), rows.integer(2) != 0};
@@ -56,9 +61,9 @@ void addPushes(PostgresConnection &db, std::int64_t share,
 }
 
 /// Sorts the share's recipients into those that get a push, which is made, and those of an SMS.
-void tellRecipients(PostgresConnection &db, const ShareRow &share, FinishResult &result)
+void tellRecipients(PostgresConnection &db, const ShareRow &share,
+                    std::map<std::string, KnownRecipient> known, FinishResult &result)
 {
-    auto known = lockRecipients(db, share);
     for (const Recipient &recipient : share.record.recipients) {
         const auto found = known.find(recipient.number);
         std::vector<std::string> &sms = result.sms;
@@ -78,10 +83,8 @@ FinishResult finish(PostgresConnection &db, ShareRow &share, const std::string &
     ShareRecord &record = share.record;
     if (const auto refused = markFinished(record, deadline))
         return {*refused, std::move(record), {}, {}};
-    db.query("UPDATE shares SET state = $2, deadline = $3, link_hash = $4 WHERE id = $1", share.id,
-             static_cast<int>(record.state), record.deadline, Bytes{linkHash});
     FinishResult result{FinishResult::Outcome::finished, {}, {}, {}};
-    tellRecipients(db, share, result);
+    tellRecipients(db, share, noteFinish(db, share, linkHash), result);
     result.share = std::move(record);
     return result;
 }

@@ -34,19 +34,23 @@ void PostgresRights::tell(const char *word, std::int64_t id)
 /// In one statement, since each is a round trip of the one session that all uploads of a server
 /// share. The number in the row is what counts: whoever wrote the blob before notes no offset any
 /// more.
-bool PostgresRights::tryTake(const std::string &blob, std::int64_t &id)
+PostgresRights::Try PostgresRights::tryTake(const std::string &blob)
 {
     try {
         PostgresRows row = m_db.query(
             "WITH wanted AS MATERIALIZED"
             " (SELECT id, pg_try_advisory_lock(id) AS ours FROM blobs WHERE key = $1),"
-            " taken AS (UPDATE blobs b SET writer = $2 FROM wanted w WHERE b.id = w.id AND w.ours)"
-            " SELECT id, ours FROM wanted",
+            " taken AS (UPDATE blobs b SET writer = $2 FROM wanted w WHERE b.id = w.id AND w.ours"
+            " RETURNING b.id, b.received, b.doomed)"
+            " SELECT w.id, w.ours, t.received, coalesce(t.doomed, true)"
+            " FROM wanted w LEFT JOIN taken t USING (id)",
             blob, m_number);
         if (!row.next())
-            return true;
-        id = row.integer(0);
-        return row.integer(1) != 0;
+            return {};
+        Try result{row.integer(0), row.integer(1) != 0};
+        if (row.integer(3) == 0)
+            result.noted = row.size(2);
+        return result;
     } catch (const StorageFailure &) {
         letGo(blob);
         throw;
@@ -66,30 +70,29 @@ void PostgresRights::unlock(std::int64_t id)
     m_db.query("SELECT pg_advisory_unlock($1)", id);
 }
 
-void PostgresRights::hold(const std::string &blob, std::int64_t id, const Peers::ClaimDone &done)
+void PostgresRights::hold(const std::string &blob, const Try &taken, const Peers::ClaimDone &done)
 {
-    m_held[blob] = id;
-    m_keys[id] = blob;
-    done({m_number, nullptr});
+    m_held[blob] = taken.id;
+    m_keys[taken.id] = blob;
+    done({m_number, nullptr, taken.noted});
 }
 
 void PostgresRights::claim(const std::string &blob, Peers::ClaimDone done)
 {
-    std::int64_t id = 0;
-    bool isOurs = false;
+    Try result;
     try {
-        isOurs = tryTake(blob, id);
-        if (!isOurs)
-            tell("stop", id);
+        result = tryTake(blob);
+        if (!result.isOurs)
+            tell("stop", result.id);
     } catch (const StorageFailure &) {
         done({0, std::current_exception()});
         throw;
     }
-    if (isOurs) {
-        hold(blob, id, done);
+    if (result.isOurs) {
+        hold(blob, result, done);
         return;
     }
-    m_waiting.push_back({blob, id, Clock::now() + holdersPatience, std::move(done)});
+    m_waiting.push_back({blob, result.id, Clock::now() + holdersPatience, std::move(done)});
 }
 
 void PostgresRights::release(const std::string &blob)
@@ -112,17 +115,16 @@ void PostgresRights::freed(std::int64_t id)
         const auto each = at++;
         if (each->id != id)
             continue;
-        std::int64_t found = id;
-        bool isOurs = false;
+        Try result;
         try {
-            isOurs = tryTake(each->blob, found);
+            result = tryTake(each->blob);
         } catch (const StorageFailure &) {
             const Waiting waiting = std::move(*each);
             m_waiting.erase(each);
             waiting.done({0, std::current_exception()});
             throw;
         }
-        if (!isOurs) {
+        if (!result.isOurs) {
             // Somebody else was faster and knows nothing of this one yet.
             tell("stop", id);
             each->until = Clock::now() + holdersPatience;
@@ -131,7 +133,7 @@ void PostgresRights::freed(std::int64_t id)
         }
         const Waiting waiting = std::move(*each);
         m_waiting.erase(each);
-        hold(waiting.blob, id, waiting.done);
+        hold(waiting.blob, result, waiting.done);
     }
 }
 
@@ -156,17 +158,18 @@ void PostgresRights::takeOver()
     while (!m_waiting.empty() && m_waiting.front().until <= Clock::now()) {
         const Waiting waiting = std::move(m_waiting.front());
         m_waiting.pop_front();
-        std::int64_t id = waiting.id;
+        Try result;
         try {
             // Gets the lock of a holder that has died meanwhile; from one that is stuck only the
             // blob itself.
-            if (!tryTake(waiting.blob, id))
-                m_db.query("UPDATE blobs SET writer = $2 WHERE id = $1", id, m_number);
+            result = tryTake(waiting.blob);
+            if (!result.isOurs)
+                m_db.query("UPDATE blobs SET writer = $2 WHERE id = $1", result.id, m_number);
         } catch (const StorageFailure &) {
             waiting.done({0, std::current_exception()});
             throw;
         }
-        hold(waiting.blob, id, waiting.done);
+        hold(waiting.blob, result, waiting.done);
     }
 }
 

@@ -47,10 +47,17 @@ private:
         Peers::ClaimDone done;
     };
 
-    /// True when the blob is this session's now, or is not there at all.
-    bool tryTake(const std::string &blob, std::int64_t &id);
+    /// What came of trying to take a blob.
+    struct Try {
+        std::int64_t id = 0;
+        /// It is this session's now, or is not there at all.
+        bool isOurs = true;
+        std::optional<std::uint64_t> noted{};
+    };
+
+    Try tryTake(const std::string &blob);
     void letGo(const std::string &blob);
-    void hold(const std::string &blob, std::int64_t id, const Peers::ClaimDone &done);
+    void hold(const std::string &blob, const Try &taken, const Peers::ClaimDone &done);
     void unlock(std::int64_t id);
     void tell(const char *word, std::int64_t id);
 

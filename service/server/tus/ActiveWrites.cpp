@@ -65,11 +65,13 @@ Task<ActiveWrites::Lease> ActiveWrites::take(std::string key, std::function<void
     m_entries.emplace(key, entry);
     // From here on the place is given back however this ends.
     Lease lease(entry);
-    entry->write->right = co_await claim(std::move(key));
+    const Peers::Claimed claimed = co_await claim(std::move(key));
+    entry->write->right = claimed.right;
+    entry->write->noted = claimed.noted;
     co_return lease;
 }
 
-Task<std::int64_t> ActiveWrites::claim(std::string key)
+Task<Peers::Claimed> ActiveWrites::claim(std::string key)
 {
     struct Answer {
         explicit Answer(const asio::any_io_executor &executor)
@@ -92,7 +94,7 @@ Task<std::int64_t> ActiveWrites::claim(std::string key)
         co_await answer->came.async_wait(asio::as_tuple(asio::use_awaitable));
     if (answer->claimed->error)
         std::rethrow_exception(answer->claimed->error);
-    co_return answer->claimed->right;
+    co_return *answer->claimed;
 }
 
 std::shared_ptr<ActiveWrite> ActiveWrites::find(const std::string &key) const

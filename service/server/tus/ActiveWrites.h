@@ -9,6 +9,7 @@
 #include <cstdint>
 #include <functional>
 #include <memory>
+#include <optional>
 #include <string>
 #include <unordered_map>
 
@@ -28,6 +29,8 @@ struct ActiveWrite {
     std::uint64_t size = 0;
     /// What Peers gave for it, to be shown with every offset.
     std::int64_t right = 0;
+    /// What of the blob is noted, when Peers have told it with the right.
+    std::optional<std::uint64_t> noted{};
 };
 
 /// Who writes which blob right now: of this server's requests one, and of all servers one. Network
@@ -71,7 +74,7 @@ public:
     void stopAll();
 
 private:
-    [[nodiscard]] Task<std::int64_t> claim(std::string key);
+    [[nodiscard]] Task<Peers::Claimed> claim(std::string key);
 
     Peers &m_peers;
     std::unordered_map<std::string, std::shared_ptr<Lease::Entry>> m_entries;

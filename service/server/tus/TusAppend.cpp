@@ -182,8 +182,12 @@ Task<UploadRecord> appendBody(Exchange &exchange, Context &context, std::int64_t
     const UploadRecord before = co_await findWantedUpload(context, account, upload);
     const ActiveWrites::Lease lease =
         co_await context.writes.take(before.file.blob, [&exchange] { exchange.interrupt(); });
-    // Read again: the former writer may have got on, or the upload may have been dropped.
-    UploadRecord current = co_await findWantedUpload(context, account, upload);
+    // The former writer may have got on, or the upload may have been dropped.
+    UploadRecord current = before;
+    if (lease.write()->noted)
+        current.file.offset = *lease.write()->noted;
+    else
+        current = co_await findWantedUpload(context, account, upload);
     if (current.file.blob != before.file.blob)
         throw Refusal(Error::conflict, "The upload was dropped meanwhile.");
     checkAppend(exchange.request(), current, offset);

@@ -174,6 +174,36 @@ TEST_P(PostgresServers, ManyWhoWantABlobGetItOneAfterTheOther)
     EXPECT_LT(std::chrono::steady_clock::now() - start, patience);
 }
 
+TEST_P(PostgresServers, AClaimTellsWhatIsNotedOfAWantedBlob)
+{
+    Server first;
+    Server second;
+    auto fresh = first.claim(m_blob);
+    const Peers::Claimed one = answer(fresh);
+    EXPECT_EQ(one.noted, 0U);
+    m_store->recordOffset(m_blob, 8, one.right);
+    auto later = second.claim(m_blob);
+    EXPECT_EQ(answer(later).noted, 8U) << "it was let go by the other";
+    m_store->withdrawShare(m_account, m_share.key, 1000);
+    auto ended = first.claim(m_blob);
+    EXPECT_EQ(answer(ended).noted, std::nullopt);
+}
+
+TEST_P(PostgresServers, AClaimTellsWhatWasNotedWhileItWasMade)
+{
+    Server server;
+    PostgresConnection former(postgresUrl());
+    former.command("BEGIN");
+    former.query("UPDATE blobs SET received = 7 WHERE key = $1", m_blob);
+    auto claimed = server.claim(m_blob);
+    PostgresConnection watcher(postgresUrl());
+    EXPECT_NO_THROW(watcher.command("DO $$ BEGIN WHILE NOT EXISTS (SELECT FROM pg_locks"
+                                    " WHERE NOT granted) LOOP PERFORM pg_sleep(0.01);"
+                                    " END LOOP; END $$"));
+    former.command("COMMIT");
+    EXPECT_EQ(answer(claimed).noted, 7U);
+}
+
 TEST_P(PostgresServers, ADeadServersBlobsAreFree)
 {
     Server first;
