@@ -35,8 +35,8 @@ public:
     struct Claimed {
         std::int64_t right = 0;
         std::exception_ptr error;
-        /// How many bytes of the blob are noted, as nobody else changes any more. Nothing for a
-        /// blob that is not wanted, and where Peers do not know.
+        /// How many bytes of the blob are noted, which only its new writer changes from here on.
+        /// Nothing for a blob that is not wanted, and where Peers do not know.
         std::optional<std::uint64_t> noted{};
     };
     using ClaimDone = std::function<void(const Claimed &)>;

@@ -22,12 +22,14 @@ struct Before {
 /// Both in one statement: a share is made in few round trips. After lockAccount.
 Before lookBefore(PostgresConnection &db, const NewShare &share)
 {
+    // What is shared again counts no bytes.
+    const Seconds since = share.reshareOf ? share.now : share.now - share.limitWindow;
     PostgresRows rows =
         db.query("SELECT 0 AS kind, id AS at, 0 AS bytes FROM shares"
                  " WHERE account = $1 AND idempotency_key = $2"
                  " UNION ALL SELECT 1, at, bytes FROM usage WHERE account = $1 AND at > $3"
                  " ORDER BY kind, at",
-                 share.account, share.idempotencyKey, share.now - share.limitWindow);
+                 share.account, share.idempotencyKey, since);
     Before before;
     while (rows.next()) {
         if (rows.integer(0) == 0)
