@@ -4,10 +4,12 @@ The person is played from outside of the world, with a keyboard and a pointer on
 """
 
 import os
+import queue
 import re
 import subprocess
 import sys
 import tempfile
+import threading
 import unittest
 
 HERE = os.path.dirname(os.path.abspath(__file__))
@@ -18,6 +20,7 @@ CODE_FIELD = ("240", "489")
 SIGN_IN = ("356", "609")
 SHARE = ("360", "756")  # the right one of the two buttons at the lower edge of a screen of 480x800
 CANCEL = ("120", "756")
+PATIENCE = 30  # seconds until a person who sees that nothing happens tries again
 
 
 class Desktop:
@@ -26,7 +29,8 @@ class Desktop:
     def __init__(self):
         read, write = os.pipe()
         self.server = subprocess.Popen(["Xvfb", "-displayfd", str(write), "-screen", "0", "480x800x24", "-nolisten", "tcp",
-                                        "-noreset"], pass_fds=[write], stderr=subprocess.DEVNULL)
+                                        # A finger on a key does not stay there because the machine is busy.
+                                        "-noreset", "-r"], pass_fds=[write], stderr=subprocess.DEVNULL)
         os.close(write)
         with os.fdopen(read) as numbers:
             self.environment = {**os.environ, "DISPLAY": f":{numbers.readline().strip()}"}
@@ -49,6 +53,13 @@ class Desktop:
     def type(self, text):
         self.do("type", "--delay", "20", "--", text)
 
+    def picture(self):
+        """Of the display as it is now; returns where it is."""
+        path = os.path.join(BUILD, "seen", "person.png")
+        os.makedirs(os.path.dirname(path), exist_ok=True)
+        subprocess.run(["import", "-window", "root", path], env=self.environment, check=True)
+        return path
+
     def close(self):
         for process in (self.manager, self.server):
             process.terminate()
@@ -67,46 +78,67 @@ class Person(unittest.TestCase):
              "/usr/bin/python3", "-u", os.path.join(TOP, "scripts", "main-job"), "--pictures", pictures.name],
             env=self.desktop.environment, stdout=subprocess.PIPE, stderr=subprocess.STDOUT, text=True)
         self.said = ""
+        self.lines = queue.Queue()
+        self.listener = threading.Thread(target=self.listen)
+        self.listener.start()
         self.addCleanup(self.end)
 
+    def listen(self):
+        for line in self.run.stdout:
+            self.lines.put(line)
+        self.lines.put("")
+
     def end(self):
-        self.run.stdout.close()
         self.run.kill()
         self.run.wait()
+        self.listener.join()
+        self.run.stdout.close()
 
-    def until(self, pattern):
-        """Reads what is printed until it matches."""
+    def until(self, pattern, seconds=None):
+        """Reads what is printed until it matches; None when nothing is printed for so many seconds."""
         while not (found := re.search(pattern, self.said)):
-            line = self.run.stdout.readline()
+            try:
+                line = self.lines.get(timeout=seconds)
+            except queue.Empty:
+                return None
             self.assertTrue(line, f"it ended without “{pattern}”:\n{self.said}")
             self.said += line
         return found
 
+    def act_until(self, act, pattern):
+        """Does something that has this printed; again where it seems to have had no effect."""
+        for _ in range(3):
+            act()
+            if self.until(pattern, PATIENCE):
+                return
+        self.fail(f"“{pattern}” was not printed; {self.desktop.picture()} shows why:\n{self.said}")
+
+    def fill(self, field, text):
+        self.desktop.press(field)
+        self.desktop.do("key", "ctrl+a", "key", "BackSpace")
+        self.desktop.type(text)
+
     def sign_in(self):
         number, code = self.until(r"Number (\+\d+), invitation code (\S+)").groups()
         self.until(r"The sign-in is open")
-        self.desktop.press(NUMBER_FIELD)
-        self.desktop.do("key", "ctrl+a", "key", "BackSpace")
-        self.desktop.type(number)
-        self.desktop.press(CODE_FIELD)
-        self.desktop.type(code)
-        self.desktop.press(SIGN_IN)
+
+        def enter():
+            self.fill(NUMBER_FIELD, number)
+            self.fill(CODE_FIELD, code)
+            self.desktop.press(SIGN_IN)
+
+        self.act_until(enter, r"press Share")
 
     def test_the_person_signs_in_shares_and_saves(self):
         self.sign_in()
-        self.until(r"press Share")
-        self.desktop.press(SHARE)
-        self.until(r"Files sent")
+        self.act_until(lambda: self.desktop.press(SHARE), r"Files sent")
         self.until(r"press Save all")
-        self.desktop.do("key", "Return")
-        self.until(r"All of it held")
+        self.act_until(lambda: self.desktop.do("key", "Return"), r"All of it held")
         self.assertEqual(0, self.run.wait())
 
     def test_who_cancels_is_told_that_nothing_was_sent(self):
         self.sign_in()
-        self.until(r"press Share")
-        self.desktop.press(CANCEL)
-        self.until(r"the share was cancelled; nothing was sent")
+        self.act_until(lambda: self.desktop.press(CANCEL), r"the share was cancelled; nothing was sent")
         self.assertEqual(1, self.run.wait())
 
 
