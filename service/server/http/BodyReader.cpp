@@ -228,31 +228,63 @@ Task<bool> BodyReader::awaitPlainBytes()
     co_return true;
 }
 
-std::size_t BodyReader::takeNow(std::size_t most, const BodyTaker &take)
+/// Returns 0 when the socket has nothing now, and when the peer is gone: then it may have more.
+std::size_t BodyReader::receiveNow(std::span<char> into)
+{
+    State &state = *m_state;
+    const auto wanted =
+        static_cast<std::size_t>(std::min<std::uint64_t>(state.remaining, into.size()));
+    ssize_t count = -1;
+    do
+        count = ::recv(state.socket.native_handle(), into.data(), wanted, MSG_DONTWAIT);
+    while (count < 0 && errno == EINTR);
+    const bool failed = count == 0 || (count < 0 && errno != EAGAIN);
+    const auto received = static_cast<std::size_t>(std::max<ssize_t>(count, 0));
+    // Less than what was asked for is all that there was.
+    state.mayHaveMore = failed || received == wanted;
+    state.remaining -= received;
+    return received;
+}
+
+std::size_t BodyReader::takeNow(std::size_t most, BodySink &sink)
 {
     State &state = *m_state;
     const std::span<char> buffer = takeBuffer();
     state.mayHaveMore = true;
     std::size_t taken = 0;
-    while (taken < most && state.remaining > 0) {
-        const auto wanted =
-            std::min({state.remaining, std::uint64_t{buffer.size()}, std::uint64_t{most - taken}});
-        const ssize_t count =
-            ::recv(state.socket.native_handle(), buffer.data(), wanted, MSG_DONTWAIT);
-        if (count < 0 && errno == EINTR)
-            continue;
-        if (count < 0 && errno == EAGAIN)
-            state.mayHaveMore = false;
-        if (count <= 0) {
-            if (state.mayHaveMore && taken == 0)
-                throw Disconnected();
+    while (taken < most && state.remaining > 0 && state.mayHaveMore) {
+        const std::size_t count = receiveNow(buffer.first(std::min(buffer.size(), most - taken)));
+        if (count == 0 && state.mayHaveMore && taken == 0)
+            throw Disconnected();
+        if (count == 0)
             break;
-        }
-        state.remaining -= static_cast<std::uint64_t>(count);
-        taken += static_cast<std::size_t>(count);
-        take({buffer.data(), static_cast<std::size_t>(count)});
+        taken += count;
+        sink.take({buffer.data(), count});
     }
     return taken;
+}
+
+std::optional<std::size_t> BodyReader::fillNow(std::size_t most, BodySink &sink)
+{
+    State &state = *m_state;
+    state.mayHaveMore = true;
+    std::size_t filled = 0;
+    const BodySink::Filler fill = [&](std::span<char> room) {
+        return receiveNow(room.first(std::min(room.size(), most - filled)));
+    };
+    while (filled < most && state.remaining > 0 && state.mayHaveMore) {
+        const std::optional<std::size_t> count = sink.fillNow(fill);
+        if (!count && filled == 0)
+            return std::nullopt;
+        if (count == 0 && state.mayHaveMore && filled == 0)
+            throw Disconnected();
+        if (!count || count == 0)
+            break;
+        filled += *count;
+    }
+    // What else there is has to wait until others had their turn on this thread.
+    state.mayHaveMore = false;
+    return filled;
 }
 
 Task<std::size_t> BodyReader::readChunked(std::span<char> into)

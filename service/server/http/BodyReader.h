@@ -32,9 +32,12 @@ public:
     /// Waits until the socket has bytes of the body; false when they have to be read with readBody,
     /// or when there are none left.
     Task<bool> awaitPlainBytes();
-    /// Gives what the socket has now to `take`, up to `most` bytes of the body, and returns how
+    /// Has `sink` take what the socket has now, up to `most` bytes of the body, and returns how
     /// much that was. After awaitPlainBytes; may run on another thread while nothing else is asked.
-    std::size_t takeNow(std::size_t most, const BodyTaker &take);
+    std::size_t takeNow(std::size_t most, BodySink &sink);
+    /// Receives what the socket has now where `sink` wants to have it, up to `most` bytes, and
+    /// returns how much that was; nothing when `sink` has to take it. After awaitPlainBytes.
+    std::optional<std::size_t> fillNow(std::size_t most, BodySink &sink);
     void interrupt();
 
     /// True once per request whose sender waits to be told that its body is wanted.
@@ -50,6 +53,7 @@ private:
     struct State;
     Task<std::size_t> readPlain(std::span<char> into);
     Task<std::size_t> readChunked(std::span<char> into);
+    [[nodiscard]] std::size_t receiveNow(std::span<char> into);
 
     std::unique_ptr<State> m_state;
 };

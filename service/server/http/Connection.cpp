@@ -59,7 +59,7 @@ public:
 
     [[nodiscard]] const Request &request() const override { return m_reader.request(); }
     Task<std::size_t> readBody(std::span<char> into) override;
-    Task<std::size_t> takeBody(std::size_t most, const BodyTaker &take) override;
+    Task<std::size_t> takeBody(std::size_t most, BodySink &sink) override;
     void interrupt() override { m_reader.interrupt(); }
     Task<void> respond(Response response) override;
     Task<void> startStream(Response head, std::optional<std::uint64_t> length) override;
@@ -219,8 +219,8 @@ Task<std::size_t> ConnectionImpl::readBody(std::span<char> into)
 }
 
 /// Where bytes come fast, receiving and storing them on one thread saves two changes of threads for
-/// each piece.
-Task<std::size_t> ConnectionImpl::takeBody(std::size_t most, const BodyTaker &take)
+/// each piece; where they only have to be put somewhere, it is this one.
+Task<std::size_t> ConnectionImpl::takeBody(std::size_t most, BodySink &sink)
 {
     if (m_reader.peerAwaitsContinue())
         co_await sendAll("HTTP/1.1 100 Continue\r\n\r\n");
@@ -229,8 +229,12 @@ Task<std::size_t> ConnectionImpl::takeBody(std::size_t most, const BodyTaker &ta
         const bool plain = co_await m_reader.awaitPlainBytes();
         if (!plain)
             break;
-        auto step = [&] { return m_reader.takeNow(most, take); };
-        taken = co_await m_pool.run(step);
+        const std::optional<std::size_t> filled = m_reader.fillNow(most, sink);
+        auto step = [&] { return m_reader.takeNow(most, sink); };
+        if (filled)
+            taken = *filled;
+        else
+            taken = co_await m_pool.run(step);
         m_traffic.received += taken;
     }
     if (taken > 0)
@@ -238,7 +242,7 @@ Task<std::size_t> ConnectionImpl::takeBody(std::size_t most, const BodyTaker &ta
     std::vector<char> piece(std::min(most, otherPiece));
     taken = co_await m_reader.readBody(piece);
     m_traffic.received += taken;
-    auto last = [&] { take({piece.data(), taken}); };
+    auto last = [&] { sink.take({piece.data(), taken}); };
     if (taken > 0)
         co_await m_pool.run(last);
     co_return taken;

@@ -35,8 +35,23 @@ public:
     [[nodiscard]] const char *what() const noexcept override { return "interrupted"; }
 };
 
-/// Takes a piece of a body, which is gone after the call.
-using BodyTaker = std::function<void(std::string_view piece)>;
+/// Where the bytes of a body go.
+class BodySink
+{
+public:
+    /// Puts bytes at the beginning of a room and returns how many; 0 when there are none now.
+    using Filler = std::function<std::size_t(std::span<char> room)>;
+
+    virtual ~BodySink() = default;
+
+    /// Takes a piece, which is gone after the call. On a thread of the pool; may wait.
+    virtual void take(std::string_view piece) = 0;
+
+    /// Has `fill` put the next bytes where they are to stay, and returns how many it was; nothing,
+    /// and `fill` is not called, where the next bytes have to be taken. On the network thread; does
+    /// not wait. Throws what `fill` throws.
+    virtual std::optional<std::size_t> fillNow(const Filler & /*fill*/) { return std::nullopt; }
+};
 
 /// What went over the wire for one request so far.
 struct Traffic {
@@ -59,10 +74,9 @@ public:
     /// Throws Disconnected or Interrupted.
     virtual Task<std::size_t> readBody(std::span<char> into) = 0;
 
-    /// Gives bytes of the body to `take`, on a thread of the pool, as long as more are there and
-    /// until `most` are taken. Returns how many; 0 at the body's end. Throws as readBody does, and
-    /// what `take` throws.
-    virtual Task<std::size_t> takeBody(std::size_t most, const BodyTaker &take) = 0;
+    /// Gives bytes of the body to `sink` as long as more are there and until it has `most`. Returns
+    /// how many; 0 at the body's end. Throws as readBody does, and what `sink` throws.
+    virtual Task<std::size_t> takeBody(std::size_t most, BodySink &sink) = 0;
 
     /// Ends a running readBody or takeBody, and every later one, with Interrupted. An answer can
     /// still be sent.

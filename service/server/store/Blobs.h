@@ -4,6 +4,7 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <functional>
 #include <memory>
 #include <optional>
 #include <span>
@@ -23,6 +24,17 @@ public:
     /// Writes all of `bytes` at `offset`, which is at most the end of what is stored. What stood
     /// behind them may stay or go.
     virtual void write(std::uint64_t offset, std::string_view bytes) = 0;
+
+    /// Puts bytes at the beginning of a room and returns how many.
+    using Filler = std::function<std::size_t(std::span<char> room)>;
+
+    /// A write of what `fill` puts into the store's own memory, which spares a copy: returns how
+    /// much that was; nothing, and `fill` is not called, where bytes have to be given to `write`.
+    /// Does not wait for the store. Throws std::bad_alloc, and what `fill` throws.
+    virtual std::optional<std::size_t> fill(std::uint64_t /*offset*/, const Filler & /*fill*/)
+    {
+        return std::nullopt;
+    }
 
     /// Drops the bytes from `size` on and gives their space back.
     virtual void truncate(std::uint64_t size) = 0;

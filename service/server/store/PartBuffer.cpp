@@ -2,6 +2,7 @@
 
 #include "store/S3Layout.h"
 
+#include <algorithm>
 #include <cstdlib>
 #include <cstring>
 #include <new>
@@ -51,6 +52,16 @@ void PartBuffer::append(std::string_view bytes)
     makeRoom(m_size + bytes.size());
     std::memcpy(m_bytes.get() + m_size, bytes.data(), bytes.size());
     m_size += bytes.size();
+}
+
+std::size_t PartBuffer::fill(std::size_t most,
+                             const std::function<std::size_t(std::span<char>)> &put)
+{
+    if (m_size == m_room)
+        makeRoom(m_size + 1);
+    const std::size_t count = put({m_bytes.get() + m_size, std::min(most, m_room - m_size)});
+    m_size += count;
+    return count;
 }
 
 } // namespace pelliko::server

@@ -3,6 +3,8 @@
 #include "store/PartMemory.h"
 
 #include <cstddef>
+#include <functional>
+#include <span>
 #include <string_view>
 
 namespace pelliko::server
@@ -20,6 +22,9 @@ public:
 
     /// Must not make it longer than a part.
     void append(std::string_view bytes);
+    /// Appends what `put` puts into the room it is given, of up to `most` bytes, and returns how
+    /// much that was. Must not make it longer than a part. Throws what `put` throws.
+    std::size_t fill(std::size_t most, const std::function<std::size_t(std::span<char>)> &put);
     /// Keeps the first `size` bytes, of which there must be so many.
     void truncate(std::size_t size) { m_size = size; }
 

@@ -39,6 +39,10 @@ public:
     {
         m_writing->write(offset, bytes);
     }
+    std::optional<std::size_t> fill(std::uint64_t offset, const Filler &fill) override
+    {
+        return m_writing->fill(offset, fill);
+    }
     void truncate(std::uint64_t size) override { m_writing->truncate(size); }
     void sync() override { m_writing->sync(); }
     std::uint64_t settle(std::uint64_t) override { return m_writing->settle(); }

@@ -16,6 +16,8 @@ namespace
 /// Of one writer, beside the part that fills up: the next ones are sent while the store works on
 /// this one.
 constexpr std::size_t mostUnderWay = 3;
+/// The end of a part is written, not filled, since to send the part may have to wait.
+constexpr std::size_t writtenEnd = 64UL * 1024;
 
 } // namespace
 
@@ -62,6 +64,17 @@ void S3Writing::write(std::uint64_t offset, std::string_view bytes)
         if (m_tail->size() == s3PartSize)
             sendPart(lock);
     }
+}
+
+std::optional<std::size_t> S3Writing::fill(std::uint64_t offset, const BlobWriter::Filler &fill)
+{
+    const std::lock_guard lock(m_mutex);
+    const std::size_t size = m_tail->size();
+    // A tail that others look at would have to be copied.
+    if (!m_placed || m_failure || offset != m_parts.size() * s3PartSize + size ||
+        size + writtenEnd >= s3PartSize || m_tail.use_count() > 1)
+        return std::nullopt;
+    return changeTail(size).fill(s3PartSize - writtenEnd - size, fill);
 }
 
 /// The tail, which may have so many bytes. What others still look at stays as it is.

@@ -1,5 +1,6 @@
 #pragma once
 
+#include "store/Blobs.h"
 #include "store/PartBuffer.h"
 #include "store/S3Layout.h"
 
@@ -11,6 +12,7 @@
 #include <functional>
 #include <memory>
 #include <mutex>
+#include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -47,6 +49,7 @@ public:
     S3Writing(s3::Client &client, S3Couriers &couriers, PartMemory &memory, std::string key);
 
     void write(std::uint64_t offset, std::string_view bytes);
+    std::optional<std::size_t> fill(std::uint64_t offset, const BlobWriter::Filler &fill);
     void truncate(std::uint64_t size);
     void sync();
     std::uint64_t settle();

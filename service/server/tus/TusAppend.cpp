@@ -25,26 +25,54 @@ Task<void> openWriter(Context &context, ActiveWrite &write)
         [&]() -> std::shared_ptr<BlobWriter> { return context.blobs.openForWriting(write.key); });
 }
 
-/// Copies the body into the blob, up to the end of the file.
+/// Stores a body up to the end of the file; what comes behind that is counted only.
+class BlobSink final : public BodySink
+{
+public:
+    explicit BlobSink(ActiveWrite &write) : m_write(write), m_at(write.written) {}
+
+    void take(std::string_view piece) override
+    {
+        piece = piece.substr(0, rest());
+        m_write.writer->write(m_at, piece);
+        m_at += piece.size();
+    }
+
+    std::optional<std::size_t> fillNow(const Filler &fill) override
+    {
+        if (rest() == 0)
+            return std::nullopt;
+        const auto filled = m_write.writer->fill(m_at, [&](std::span<char> room) {
+            return fill(room.first(std::min(room.size(), rest())));
+        });
+        m_at += filled.value_or(0);
+        return filled;
+    }
+
+    /// Where the next byte belongs.
+    [[nodiscard]] std::uint64_t at() const { return m_at; }
+
+private:
+    [[nodiscard]] std::size_t rest() const { return m_write.size - m_at; }
+
+    ActiveWrite &m_write;
+    std::uint64_t m_at;
+};
+
+/// Copies the body into the blob.
 Task<void> copyBody(Exchange &exchange, Context &context, std::shared_ptr<ActiveWrite> write,
                     Checkpoints &checkpoints)
 {
     if (exchange.request().bodyLength == 0)
         co_return;
     co_await openWriter(context, *write);
-    std::uint64_t at = write->written;
-    const BodyTaker store = [&](std::string_view piece) {
-        piece = piece.substr(0, write->size - at);
-        write->writer->write(at, piece);
-        at += piece.size();
-    };
+    BlobSink sink(*write);
     while (true) {
-        const std::uint64_t before = at;
-        const std::size_t count = co_await exchange.takeBody(stepSize, store);
+        const std::size_t count = co_await exchange.takeBody(stepSize, sink);
         if (count == 0)
             co_return;
-        write->written = at;
-        if (at - before < count)
+        const std::uint64_t before = std::exchange(write->written, sink.at());
+        if (write->written - before < count)
             throw Refusal(Error::tooLarge, "The upload is longer than announced.");
         co_await checkpoints.advance();
     }

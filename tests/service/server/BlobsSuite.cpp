@@ -7,6 +7,7 @@
 #include <array>
 #include <future>
 #include <span>
+#include <stdexcept>
 
 namespace pelliko::server
 {
@@ -94,6 +95,84 @@ TEST_P(BlobsSuite, WhatIsWrittenWhileOtherBytesAreMadeDurableIsMadeSoByTheNextSy
         const auto other = GetParam().again();
         EXPECT_TRUE(wholeOf(*other, key, content.size()) == content) << "in round " << round;
     }
+}
+
+/// Has the store take the next bytes where it wants them, up to `most`, or gives them to it.
+std::size_t putSome(BlobWriter &writer, std::string_view content, std::uint64_t at,
+                    std::size_t most)
+{
+    const std::string_view next = content.substr(at, most);
+    const auto filled =
+        writer.fill(at, [&](std::span<char> room) { return next.copy(room.data(), room.size()); });
+    if (filled)
+        return *filled;
+    writer.write(at, next);
+    return next.size();
+}
+
+TEST_P(BlobsSuite, WhatIsFilledInStandsBesideWhatIsWritten)
+{
+    std::string content;
+    while (content.size() < 20UL * 1024 * 1024)
+        content += randomToken();
+    const std::string key = randomToken();
+    const auto writer = m_store->openForWriting(key);
+    std::size_t at = 0;
+    for (int step = 0; at < content.size(); ++step) {
+        if (step % 5 == 4) {
+            const auto piece = std::string_view(content).substr(at, 70001);
+            writer->write(at, piece);
+            at += piece.size();
+        } else {
+            at += putSome(*writer, content, at, 200000);
+        }
+    }
+    writer->finish();
+    EXPECT_TRUE(wholeOf(*GetParam().again(), key, content.size()) == content);
+}
+
+TEST_P(BlobsSuite, WhatIsFilledInWhileOtherBytesAreMadeDurableIsMadeSoByTheNextSync)
+{
+    for (int round = 0; round < 10; ++round) {
+        const std::string key = randomToken();
+        const auto writer = m_store->openForWriting(key);
+        std::string content(2UL * 1024 * 1024, 'x');
+        writer->write(0, content);
+        writer->sync();
+        std::size_t at = content.size();
+        for (int count = 0; count <= 3000 * round; ++count)
+            content.append(100, static_cast<char>('a' + count % 26));
+        at += putSome(*writer, content, at, 50);
+        auto sync = std::async(std::launch::async, [&] { writer->sync(); });
+        while (at < content.size())
+            at += putSome(*writer, content, at, 100);
+        ASSERT_NO_THROW(sync.get());
+        ASSERT_NO_THROW(writer->sync());
+        const auto other = GetParam().again();
+        EXPECT_TRUE(wholeOf(*other, key, content.size()) == content) << "in round " << round;
+    }
+}
+
+TEST_P(BlobsSuite, AFillThatFailsLeavesNothing)
+{
+    const std::string key = randomToken();
+    const auto writer = m_store->openForWriting(key);
+    writer->write(0, "hello ");
+    bool asked = false;
+    const BlobWriter::Filler failing = [&](std::span<char> room) -> std::size_t {
+        asked = true;
+        room.front() = 'x';
+        throw std::runtime_error("the peer is gone");
+    };
+    try {
+        const auto filled = writer->fill(6, failing);
+        EXPECT_FALSE(asked || filled.has_value());
+    } catch (const std::runtime_error &) {
+        EXPECT_TRUE(asked);
+    }
+    writer->write(6, "world");
+    writer->sync();
+    EXPECT_EQ(contentOf(*GetParam().again(), key), "hello world");
 }
 
 TEST_P(BlobsSuite, ReadsInTheMiddle)

@@ -7,6 +7,8 @@
 #include "text/Secrets.h"
 
 #include <cstdlib>
+#include <span>
+#include <utility>
 
 namespace pelliko::server
 {
@@ -122,6 +124,33 @@ TEST_F(S3Store, AWholeBlobIsOneObjectAndNothingElse)
     EXPECT_TRUE(now.upload.id.empty() && now.tails.empty());
     EXPECT_EQ(read(*again(), m_key), m_content);
     EXPECT_EQ(read(*again(), m_key, 9000001), m_content.substr(9000001));
+}
+
+TEST_F(S3Store, OnlyTheEndOfAPartHasToBeWritten)
+{
+    const auto writer = m_blobs->openForWriting(m_key);
+    std::uint64_t at = 0;
+    const auto fill = [&] {
+        const auto filled = writer->fill(at, [&](std::span<char> room) {
+            return std::string_view(m_content).substr(at).copy(room.data(), room.size());
+        });
+        at += filled.value_or(0);
+        return filled.has_value();
+    };
+    EXPECT_FALSE(fill()) << "nobody knows yet what is in the store";
+    write(*writer, 0, at = 5000);
+    while (at < s3PartSize && fill())
+        ;
+    EXPECT_GT(at, s3PartSize - 100000);
+    EXPECT_LT(at, s3PartSize);
+    write(*writer, at, s3PartSize + 1);
+    at = s3PartSize + 1;
+    EXPECT_TRUE(fill());
+    const std::uint64_t filled = std::exchange(at, at + 1);
+    EXPECT_FALSE(fill()) << "there is a byte missing in front of it";
+    write(*writer, filled, m_content.size());
+    writer->finish();
+    EXPECT_EQ(read(*again(), m_key), m_content);
 }
 
 TEST_F(S3Store, AnotherServerGoesOnFromASyncedByte)

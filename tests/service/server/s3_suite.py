@@ -5,13 +5,14 @@ import contextlib
 import http.client
 import os
 import shutil
+import socket
 import subprocess
 import tempfile
 import threading
 import time
 import urllib.parse
 
-from harness import ServerCase, read_head
+from harness import ServerCase, read_head, read_until_closed
 from store_proxy import StoreProxy
 
 MIB = 1024 * 1024
@@ -147,6 +148,29 @@ class WholeFiles(S3Case):
         content, share, upload = self.one_file(9 * MIB)
         for offset in range(0, len(content), 3 * MIB):
             self.assertEqual(self.patch(upload, offset, content[offset:offset + 3 * MIB]).status, 204)
+        self.assert_shared(share, content)
+        self.assert_stored(content)
+
+    def test_a_cut_connection_keeps_what_arrived_and_the_rest_follows(self):
+        content, share, upload = self.one_file(2 * PART)
+        connection = self.begin_patch(upload, 0, content, PART + 3 * MIB)
+        # Half a close: the server's own close then tells that it has kept what came.
+        connection.shutdown(socket.SHUT_WR)
+        self.assertEqual(read_until_closed(connection), b"")
+        self.assertEqual(self.go_on(upload, content), PART + 3 * MIB)
+        self.assert_shared(share, content)
+        self.assert_stored(content)
+
+    def test_who_asks_for_the_offset_beside_an_upload_does_not_disturb_it(self):
+        content, share, upload = self.one_file(PART + 3 * MIB)
+        connection = self.begin_patch(upload, 0, content, MIB)
+        for at in range(MIB, len(content), MIB):
+            # Each question has what arrived made durable while more of it arrives.
+            while (told := self.offset(upload)) < at:
+                pass
+            self.assertEqual(told, at)
+            connection.sendall(content[at:at + MIB])
+        self.assertIn(b" 204 ", read_head(connection))
         self.assert_shared(share, content)
         self.assert_stored(content)
 
