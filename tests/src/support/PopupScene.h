@@ -175,12 +175,26 @@ protected:
 
     void pressAt(int x, int y)
     {
+        ASSERT_TRUE(isReached());
         ASSERT_EQ(run("xdotool mousemove " + std::to_string(x) + " " + std::to_string(y) +
                       " mousedown 1 mouseup 1"),
                   0);
     }
 
-    void pressKey(const std::string &name) { ASSERT_EQ(run("xdotool key " + name), 0); }
+    void pressKey(const std::string &name)
+    {
+        ASSERT_TRUE(isReached());
+        ASSERT_EQ(run("xdotool key " + name), 0);
+    }
+
+    /// Waits until the window has the focus. The window manager puts it on the screen and gives it
+    /// that at its own pace: before, presses and keys go to whatever else is there.
+    bool isReached()
+    {
+        const std::string look = "test \"$(xdotool getwindowfocus 2>&1)\" = " +
+                                 std::to_string(elm_win_window_id_get(ad->win));
+        return waitUntil([&look] { return run(look) == 0; }, 30);
+    }
 
     /// Keeps what the screen shows in the build tree.
     void photograph(const std::string &name)
