@@ -15,6 +15,10 @@ constexpr double mostMs = 500;
 /// tenth of a second, and does without readers when the loop was busy meanwhile, as a popup makes
 /// it.
 constexpr int questions = 2;
+/// An answer that took so long may have been too late for the toolkit.
+constexpr double lateSeconds = 0.08;
+/// On a machine with no time left a reader may be missed in the end, and not the first request.
+constexpr int mostRounds = 4;
 
 } // namespace
 
@@ -45,6 +49,7 @@ void Readers::ask()
 {
     Eldbus_Message *question = eldbus_message_method_call_new("org.a11y.Bus", "/org/a11y/bus",
                                                               "org.a11y.Bus", "GetAddress");
+    askedAt_ = ecore_time_get();
     pending_ = question ? eldbus_connection_send(bus_, question, onAnswer, this, mostMs) : nullptr;
     if (!pending_)
         std::exchange(then_, nullptr)();
@@ -56,10 +61,18 @@ void Readers::onAnswer(void *data, const Eldbus_Message *, Eldbus_Pending *)
     self->pending_ = nullptr;
     if (!self->then_)
         return;
-    if (++self->answers_ < questions)
+    const bool late = ecore_time_get() - self->askedAt_ > lateSeconds;
+    if (++self->answers_ < questions) {
         self->ask();
-    else
+    } else if (late && ++self->rounds_ < mostRounds) {
+        // The toolkit does not ask again by itself.
+        elm_config_atspi_mode_set(EINA_FALSE);
+        elm_config_atspi_mode_set(EINA_TRUE);
+        self->answers_ = 0;
+        self->ask();
+    } else {
         std::exchange(self->then_, nullptr)();
+    }
 }
 
 } // namespace pelliko::platform

@@ -21,8 +21,8 @@ public:
     Readers(const Readers &) = delete;
     Readers &operator=(const Readers &) = delete;
 
-    /// Calls `then` once: at once where there are no readers, else from the loop, within a second
-    /// at most.
+    /// Calls `then` once: at once where there are no readers, else from the loop. Has the toolkit
+    /// ask again for a bus that answers too late for it; takes a second for that, four at most.
     void whenConnected(std::function<void()> then);
 
 private:
@@ -33,7 +33,9 @@ private:
     std::function<void()> then_;
     struct _Eldbus_Connection *bus_ = nullptr;
     struct _Eldbus_Pending *pending_ = nullptr;
+    double askedAt_ = 0;
     int answers_ = 0;
+    int rounds_ = 0;
 };
 
 } // namespace pelliko::platform
