@@ -150,37 +150,49 @@ def awake():
 
 @contextlib.contextmanager
 def _forgetting(seconds):
-    """Forgets what is remembered of every program's controls after so long, and wakes the loop."""
+    """Forgets what is remembered of every program's controls each time so long has passed, and wakes the loop."""
     timer = GLib.timeout_add_seconds(seconds, _forget)
     try:
         yield
     finally:
-        if GLib.MainContext.default().find_source_by_id(timer):
-            GLib.source_remove(timer)
+        GLib.source_remove(timer)
 
 
 def _forget():
     for application in pyatspi.Registry.getDesktop(0):
         if application:
             application.clear_cache()
-    return GLib.SOURCE_REMOVE
+    return GLib.SOURCE_CONTINUE
+
+
+def _told():
+    """The programs and the names of what they show, for whoever reads why a wait was in vain."""
+    programs = [application.name for application in pyatspi.Registry.getDesktop(0) if application]
+    return f"programs {programs}, shown {[name for name, _, _, _ in controls() if name]}"
+
+
+def wait_seen(condition, what, limit=LIMIT):
+    """Waits until condition() is true of what programs show, and returns its value.
+
+    A program may announce a control a moment before it answers for it; what it draws then is looked at too. A name that
+    was asked for while it changed is remembered as it was, so what is remembered is forgotten now and then.
+    """
+    with awake(), _forgetting(5):
+        try:
+            return wait_for(condition, what, limit)
+        except WorldError as error:
+            raise WorldError(f"{error}; {_told()}") from None
 
 
 def wait_for_control(label, role=None, limit=LIMIT):
-    """Waits until a control with this label shows and returns its extents.
-
-    A program may announce a control a moment before it answers for it; what it draws then is looked at too. A name that
-    was asked for while it changed is remembered as it was, so what is remembered is forgotten once.
-    """
-    with awake(), _forgetting(5):
-        return wait_for(lambda: find(label, role), f"the control “{label}”", limit)
+    """Waits until a control with this label shows and returns its extents."""
+    return wait_seen(lambda: find(label, role), f"the control “{label}”", limit)
 
 
 def wait_for_row(start, role, limit=LIMIT):
     """Waits until a control whose name begins so shows, and returns its name."""
-    with awake(), _forgetting(5):
-        return wait_for(lambda: next((name for name, found, _, _ in controls() if name.startswith(start) and role in found),
-                                     None), f"a row “{start}”", limit)
+    return wait_seen(lambda: next((name for name, found, _, _ in controls() if name.startswith(start) and role in found),
+                                  None), f"a row “{start}”", limit)
 
 
 def _window_with_keyboard(display):
@@ -264,12 +276,11 @@ def text_of(label):
 
 def type_into(label, text):
     """Replaces the text of an entry as a person does: a press into it, all letters removed, others typed."""
-    with awake():
-        press(label, "entry")
-        wait_for(lambda: (_entry(label) or [False])[0], f"the focus of “{label}”")
-        run("xdotool", "key", "End", *["BackSpace"] * len(text_of(label)),
-            *(["type", "--delay", "5", "--", text] if text else []))
-        wait_for(lambda: text_of(label) == text, f"“{label}” to hold “{text}”")
+    press(label, "entry")
+    wait_seen(lambda: (_entry(label) or [False])[0], f"the focus of “{label}”")
+    run("xdotool", "key", "End", *["BackSpace"] * len(text_of(label)),
+        *(["type", "--delay", "5", "--", text] if text else []))
+    wait_seen(lambda: text_of(label) == text, f"“{label}” to hold “{text}”")
 
 
 def wait_still(quiet=0.4, limit=5.0):

@@ -88,7 +88,7 @@ class Way:
 
     def confirm(self):
         limit = A_PERSON_DECIDES if self.person_presses else world.LIMIT
-        found = world.wait_for(lambda: screen.find("Share", "button") or self.toast() or self.given_up(),
+        found = screen.wait_seen(lambda: screen.find("Share", "button") or self.toast() or self.given_up(),
                                "the popup", limit)
         if isinstance(found, str):
             raise WorldError(found)

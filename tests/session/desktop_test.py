@@ -65,8 +65,7 @@ class Desktop(share_case.ShareCase):
         return None
 
     def wait_node(self, role, start):
-        with screen.awake():
-            return world.wait_for(lambda: self.node(role, start), f"the {role} “{start}”")
+        return screen.wait_seen(lambda: self.node(role, start), f"the {role} “{start}”")
 
     def press_item(self, label):
         """Presses an item of a menu that has come to rest."""

@@ -34,16 +34,16 @@ class Popup(share_case.ShareCase):
     def test_the_keyboard_ticks_the_box_while_a_reader_runs(self):
         self.open_popup("Ann Example")
         screen.press(CHECK, "check box")
-        world.wait_for(self.box_is_ticked, "the tick of the pointer")
+        screen.wait_seen(self.box_is_ticked, "the tick of the pointer")
         screen.press(CHECK, "check box")
-        world.wait_for(lambda: not self.box_is_ticked(), "no tick")
+        screen.wait_seen(lambda: not self.box_is_ticked(), "no tick")
         for _stop in range(4):
             screen.key("Tab")
             if self.box_has_focus():
                 break
         self.assertTrue(self.box_has_focus())
         screen.key("space")
-        world.wait_for(self.box_is_ticked, "the tick of the keyboard")
+        screen.wait_seen(self.box_is_ticked, "the tick of the keyboard")
         screen.key("Escape")
         self.wait_left()
 

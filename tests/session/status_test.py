@@ -31,7 +31,7 @@ class Status(share_case.ShareCase):
         self.wait_shown("Sending…")
         self.assertIn("Ann Example", self.shown())
         first = self.bar_value()
-        world.wait_for(lambda: self.bar_value() > first + 0.02, "the bar to move")
+        screen.wait_seen(lambda: self.bar_value() > first + 0.02, "the bar to move")
         self.picture("sending")
 
         world.run("velmora-log", "clear")
@@ -124,7 +124,7 @@ class Status(share_case.ShareCase):
         return [name for name, _role, _extents, _enabled in screen.controls() if name]
 
     def wait_shown(self, text):
-        self.log.wait(lambda _lines: text in self.shown(), f"“{text}”")
+        screen.wait_seen(lambda: text in self.shown(), f"“{text}”")
 
     @staticmethod
     def bar_value():

@@ -48,7 +48,7 @@ class CompanionCase(unittest.TestCase):
 
     @staticmethod
     def wait_away(label):
-        world.wait_for(lambda: screen.find(label) is None, f"“{label}” to go away")
+        screen.wait_seen(lambda: screen.find(label) is None, f"“{label}” to go away")
 
     def picture(self, name):
         os.makedirs(SEEN, exist_ok=True)

@@ -2,7 +2,6 @@
 
 import pyatspi
 import screen
-import world
 
 OPERABLE = ("push button", "button", "entry", "check box", "toggle button", "radio button", "slider", "link")
 
@@ -45,14 +44,13 @@ def unnamed():
 
 def walk(most=40):
     """Presses Tab until the keyboard is back where it was, and returns the names of what it acted on."""
-    with screen.awake():
-        first = here = world.wait_for(_focused, "something to have the keyboard")
-        names = []
-        while not names or (here != first and len(names) < most):
-            names.append(here[0])
-            screen.key("Tab")
-            before = here
-            here = world.wait_for(lambda: (now := _focused()) != before and now, f"the keyboard to leave “{before[0]}”")
+    first = here = screen.wait_seen(_focused, "something to have the keyboard")
+    names = []
+    while not names or (here != first and len(names) < most):
+        names.append(here[0])
+        screen.key("Tab")
+        before = here
+        here = screen.wait_seen(lambda: (now := _focused()) != before and now, f"the keyboard to leave “{before[0]}”")
     return names
 
 

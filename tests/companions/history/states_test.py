@@ -36,8 +36,7 @@ class HistoryCase(companion_case.CompanionCase):
 
     def row(self, start):
         """The name of the row that begins so, once it shows."""
-        return world.wait_for(lambda: next((name for name, role, _, _ in screen.controls()
-                                            if name.startswith(start) and "button" in role), None), f"a row “{start}”")
+        return screen.wait_for_row(start, "button")
 
     def open_row(self, start):
         self.press(self.row(start))
@@ -207,7 +206,7 @@ class Launches(HistoryCase):
             self.launch(operation, "--extra", f"request_id={number}")
         self.row("Ann Example, 1 file")
         self.press("Sent")
-        world.wait_for(lambda: sum("New: " in name for name, _, _, _ in screen.controls()) == 2, "two new rows")
+        screen.wait_seen(lambda: sum("New: " in name for name, _, _, _ in screen.controls()) == 2, "two new rows")
 
     def test_it_speaks_german_and_changes_while_it_is_open(self):
         self.service.sent = [self.available()]

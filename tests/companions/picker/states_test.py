@@ -173,9 +173,9 @@ class People(PickerCase):
         screen.wait_active("pelliko-picker")
         for text in ("020 7946", "bo"):
             world.run("xdotool", "type", "--delay", "5", text)
-            world.wait_for(lambda: screen.text_of(SEARCH) == text, "what is typed")
+            screen.wait_seen(lambda: screen.text_of(SEARCH) == text, "what is typed")
             screen.key("Return")
-            world.wait_for(lambda: screen.text_of(SEARCH) == "", "the next search")
+            screen.wait_seen(lambda: screen.text_of(SEARCH) == "", "the next search")
         self.see(TWO_CHOSEN)
         screen.wait_still()
         for name in ("Tab", "Tab", "Tab", "Tab", "Tab", "Return"):  # both people, the list and Cancel lie between
