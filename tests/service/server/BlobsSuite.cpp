@@ -72,16 +72,25 @@ TEST_P(BlobsSuite, WritingGoesOnWhereItStopped)
     EXPECT_EQ(contentOf(*m_store, key), "hello world");
 }
 
+/// Some bytes that are durable already, so that the next sync has nothing to ask first.
+struct Begun {
+    explicit Begun(Blobs &blobs) : writer(blobs.openForWriting(key))
+    {
+        writer->write(0, content);
+        writer->sync();
+    }
+
+    const std::string key = randomToken();
+    std::string content = std::string(2UL * 1024 * 1024, 'x');
+    const std::unique_ptr<BlobWriter> writer;
+};
+
 TEST_P(BlobsSuite, WhatIsWrittenWhileOtherBytesAreMadeDurableIsMadeSoByTheNextSync)
 {
     // Some rounds end their writing before the first bytes leave, some while they are on their way.
     for (int round = 0; round < 10; ++round) {
-        const std::string key = randomToken();
-        const auto writer = m_store->openForWriting(key);
-        std::string content(2UL * 1024 * 1024, 'x');
-        writer->write(0, content);
-        // The next one has nothing to ask first.
-        writer->sync();
+        Begun begun(*m_store);
+        auto &[key, content, writer] = begun;
         writer->write(content.size(), "y");
         content += 'y';
         auto sync = std::async(std::launch::async, [&] { writer->sync(); });
@@ -134,11 +143,8 @@ TEST_P(BlobsSuite, WhatIsFilledInStandsBesideWhatIsWritten)
 TEST_P(BlobsSuite, WhatIsFilledInWhileOtherBytesAreMadeDurableIsMadeSoByTheNextSync)
 {
     for (int round = 0; round < 10; ++round) {
-        const std::string key = randomToken();
-        const auto writer = m_store->openForWriting(key);
-        std::string content(2UL * 1024 * 1024, 'x');
-        writer->write(0, content);
-        writer->sync();
+        Begun begun(*m_store);
+        auto &[key, content, writer] = begun;
         std::size_t at = content.size();
         for (int count = 0; count <= 3000 * round; ++count)
             content.append(100, static_cast<char>('a' + count % 26));
