@@ -3,6 +3,7 @@ control groups, of either version. That takes root."""
 
 import os
 import pathlib
+import tempfile
 import time
 
 PERIOD = 10_000  # microseconds; short, or a process would stand still for long
@@ -26,8 +27,8 @@ class ProcessorShare:
     def __init__(self, pid):
         try:
             path, self.file, self.text, self.all = controller()
-            self.group = path / f"pelliko-bench-{pid}"
-            self.group.mkdir()
+            # A process that was killed may have left a group; its number comes again in a namespace of its own.
+            self.group = pathlib.Path(tempfile.mkdtemp(prefix="pelliko-bench-", dir=path))
         except OSError as error:
             raise SystemExit(f"a server's processor cannot be limited, which takes root and control groups: {error}") from None
         period = self.group / "cpu.cfs_period_us"
