@@ -15,10 +15,10 @@ constexpr double mostMs = 500;
 /// tenth of a second, and does without readers when the loop was busy meanwhile, as a popup makes
 /// it.
 constexpr int questions = 2;
-/// An answer that took so long may have been too late for the toolkit.
+/// If all answers together took so long, one may have been too late for the toolkit.
 constexpr double lateSeconds = 0.08;
 /// On a machine with no time left a reader may be missed in the end, and not the first request.
-constexpr int mostRounds = 4;
+constexpr double mostSeconds = 3;
 
 } // namespace
 
@@ -40,6 +40,14 @@ void Readers::whenConnected(std::function<void()> then)
         return;
     }
     then_ = std::move(then);
+    startedAt_ = ecore_time_get();
+    begin();
+}
+
+void Readers::begin()
+{
+    answers_ = 0;
+    begunAt_ = ecore_time_get();
     ask();
 }
 
@@ -49,7 +57,6 @@ void Readers::ask()
 {
     Eldbus_Message *question = eldbus_message_method_call_new("org.a11y.Bus", "/org/a11y/bus",
                                                               "org.a11y.Bus", "GetAddress");
-    askedAt_ = ecore_time_get();
     pending_ = question ? eldbus_connection_send(bus_, question, onAnswer, this, mostMs) : nullptr;
     if (!pending_)
         std::exchange(then_, nullptr)();
@@ -61,15 +68,15 @@ void Readers::onAnswer(void *data, const Eldbus_Message *, Eldbus_Pending *)
     self->pending_ = nullptr;
     if (!self->then_)
         return;
-    const bool late = ecore_time_get() - self->askedAt_ > lateSeconds;
+    const double now = ecore_time_get();
+    const bool late = now - self->begunAt_ > lateSeconds;
     if (++self->answers_ < questions) {
         self->ask();
-    } else if (late && ++self->rounds_ < mostRounds) {
+    } else if (late && now - self->startedAt_ < mostSeconds) {
         // The toolkit does not ask again by itself.
         elm_config_atspi_mode_set(EINA_FALSE);
         elm_config_atspi_mode_set(EINA_TRUE);
-        self->answers_ = 0;
-        self->ask();
+        self->begin();
     } else {
         std::exchange(self->then_, nullptr)();
     }

@@ -22,10 +22,11 @@ public:
     Readers &operator=(const Readers &) = delete;
 
     /// Calls `then` once: at once where there are no readers, else from the loop. Has the toolkit
-    /// ask again for a bus that answers too late for it; takes a second for that, four at most.
+    /// ask again for a bus that answers too late for it; takes four seconds for that at most.
     void whenConnected(std::function<void()> then);
 
 private:
+    void begin();
     void ask();
     static void onAnswer(void *data, const struct _Eldbus_Message *answer,
                          struct _Eldbus_Pending *pending);
@@ -33,9 +34,9 @@ private:
     std::function<void()> then_;
     struct _Eldbus_Connection *bus_ = nullptr;
     struct _Eldbus_Pending *pending_ = nullptr;
-    double askedAt_ = 0;
+    double startedAt_ = 0;
+    double begunAt_ = 0; // this round of questions
     int answers_ = 0;
-    int rounds_ = 0;
 };
 
 } // namespace pelliko::platform
