@@ -47,7 +47,7 @@ void Readers::whenConnected(std::function<void()> then)
 void Readers::begin()
 {
     answers_ = 0;
-    begunAt_ = ecore_time_get();
+    roundBegunAt_ = ecore_time_get();
     ask();
 }
 
@@ -69,7 +69,7 @@ void Readers::onAnswer(void *data, const Eldbus_Message *, Eldbus_Pending *)
     if (!self->then_)
         return;
     const double now = ecore_time_get();
-    const bool late = now - self->begunAt_ > lateSeconds;
+    const bool late = now - self->roundBegunAt_ > lateSeconds;
     if (++self->answers_ < questions) {
         self->ask();
     } else if (late && now - self->startedAt_ < mostSeconds) {

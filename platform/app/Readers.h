@@ -35,7 +35,7 @@ private:
     struct _Eldbus_Connection *bus_ = nullptr;
     struct _Eldbus_Pending *pending_ = nullptr;
     double startedAt_ = 0;
-    double begunAt_ = 0; // this round of questions
+    double roundBegunAt_ = 0;
     int answers_ = 0;
 };
 

@@ -167,7 +167,10 @@ def _forget():
 
 def _told():
     """The programs and the names of what they show, for whoever reads why a wait was in vain."""
-    programs = [application.name for application in pyatspi.Registry.getDesktop(0) if application]
+    try:
+        programs = [application.name for application in pyatspi.Registry.getDesktop(0) if application]
+    except Exception:  # one went away while it was looked at
+        programs = "that come and go"
     return f"programs {programs}, shown {[name for name, _, _, _ in controls() if name]}"
 
 
