@@ -119,7 +119,7 @@ void runLoop(RequestReceiver &receiver, const Start &start,
              const ui_app_lifecycle_callback_s &callbacks, void *userData)
 {
     Readers readers;
-    readers.whenConnected([&] {
+    readers.whenKnown([&] {
         receiver.deliver(
             [&](app_control_h request) {
                 if (callbacks.app_control)

@@ -133,11 +133,16 @@ TEST_F(UploadProxy, connectionsThatBreakSendNoByteTwice)
     ASSERT_TRUE(waitForEnd(id));
     EXPECT_EQ(reportsOf(id).back().status, 7);
     expectArrived(file);
-    int64_t total = 0;
-    for (const SeenExchange &seen : exchanges()) {
-        total += seen.request.starts_with("PATCH") ? seen.bytes : 0;
-    }
-    EXPECT_EQ(total, 6 * mebibyte);
+    const auto total = [this] {
+        int64_t bytes = 0;
+        for (const SeenExchange &seen : exchanges()) {
+            bytes += seen.request.starts_with("PATCH") ? seen.bytes : 0;
+        }
+        return bytes;
+    };
+    // An exchange is told of when its connections are closed.
+    EXPECT_TRUE(runUntil([&] { return total() >= 6 * mebibyte; }));
+    EXPECT_EQ(total(), 6 * mebibyte);
 }
 
 TEST_F(UploadProxy, aFileThatGrowsFailsAndOneThatIsRemovedIsSentFromWhatIsOpen)

@@ -215,6 +215,9 @@ void World::startFaults(const std::string &plan)
 
 std::vector<SeenExchange> World::exchanges() const
 {
+    // It is read a line at a time, when the loop is free.
+    while (g_main_context_iteration(nullptr, FALSE)) {
+    }
     std::vector<SeenExchange> result;
     for (const std::string &line : proxy_->lines()) {
         if (line.front() == '{') {
