@@ -34,6 +34,5 @@ function(pelliko_fuzz_target name)
   string(JOIN " " options ${arg_OPTIONS})
   file(WRITE "${CMAKE_BINARY_DIR}/fuzz/${name}/options" "${options}\n")
   pelliko_script_test(${program}
-    COMMAND "${PROJECT_SOURCE_DIR}/scripts/fuzz" --build "${CMAKE_BINARY_DIR}" --fresh --seed 1 --seconds 10 ${name}
-    TIMEOUT 90)
+    COMMAND "${PROJECT_SOURCE_DIR}/scripts/fuzz" --build "${CMAKE_BINARY_DIR}" --fresh --seed 1 --seconds 10 ${name})
 endfunction()

@@ -90,9 +90,11 @@ function(pelliko_session_command out kind)
       ${pelliko_session_${kind}} -- ${ARGN} PARENT_SCOPE)
 endfunction()
 
+# The time ends a test that hangs. Where other machines take most of the processor a test may need five times as long
+# as usual.
 function(pelliko_test_properties name timeout)
   if(NOT timeout)
-    set(timeout 120)
+    set(timeout 300)
   endif()
   set_tests_properties(${name} PROPERTIES TIMEOUT ${timeout} ENVIRONMENT
     "ASAN_OPTIONS=detect_leaks=0:abort_on_error=0;ASAN_SYMBOLIZER_PATH=/usr/lib/llvm-16/bin/llvm-symbolizer;UBSAN_OPTIONS=print_stacktrace=1")

@@ -67,10 +67,15 @@ def open_in_browser(link):
 def look_at_history():
     world.run("app-launch", "--app", "com.velmora.pelliko-history", "--operation", "appcontrol/operation/view")
     screen.wait_for_control("Sent, shown")
+    screen.wait_seen(recipients_are_named, "the recipients in the history")
     world.put_banners_away()
     screen.wait_still()
     os.makedirs(SEEN, exist_ok=True)
     screen.screenshot(os.path.join(SEEN, "two_users-history.png"))
+    return recipients_are_named()
+
+
+def recipients_are_named():
     said = " ".join(name for name, _role, _extents, _enabled in screen.controls() if name)
     return "Ben Joined" in said and "Cora Elsewhere" in said
 

@@ -214,11 +214,12 @@ def read_head(connection):
 
 
 def read_until_closed(connection):
-    """Everything the other side still sends; a reset ends it as well."""
-    received = b""
+    """Everything the other side still sends; a reset ends it as well. Fails when it sends for longer than a minute."""
+    received, deadline = b"", time.monotonic() + 60
     try:
         while part := connection.recv(65536):
             received += part
+            assert time.monotonic() < deadline, f"there is no end behind {len(received)} bytes"
     except ConnectionResetError:
         pass
     return received
